@@ -1,0 +1,99 @@
+// One clip's metadata.
+
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "oxmv/metadata/StreamObserver.h"
+#include "oxmv/metadata/TagStreamEncoder.h"
+#include "oxmv/values/Dictionary.h"
+#include "oxmv/values/myGUID.h"
+
+namespace oxmv {
+
+// The identifier under which the library's preferences are kept.
+constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
+
+// One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
+// stereo clip, which eye the object stands for.
+//
+//   auto clip = MetadataDictionary().initWithData(bytes);
+//   std::cout << clip.metadata()["REEL"].text();
+//
+// Copies are independent of each other, and cheap. One object is used from one thread at a time;
+// different objects from different threads as one likes.
+class MetadataDictionary {
+ public:
+  // As after init(), with a zero GUID.
+  MetadataDictionary() = default;
+
+  // Back to no tags at all, a combined object (not one eye's). The GUID stays.
+  MetadataDictionary& init();
+
+  // Takes the tags from a stream; see processBytes(). Everything else stays as it was.
+  MetadataDictionary& initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
+                                    StreamObserver* observer = nullptr);
+
+  // The same for a whole stream. Fewer than 12 bytes, the shortest record with a value, change
+  // nothing. The length is cut to 32 bits, so data of 2 GiB and more count as a length that may be
+  // negative, which gives no tags.
+  MetadataDictionary& initWithData(std::span<const std::uint8_t> data,
+                                   StreamObserver* observer = nullptr);
+
+  // Decodes a stream of `length` bytes into a dictionary of its own; the object's tags stay as they
+  // are. `bytes` are the bytes really there, see decodeStream(). A GUID record in the stream
+  // changes the object's GUID.
+  Dictionary processBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
+                          StreamObserver* observer = nullptr);
+
+  myGUID GUID() const { return _guid; }
+
+  // Whether there is at least one tag.
+  bool haveMetadata() const { return _simpleTags && !_simpleTags->empty(); }
+
+  // A copy of the tags; changes to it reach the object through setMetadata() only.
+  Dictionary metadata() const { return _simpleTags.value_or(Dictionary()); }
+
+  // Takes over a copy of the entries. None (std::nullopt) gives an empty dictionary.
+  void setMetadata(const std::optional<Dictionary>& tags);
+
+  // Does nothing when there is no such key.
+  void removeObject(std::string_view key);
+
+  // Encodes a dictionary, none giving an empty stream; see encodeStream(). `layout`: the object's
+  // unless given. Answers nothing when there is no memory.
+  std::optional<std::vector<std::uint8_t>> parseMetadata(
+      const std::optional<Dictionary>& tags, std::optional<Layout> layout = std::nullopt) const;
+
+  // The object's tags, encoded.
+  std::optional<std::vector<std::uint8_t>> metaDataData(
+      std::optional<Layout> layout = std::nullopt) const;
+
+  // metaDataData() as hexadecimal digits, two lower-case ones a byte; empty when there are no
+  // bytes.
+  std::string metadataString() const;
+
+  // How this object's tags are encoded unless a call says otherwise. init() leaves it as it is.
+  Layout layout() const { return layout_; }
+  void setLayout(Layout layout) { layout_ = layout; }
+
+  // Whether the object stands for one eye of a stereo clip, and which: 0 left, 1 right.
+  bool isSingle() const { return _isSingle; }
+  std::size_t eye() const { return _eye; }
+
+ private:
+  std::optional<Dictionary> _simpleTags;  // none until something is loaded or set
+  myGUID _guid;
+  bool _isSingle = false;
+  std::size_t _eye = 0;
+  std::string_view _appID = preferencesAppID;
+  Layout layout_ = Layout::exact;
+};
+
+}  // namespace oxmv

@@ -1,0 +1,104 @@
+// The table of tags: every fact about a tag stands once, in its row.
+
+#pragma once
+
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "oxmv/metadata/Tag.h"
+
+namespace oxmv {
+
+// How the decoder reads a record of the tag. Integers and floats are little-endian.
+enum class Read : std::uint8_t {
+  none,          // no rule: the record is skipped
+  text,          // text up to its first NUL
+  int32,         // signed
+  uint8,         // from the payload's first byte
+  uint16,        // from its first two bytes
+  float32,       // binary32
+  floats,        // a list of `count` floats, if the size is exactly theirs
+  integers,      // a list of as many int32 as the size holds
+  data,          // bytes
+  guid,          // bytes; and they become the object's GUID
+  nested,        // a nested stream, unless the size is 0
+  texts,         // one text of the whole payload, appended to the tag's list
+  ints,          // one int32, appended to the tag's list
+  nestedList,    // a nested stream, appended to the tag's list
+  controlPoint,  // two int32 and a nested stream, appended to the tag's list
+  tagName,       // the name of the next entry of the "TAG " group
+  tagValue,      // its value
+  regName,       // the name of the next entry of the "REG " group
+  regValue,      // its value
+};
+
+// How the encoder writes a value under the tag: the letter is the record's type.
+enum class Write : std::uint8_t {
+  none,          // no rule: the value is dropped
+  timecode,      // 'c', the text without room for a NUL
+  text,          // 'c', the text and a NUL
+  float32,       // 'f'
+  integerH,      // 'H'
+  integerL,      // 'L'
+  integerR,      // 'R'
+  word16,        // 'B', the low 16 bits
+  byte8,         // 'B', the low 8 bits
+  fourCC,        // 'F', the first four characters of a text
+  guid,          // 'G', bytes
+  data,          // 'c', bytes
+  floatPair,     // 'f', two floats, or three: a list of three is written as a triple
+  floats,        // 'f', `count` floats
+  integerArray,  // 'H', one record for all elements
+  integerEach,   // 'H', one record an element
+  textEach,      // 'c', one record an element
+  nestedEach,    // a nested stream an element
+  nested,        // a nested stream
+  controlPoint,  // two integers and a nested stream an element
+  tagGroup,      // TAGN and TAGV records
+  regGroup,      // REGN and REGV records
+};
+
+// What may be stored under the tag by key.
+enum class Accept : std::uint8_t {
+  unknown,  // not by key: enters a dictionary by decoding only, or whole dictionary at once
+  any,      // any value
+  number,   // a number
+  array,    // a value of `count` elements
+  never,    // known, and always refused: the data tags
+};
+
+// When the encoder writes the tag.
+enum class When : std::uint8_t {
+  inOrder,   // where the dictionary's own order has it
+  leading,   // before all others
+  deferred,  // after all others
+};
+
+struct TagRow {
+  Tag tag;
+  Read read;
+  Write write;
+  Accept accept;
+  std::uint8_t count = 0;       // elements of a float list
+  std::string_view label = {};  // what people call it; empty for most tags
+  When when = When::inOrder;
+};
+
+// Every row, in the order of the tags' characters.
+std::span<const TagRow> tagRows() noexcept;
+
+// The row of a tag; null when there is none.
+const TagRow* findTagRow(Tag tag) noexcept;
+
+// The row of a dictionary key; null when it is not one of the tags.
+const TagRow* findTagRow(std::string_view key) noexcept;
+
+// The three rules in a few words, for people: "4 floats", "f 16", "array of 4". A rule that does
+// nothing is "-".
+std::string readsAs(const TagRow& row);
+std::string writesAs(const TagRow& row);
+std::string acceptsAs(const TagRow& row);
+
+}  // namespace oxmv

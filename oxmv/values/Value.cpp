@@ -1,0 +1,215 @@
+#include "oxmv/values/Value.h"
+
+#include <algorithm>
+#include <bit>
+#include <cstring>
+
+#include "oxmv/values/Array.h"
+#include "oxmv/values/Dictionary.h"
+#include "oxmv/values/Numbers.h"
+#include "oxmv/values/Text.h"
+
+namespace oxmv {
+
+using detail::Block;
+using detail::Form;
+using detail::Slot;
+
+namespace {
+
+std::string_view asText(std::span<const std::uint8_t> bytes) {
+  return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
+std::span<const std::uint8_t> asBytes(std::string_view text) {
+  return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+// The same place, ending before its first NUL.
+Slot cutAtNul(const Block& block, Slot place) {
+  const std::uint8_t* start = block.bytes(place).data();
+  const void* nul = place.size() == 0 ? nullptr : std::memchr(start, 0, place.size());
+  const auto size = nul == nullptr
+                        ? place.size()
+                        : static_cast<std::uint32_t>(static_cast<const std::uint8_t*>(nul) - start);
+  return Slot::place(Form::text, size, place.body);
+}
+
+}  // namespace
+
+Value::Value(float number) noexcept
+    : slot_(Slot::scalar(Form::float32, std::bit_cast<std::uint32_t>(number))) {}
+
+Value::Value(double number) noexcept
+    : slot_(Slot::scalar(Form::float64, 0)), content_{.float64 = number} {}
+
+Value::Value(std::string_view text) : Value(wholeText(Form::wholeText, text)) {}
+
+Value::Value(const Array& array) noexcept : Value(array.value_) {
+  if (isNothing()) *this = Value(Slot::scalar(Form::arrayBox, 0), nullptr);
+}
+
+Value::Value(const Dictionary& dictionary) noexcept : Value(dictionary.value_) {
+  if (isNothing()) *this = Value(Slot::scalar(Form::dictionaryBox, 0), nullptr);
+}
+
+Value Value::derivedText(std::string_view text) { return wholeText(Form::wholeDerivedText, text); }
+
+Value Value::data(std::span<const std::uint8_t> bytes) { return whole(Form::wholeData, bytes); }
+
+Value Value::whole(Form form, std::span<const std::uint8_t> bytes) {
+  const Slot slot = Slot::scalar(form, 0);
+  return bytes.empty() ? Value(slot, nullptr)
+                       : Value(slot, Block::make(bytes, {}, {}, {}).detach());
+}
+
+Value Value::wholeText(Form form, std::string_view text) {
+  return isUtf8(text) ? whole(form, asBytes(text)) : whole(form, asBytes(utf8FromLatin1(text)));
+}
+
+Value Value::in(const Block& block, Slot slot) {
+  const Form form = slot.form();
+  if (form == Form::integer) return Value(std::bit_cast<std::int32_t>(slot.body));
+  if (form == Form::float32) return Value(slot, nullptr);
+  if (form == Form::textToNul) slot = cutAtNul(block, slot);
+  if (slot.form() == Form::text && !isUtf8(block.text(slot))) {
+    return wholeText(Form::wholeText, block.text(slot));
+  }
+  block.retain();
+  return Value(slot, &block);
+}
+
+Value::Kind Value::kind() const noexcept {
+  switch (slot_.form()) {
+    case Form::nothing: return Kind::nothing;
+    case Form::integer: return Kind::integer;
+    case Form::float32: return Kind::float32;
+    case Form::float64: return Kind::float64;
+    case Form::text:
+    case Form::textToNul:
+    case Form::wholeText:
+    case Form::wholeDerivedText: return Kind::text;
+    case Form::data:
+    case Form::wholeData: return Kind::data;
+    case Form::floats:
+    case Form::integers:
+    case Form::list:
+    case Form::arrayBox: return Kind::array;
+    case Form::dictionary:
+    case Form::dictionaryBox: return Kind::dictionary;
+  }
+  return Kind::nothing;
+}
+
+bool Value::isNumber() const noexcept {
+  const Form form = slot_.form();
+  return form == Form::integer || form == Form::float32 || form == Form::float64;
+}
+
+std::int32_t Value::intValue() const noexcept {
+  switch (kind()) {
+    case Kind::integer: return static_cast<std::int32_t>(content_.integer);
+    case Kind::float32:
+    case Kind::float64: return truncated<std::int32_t>(doubleValue());
+    case Kind::text: {
+      constexpr std::int64_t lowest = std::numeric_limits<std::int32_t>::min();
+      return static_cast<std::int32_t>(std::clamp(leadingInteger(text()), lowest, -(lowest + 1)));
+    }
+    case Kind::nothing:
+    case Kind::data:
+    case Kind::array:
+    case Kind::dictionary: break;
+  }
+  return 0;
+}
+
+std::int64_t Value::int64Value() const noexcept {
+  switch (kind()) {
+    case Kind::integer: return content_.integer;
+    case Kind::float32:
+    case Kind::float64: return truncated<std::int64_t>(doubleValue());
+    case Kind::text: return leadingInteger(text());
+    case Kind::nothing:
+    case Kind::data:
+    case Kind::array:
+    case Kind::dictionary: break;
+  }
+  return 0;
+}
+
+float Value::floatValue() const noexcept {
+  switch (kind()) {
+    case Kind::integer: return static_cast<float>(content_.integer);
+    case Kind::float32: return std::bit_cast<float>(slot_.body);
+    case Kind::float64: return static_cast<float>(content_.float64);
+    case Kind::text: return leadingFloat(text());
+    case Kind::nothing:
+    case Kind::data:
+    case Kind::array:
+    case Kind::dictionary: break;
+  }
+  return 0;
+}
+
+double Value::doubleValue() const noexcept {
+  switch (kind()) {
+    case Kind::integer: return static_cast<double>(content_.integer);
+    case Kind::float32: return static_cast<double>(std::bit_cast<float>(slot_.body));
+    case Kind::float64: return content_.float64;
+    case Kind::text: return leadingDouble(text());
+    case Kind::nothing:
+    case Kind::data:
+    case Kind::array:
+    case Kind::dictionary: break;
+  }
+  return 0;
+}
+
+std::span<const std::uint8_t> Value::payload() const noexcept {
+  switch (slot_.form()) {
+    case Form::text:
+    case Form::data: return block().bytes(slot_);
+    case Form::wholeText:
+    case Form::wholeDerivedText:
+    case Form::wholeData:
+      if (content_.owner != nullptr) return block().bytes();
+      break;
+    default: break;
+  }
+  return {};
+}
+
+std::string_view Value::text() const& noexcept {
+  return isText() ? asText(payload()) : std::string_view();
+}
+
+std::size_t Value::length() const noexcept { return utf16Length(text()); }
+
+std::span<const std::uint8_t> Value::data() const& noexcept {
+  return kind() == Kind::data ? payload() : std::span<const std::uint8_t>();
+}
+
+Array Value::array() const { return kind() == Kind::array ? Array(*this) : Array(); }
+
+Dictionary Value::dictionary() const {
+  return kind() == Kind::dictionary ? Dictionary(*this) : Dictionary();
+}
+
+bool operator==(const Value& a, const Value& b) {
+  if (a.kind() != b.kind()) return false;
+  switch (a.kind()) {
+    case Value::Kind::nothing: return true;
+    case Value::Kind::integer: return a.content_.integer == b.content_.integer;
+    case Value::Kind::float32: return a.slot_.body == b.slot_.body;
+    case Value::Kind::float64:
+      return std::bit_cast<std::uint64_t>(a.content_.float64) ==
+             std::bit_cast<std::uint64_t>(b.content_.float64);
+    case Value::Kind::text:
+    case Value::Kind::data: return std::ranges::equal(a.payload(), b.payload());
+    case Value::Kind::array: return a.array() == b.array();
+    case Value::Kind::dictionary: return a.dictionary() == b.dictionary();
+  }
+  return false;
+}
+
+}  // namespace oxmv

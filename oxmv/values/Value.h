@@ -1,0 +1,151 @@
+// One value of a clip's metadata.
+
+#pragma once
+
+#include <concepts>
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include "oxmv/values/Block.h"
+
+namespace oxmv {
+
+class Array;
+class Dictionary;
+
+// A value is nothing, an integer (64 bits), a float (binary32), a double, a text (UTF-8), data
+// (bytes), an array of values or a dictionary. It never changes once made; copies share the
+// payload, so copying one is cheap and needs no memory. A value taken out of a decoded stream keeps
+// that stream's block alive.
+//
+// The accessors answer for every kind and never fail: see each. Those that hand out views do so
+// only for a value that has a name; asked of a temporary, they hand out a copy, which nothing can
+// pull away.
+//
+// Different threads may use different values freely, also where they share a payload.
+class Value {
+ public:
+  enum class Kind : std::uint8_t {
+    nothing,
+    integer,
+    float32,
+    float64,
+    text,
+    data,
+    array,
+    dictionary
+  };
+
+  // Nothing: what a look-up answers for a key that is not there. No dictionary holds it.
+  Value() noexcept = default;
+
+  template <std::integral T>
+  requires(!std::same_as<T, bool> && !std::same_as<T, char> &&
+           (std::is_signed_v<T> || sizeof(T) < sizeof(std::int64_t))) Value(T number)
+  noexcept : Value(IntegerTag{}, static_cast<std::int64_t>(number)) {}
+  Value(bool) = delete;  // has no place in a dictionary
+  Value(float number) noexcept;
+  Value(double number) noexcept;
+
+  // Text that is not valid UTF-8 is taken as ISO-8859-1.
+  Value(std::string_view text);
+  Value(const std::string& text) : Value(std::string_view(text)) {}
+  Value(const char* text) : Value(std::string_view(text)) {}
+  // Text of a derived string kind. It differs from other text in one place: as a value in the "REG
+  // " group the encoder takes it for a number.
+  static Value derivedText(std::string_view text);
+
+  static Value data(std::span<const std::uint8_t> bytes);
+
+  Value(const Array& array) noexcept;
+  Value(const Dictionary& dictionary) noexcept;
+
+  Value(const Value& other) noexcept : slot_(other.slot_), content_(other.content_) { retain(); }
+  Value(Value&& other) noexcept : slot_(other.slot_), content_(other.content_) { other.slot_ = {}; }
+  Value& operator=(Value other) noexcept {
+    std::swap(slot_, other.slot_);
+    std::swap(content_, other.content_);
+    return *this;
+  }
+  ~Value() { release(); }
+
+  Kind kind() const noexcept;
+  bool isNothing() const noexcept { return slot_.form() == detail::Form::nothing; }
+  bool isNumber() const noexcept;  // an integer, a float or a double
+  bool isText() const noexcept { return kind() == Kind::text; }
+  bool isDerivedText() const noexcept { return slot_.form() == detail::Form::wholeDerivedText; }
+
+  // Numbers. Integers give their low bits; floats and doubles are truncated toward zero and
+  // saturate (not a number gives 0); text is read like a number at its start (white space, sign,
+  // digits); every other kind gives 0.
+  std::int32_t intValue() const noexcept;
+  std::int64_t int64Value() const noexcept;
+  float floatValue() const noexcept;
+  double doubleValue() const noexcept;
+
+  // The characters of a text; empty for every other kind. The view holds as long as this value.
+  std::string_view text() const& noexcept;
+  std::string text() const&& { return std::string(static_cast<const Value&>(*this).text()); }
+  // A text's length in characters as UTF-16 counts them; 0 for every other kind.
+  std::size_t length() const noexcept;
+
+  // The bytes of data; empty for every other kind. The view holds as long as this value.
+  std::span<const std::uint8_t> data() const& noexcept;
+  std::vector<std::uint8_t> data() const&& {
+    const auto bytes = static_cast<const Value&>(*this).data();
+    return {bytes.begin(), bytes.end()};
+  }
+
+  // The array or dictionary; an empty one for every other kind.
+  Array array() const;
+  Dictionary dictionary() const;
+
+  // Equal are values of the same kind and content: floats and doubles bit for bit (so a
+  // not-a-number equals itself), dictionaries whatever their order, text whether derived or not.
+  friend bool operator==(const Value& a, const Value& b);
+
+  // Internal: the value of a slot of `block`.
+  static Value in(const detail::Block& block, detail::Slot slot);
+
+ private:
+  friend class Array;
+  friend class Dictionary;
+  struct IntegerTag {};
+  union Content {
+    std::int64_t integer;
+    double float64;
+    const detail::Shared* owner;  // null: an empty whole or box
+  };
+
+  Value(IntegerTag, std::int64_t number) noexcept
+      : slot_(detail::Slot::scalar(detail::Form::integer, 0)), content_{.integer = number} {}
+  Value(detail::Slot slot, const detail::Shared* owner) noexcept
+      : slot_(slot), content_{.owner = owner} {}
+  static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
+  static Value wholeText(detail::Form form, std::string_view text);
+
+  const detail::Shared* owner() const noexcept {
+    return slot_.form() >= detail::Form::text ? content_.owner : nullptr;
+  }
+  const detail::Block& block() const noexcept {
+    return static_cast<const detail::Block&>(*content_.owner);
+  }
+  std::span<const std::uint8_t> payload() const noexcept;
+  void retain() const noexcept {
+    if (const auto* shared = owner()) shared->retain();
+  }
+  void release() const noexcept {
+    if (const auto* shared = owner()) shared->release();
+  }
+
+  detail::Slot slot_;
+  Content content_{.integer = 0};
+};
+
+}  // namespace oxmv
