@@ -1,0 +1,172 @@
+#include "oxmv/platform/WholeFile.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <random>
+#include <string>
+#include <utility>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace oxmv {
+namespace {
+
+class FileCategory final : public std::error_category {
+ public:
+  const char* name() const noexcept override { return "oxmv.file"; }
+  std::string message(int code) const override {
+    switch (FileError{code}) {
+      case FileError::notRegular: return "Not a regular file";
+      case FileError::tooLarge: return "Larger than 256 MiB";
+    }
+    return "Unknown error";
+  }
+};
+static_assert(maxFileSize == std::size_t{256} * 1024 * 1024, "the message names it");
+
+std::error_code lastError() { return {errno, std::generic_category()}; }
+
+// A file descriptor that closes itself.
+class Descriptor {
+ public:
+  explicit Descriptor(int number) : number_(number) {}
+  Descriptor(const Descriptor&) = delete;
+  Descriptor& operator=(const Descriptor&) = delete;
+  ~Descriptor() {
+    if (isOpen()) ::close(number_);
+  }
+
+  bool isOpen() const { return number_ >= 0; }
+  int number() const { return number_; }
+  // Some file systems tell only here that what was written has not arrived.
+  bool close() { return ::close(std::exchange(number_, -1)) == 0; }
+
+ private:
+  int number_;
+};
+
+// What keeps a file of this kind and size from being ours; none when nothing does.
+std::error_code objectionTo(const struct stat& status) {
+  if (S_ISDIR(status.st_mode)) return make_error_code(std::errc::is_a_directory);
+  if (!S_ISREG(status.st_mode)) return FileError::notRegular;
+  return {};
+}
+
+bool readAll(int file, std::vector<std::uint8_t>& content, std::error_code& error) {
+  std::size_t size = 0;
+  for (;;) {
+    if (size == content.size())
+      content.resize(std::min(std::max<std::size_t>(2 * size, 4096), maxFileSize + 1));
+    const ssize_t count = ::read(file, content.data() + size, content.size() - size);
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) return error = lastError(), false;
+    if (count == 0) break;
+    size += static_cast<std::size_t>(count);
+    if (size > maxFileSize) return error = FileError::tooLarge, false;
+  }
+  content.resize(size);
+  return true;
+}
+
+bool writeAll(int file, std::span<const std::uint8_t> content) {
+  while (!content.empty()) {
+    const ssize_t count = ::write(file, content.data(), content.size());
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) return false;
+    content = content.subspan(static_cast<std::size_t>(count));
+  }
+  return true;
+}
+
+// The file that a chain of symbolic links leads to, whether it is there or not.
+std::filesystem::path followLinks(std::filesystem::path path, std::error_code& error) {
+  constexpr int mostLinks = 40;  // as many as Linux itself follows
+  for (int links = 0; links < mostLinks; ++links) {
+    std::error_code notALink;
+    const std::filesystem::path target = std::filesystem::read_symlink(path, notALink);
+    if (notALink) return path;
+    path = path.parent_path() / target;  // an absolute target stands alone
+  }
+  error = make_error_code(std::errc::too_many_symbolic_link_levels);
+  return path;
+}
+
+std::string temporaryName() {
+  std::random_device random;
+  std::string name = ".oxmv-";
+  for (int i = 0; i < 16; ++i) name += "0123456789abcdef"[random() & 0xF];
+  return name + ".tmp";
+}
+
+// The folder's own record of the new name. Some file systems cannot do this, and need not.
+bool syncFolder(const std::filesystem::path& folder) {
+  const Descriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!descriptor.isOpen()) return errno == EACCES;  // may be written, not read: nothing to sync by
+  return ::fsync(descriptor.number()) == 0 || errno == EINVAL || errno == ENOTSUP;
+}
+
+// Gives the new file the permissions and owner of the old one. An owner that cannot be given leaves
+// the file ours, without the bits that would let it run as somebody else.
+bool takeOver(int file, const struct stat& old) {
+  mode_t mode = old.st_mode & 07777;
+  if (::fchown(file, old.st_uid, old.st_gid) != 0) mode &= 0777;
+  return ::fchmod(file, mode) == 0;
+}
+
+}  // namespace
+
+std::error_code make_error_code(FileError error) noexcept {
+  static const FileCategory category;
+  return {static_cast<int>(error), category};
+}
+
+std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
+                                                       std::error_code& error) {
+  error.clear();
+  // Non-blocking, so that a pipe without a writer answers at once; it means nothing to a regular
+  // file.
+  const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  struct stat status = {};
+  if (!file.isOpen() || ::fstat(file.number(), &status) != 0)
+    return error = lastError(), std::nullopt;
+  if ((error = objectionTo(status))) return std::nullopt;
+  const auto size = static_cast<std::uintmax_t>(status.st_size);
+  if (size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
+  std::vector<std::uint8_t> content(static_cast<std::size_t>(size) +
+                                    1);  // one more, to meet the end in one go
+  if (!readAll(file.number(), content, error)) return std::nullopt;
+  return content;
+}
+
+bool writeWholeFile(const std::filesystem::path& path, std::span<const std::uint8_t> content,
+                    std::error_code& error) {
+  error.clear();
+  const std::filesystem::path target = followLinks(path, error);
+  if (error) return false;
+  struct stat old = {};
+  const bool isThere = ::lstat(target.c_str(), &old) == 0;
+  if (!isThere && errno != ENOENT) return error = lastError(), false;
+  if (isThere && (error = objectionTo(old))) return false;
+
+  const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
+  const std::filesystem::path temporary = folder / temporaryName();
+  // Readable by nobody else until it has the permissions of the file that it replaces.
+  const mode_t mode = isThere ? 0600 : 0666;
+  Descriptor file(::open(temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));
+  if (!file.isOpen()) return error = lastError(), false;
+  const bool isWritten = writeAll(file.number(), content) &&
+                         (!isThere || takeOver(file.number(), old)) &&
+                         ::fsync(file.number()) == 0 && file.close() &&
+                         ::rename(temporary.c_str(), target.c_str()) == 0;
+  if (!isWritten) {
+    error = lastError();
+    ::unlink(temporary.c_str());
+    return false;
+  }
+  if (!syncFolder(folder)) return error = lastError(), false;
+  return true;
+}
+
+}  // namespace oxmv

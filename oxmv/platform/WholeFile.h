@@ -1,0 +1,47 @@
+// Whole files in, whole files out.
+
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <filesystem>
+#include <optional>
+#include <span>
+#include <system_error>
+#include <vector>
+
+namespace oxmv {
+
+// The largest file that is read. Clips take kilobytes and the largest looks some megabytes; what is
+// larger is no file of ours, and must not fill the host's memory.
+constexpr std::size_t maxFileSize = std::size_t{256} << 20;
+
+// Why a file that is there is none of ours to read or replace. Everything else comes as the
+// system's own error.
+enum class FileError {
+  notRegular = 1,  // a pipe, a device ... (a folder gives std::errc::is_a_directory)
+  tooLarge,        // more than maxFileSize
+};
+std::error_code make_error_code(FileError error) noexcept;
+
+// The content of a regular file. Answers nothing, with the cause in `error`, when there is no such
+// file, it cannot be read to its end, is not a regular file (a pipe never makes this wait) or is
+// larger than maxFileSize. A read that fails is never taken for the end of the file.
+std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
+                                                       std::error_code& error);
+
+// Puts a file with this content at `path`, in place of the regular file that may be there: whoever
+// opens it finds the old content or the new, whole, also after a crash. The content goes to a
+// temporary file of random name in the same folder (".oxmv-<16 digits>.tmp"), which then takes the
+// place of the old one and has its permissions and, where the system allows, its owner. A symbolic
+// link is followed: the file it leads to is replaced. Folders are not made.
+//
+// Answers false with the cause in `error` when that fails; then what was there is there still, and
+// nothing else.
+[[nodiscard]] bool writeWholeFile(const std::filesystem::path& path,
+                                  std::span<const std::uint8_t> content, std::error_code& error);
+
+}  // namespace oxmv
+
+template <>
+struct std::is_error_code_enum<oxmv::FileError> : std::true_type {};

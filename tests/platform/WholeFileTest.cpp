@@ -1,0 +1,261 @@
+#include <csignal>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "oxmv/platform/WholeFile.h"
+#include "support/TempDir.h"
+
+namespace oxmv {
+namespace {
+
+namespace fs = std::filesystem;
+using test::TempDir;
+using Bytes = std::vector<std::uint8_t>;
+
+const Bytes oldContent = {'o', 'l', 'd'};
+const Bytes newContent = {'n', 'e', 'w', 0, 0xFF};
+
+void put(const fs::path& path, const Bytes& content) {
+  std::ofstream(path, std::ios::binary)
+      .write(reinterpret_cast<const char*>(content.data()),
+             static_cast<std::streamsize>(content.size()));
+}
+
+Bytes get(const fs::path& path) {
+  std::ifstream file(path, std::ios::binary);
+  return {std::istreambuf_iterator<char>(file), {}};
+}
+
+std::ptrdiff_t filesIn(const fs::path& folder) {
+  return std::distance(fs::directory_iterator(folder), {});
+}
+
+mode_t modeOf(const fs::path& path) {
+  struct stat status = {};
+  EXPECT_EQ(::lstat(path.c_str(), &status), 0);
+  return status.st_mode & 07777;
+}
+
+// Runs `body` in a process of its own, as a user who may not do everything; answers whether it
+// returned true.
+template <class Body>
+bool asOrdinaryUser(Body body) {
+  const pid_t child = ::fork();
+  if (child == 0) {
+    const bool isOrdinary = ::geteuid() != 0 || (::setegid(65534) == 0 && ::seteuid(65534) == 0);
+    ::_exit(isOrdinary && body() ? 0 : 1);
+  }
+  int status = 1;
+  EXPECT_EQ(::waitpid(child, &status, 0), child);
+  return WIFEXITED(status) && WEXITSTATUS(status) == 0;
+}
+
+TEST(ReadWholeFile, GivesTheContent) {
+  const TempDir folder;
+  put(folder / "clip", newContent);
+  std::error_code error = std::make_error_code(std::errc::io_error);
+  EXPECT_EQ(readWholeFile(folder / "clip", error), newContent);
+  EXPECT_FALSE(error);
+}
+
+TEST(ReadWholeFile, GivesNoBytesOfAnEmptyFile) {
+  const TempDir folder;
+  put(folder / "empty", {});
+  std::error_code error;
+  EXPECT_EQ(readWholeFile(folder / "empty", error), Bytes());
+}
+
+TEST(ReadWholeFile, ReadsPastTheSizeThatTheSystemNames) {
+  std::error_code error;
+  const auto content =
+      readWholeFile("/proc/self/status", error);  // a regular file that says it is empty
+  ASSERT_TRUE(content);
+  EXPECT_GT(content->size(), 100u);
+}
+
+TEST(ReadWholeFile, SaysThatThereIsNoSuchFile) {
+  const TempDir folder;
+  std::error_code error;
+  EXPECT_FALSE(readWholeFile(folder / "absent", error));
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+}
+
+TEST(ReadWholeFile, RefusesAFolder) {
+  const TempDir folder;
+  std::error_code error;
+  EXPECT_FALSE(readWholeFile(folder.path(), error));
+  EXPECT_EQ(error, std::errc::is_a_directory);
+}
+
+TEST(ReadWholeFile, RefusesAPipeWithoutWaitingForIt) {
+  const TempDir folder;
+  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
+  std::error_code error;
+  EXPECT_FALSE(readWholeFile(folder / "pipe", error));
+  EXPECT_EQ(error, FileError::notRegular);
+  EXPECT_EQ(error.message(), "Not a regular file");
+}
+
+TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
+  const TempDir folder;
+  put(folder / "large", {});
+  fs::resize_file(folder / "large", maxFileSize + 1);  // sparse
+  std::error_code error;
+  EXPECT_FALSE(readWholeFile(folder / "large", error));
+  EXPECT_EQ(error, FileError::tooLarge);
+}
+
+TEST(ReadWholeFile, SaysThatTheFileMayNotBeRead) {
+  const TempDir folder;
+  fs::permissions(folder.path(), fs::perms::all);
+  put(folder / "secret", oldContent);
+  fs::permissions(folder / "secret", fs::perms::none);
+  EXPECT_TRUE(asOrdinaryUser([&] {
+    std::error_code error;
+    return !readWholeFile(folder / "secret", error) && error == std::errc::permission_denied;
+  }));
+}
+
+TEST(WriteWholeFile, MakesANewFile) {
+  const TempDir folder;
+  const mode_t mask = ::umask(027);
+  std::error_code error = std::make_error_code(std::errc::io_error);
+  EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
+  ::umask(mask);
+  EXPECT_FALSE(error);
+  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(modeOf(folder / "clip"), 0640u);
+  EXPECT_EQ(filesIn(folder.path()), 1);
+}
+
+TEST(WriteWholeFile, ReplacesAFileAndKeepsItsPermissions) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  ASSERT_EQ(::chmod((folder / "clip").c_str(), 0604), 0);
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
+  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(modeOf(folder / "clip"), 0604u);
+  EXPECT_EQ(filesIn(folder.path()), 1);
+}
+
+TEST(WriteWholeFile, LeavesTheOldContentToThoseWhoHaveItOpen) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  std::ifstream reader(folder / "clip", std::ios::binary);
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
+  EXPECT_EQ(Bytes(std::istreambuf_iterator<char>(reader), {}), oldContent);
+}
+
+TEST(WriteWholeFile, WritesAnEmptyFile) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "clip", {}, error));
+  EXPECT_EQ(fs::file_size(folder / "clip"), 0u);
+}
+
+TEST(WriteWholeFile, FollowsSymbolicLinks) {
+  const TempDir folder;
+  fs::create_directory(folder / "inner");
+  put(folder / "inner/clip", oldContent);
+  fs::create_symlink("inner/clip", folder / "relative");
+  fs::create_symlink(folder / "relative", folder / "absolute");
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "absolute", newContent, error));
+  EXPECT_TRUE(fs::is_symlink(folder / "absolute"));
+  EXPECT_TRUE(fs::is_symlink(folder / "relative"));
+  EXPECT_EQ(get(folder / "inner/clip"), newContent);
+}
+
+TEST(WriteWholeFile, MakesTheFileThatALinkLeadsTo) {
+  const TempDir folder;
+  fs::create_symlink("target", folder / "link");
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "link", newContent, error));
+  EXPECT_TRUE(fs::is_symlink(folder / "link"));
+  EXPECT_EQ(get(folder / "target"), newContent);
+}
+
+TEST(WriteWholeFile, RefusesLinksThatLeadInACircle) {
+  const TempDir folder;
+  fs::create_symlink("b", folder / "a");
+  fs::create_symlink("a", folder / "b");
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "a", newContent, error));
+  EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+}
+
+TEST(WriteWholeFile, RefusesAFolder) {
+  const TempDir folder;
+  fs::create_directory(folder / "inner");
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "inner", newContent, error));
+  EXPECT_EQ(error, std::errc::is_a_directory);
+  EXPECT_TRUE(fs::is_directory(folder / "inner"));
+}
+
+TEST(WriteWholeFile, RefusesAPipe) {
+  const TempDir folder;
+  ASSERT_EQ(::mkfifo((folder / "pipe").c_str(), 0600), 0);
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "pipe", newContent, error));
+  EXPECT_EQ(error, FileError::notRegular);
+  EXPECT_TRUE(fs::is_fifo(folder / "pipe"));
+}
+
+TEST(WriteWholeFile, MakesNoFolders) {
+  const TempDir folder;
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "absent/clip", newContent, error));
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+  EXPECT_EQ(filesIn(folder.path()), 0);
+}
+
+TEST(WriteWholeFile, SaysThatTheFolderMayNotBeWritten) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  fs::permissions(folder.path(), fs::perms::owner_read | fs::perms::owner_exec |
+                                     fs::perms::others_read | fs::perms::others_exec);
+  EXPECT_TRUE(asOrdinaryUser([&] {
+    std::error_code error;
+    return !writeWholeFile(folder / "clip", newContent, error) &&
+           error == std::errc::permission_denied;
+  }));
+  fs::permissions(folder.path(), fs::perms::owner_all);
+  EXPECT_EQ(get(folder / "clip"), oldContent);
+}
+
+TEST(WriteWholeFile, KeepsTheOldFileAndNothingElseWhenWritingFails) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  struct rlimit before = {};
+  ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &before), 0);
+  const auto handler = std::signal(SIGXFSZ, SIG_IGN);
+  const struct rlimit small = {4096, before.rlim_max};
+  ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &small), 0);
+
+  std::error_code error;
+  const bool written = writeWholeFile(folder / "clip", Bytes(8192, 1), error);
+
+  ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &before), 0);
+  std::signal(SIGXFSZ, handler);
+  EXPECT_FALSE(written);
+  EXPECT_EQ(error, std::errc::file_too_large);
+  EXPECT_EQ(get(folder / "clip"), oldContent);
+  EXPECT_EQ(filesIn(folder.path()), 1);
+}
+
+}  // namespace
+}  // namespace oxmv
