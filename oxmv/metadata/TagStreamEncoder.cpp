@@ -20,8 +20,12 @@ namespace {
 // Characters of a text that a record holds; a NUL may follow them.
 constexpr std::uint32_t maxCharacters = 255;
 
-// A text's length, as far as it counts.
-std::uint32_t cutLength(std::string_view text) {
+// The characters of a text that are kept, as bytes: the same thing if they are ASCII.
+std::string_view keptBytes(std::string_view text) { return text.substr(0, maxCharacters); }
+
+// How many characters of a text are kept.
+std::uint32_t keptLength(std::string_view text) {
+  if (isAscii(keptBytes(text))) return static_cast<std::uint32_t>(keptBytes(text).size());
   // No character takes more than 4 bytes, so this many bytes hold more characters than are kept.
   constexpr std::size_t enough = 4 * (maxCharacters + 1);
   return static_cast<std::uint32_t>(
@@ -33,6 +37,8 @@ class Encoder {
   explicit Encoder(Layout layout) : isExact_(layout == Layout::exact) {}
 
   std::vector<std::uint8_t> encode(const Dictionary& tags) {
+    constexpr std::size_t ordinary = 4096;  // most clips fit, so that they grow no further
+    if (!tags.empty()) stream_.reserve(ordinary);
     putDictionary(tags, 0);
     return std::move(stream_);
   }
@@ -51,7 +57,8 @@ class Encoder {
     for (const char* key : {"PRCS", "UFRM"}) {
       if (const Value value = tags[key]; !value.isNothing()) putInteger(*findTagRow(key), value);
     }
-    if (const Value value = tags["TIMC"]; value.length() != 0) putText("TIMC"_tag, value.text(), 0);
+    if (const Value value = tags["TIMC"]; !value.text().empty())
+      putText("TIMC"_tag, value.text(), 0);
   }
 
   void putDeferred(const Dictionary& tags, int level) {
@@ -80,7 +87,7 @@ class Encoder {
       case Write::nested:
       case Write::controlPoint: break;
       case Write::text:
-        if (value.length() != 0) putText(row.tag, value.text(), 1);
+        if (!value.text().empty()) putText(row.tag, value.text(), 1);
         break;
       case Write::float32:
         putWord(row.tag, recordType::floats, std::bit_cast<std::uint32_t>(value.floatValue()));
@@ -132,23 +139,20 @@ class Encoder {
   // TIMC and for the elements of lists, a text whose length is a multiple of 4 fills its payload to
   // the end.
   void putText(Tag tag, std::string_view text, std::uint32_t room) {
-    putHeader(tag, recordType::text, paddedToFour(cutLength(text) + room));
-    putAscii(text, maxCharacters, paddedToFour(cutLength(text) + room));
+    const std::uint32_t size = paddedToFour(keptLength(text) + room);
+    putHeader(tag, recordType::text, size);
+    putAscii(keptBytes(text), size);
   }
 
   void putFourCC(Tag tag, std::string_view text) {
     putHeader(tag, recordType::fourCC, 4);
-    putAscii(text, 4, 4);
+    putAscii(text.substr(0, 4), 4);
   }
 
-  // At most `most` characters of a text, then zeros up to `size`; zeros only if one of those
-  // characters is not ASCII.
-  void putAscii(std::string_view text, std::size_t most, std::uint32_t size) {
-    const std::string_view kept =
-        text.substr(0, most);  // bytes: the same as characters if they are ASCII
+  // A text, then zeros up to `size`; zeros only if it is not ASCII.
+  void putAscii(std::string_view text, std::uint32_t size) {
     const std::size_t start = grow(size);
-    if (isAscii(kept))
-      std::copy(kept.begin(), kept.end(), stream_.begin() + static_cast<std::ptrdiff_t>(start));
+    if (isAscii(text)) std::copy(text.begin(), text.end(), stream_.data() + start);
   }
 
   void putData(const TagRow& row, std::span<const std::uint8_t> bytes) {
@@ -260,8 +264,9 @@ class Encoder {
   }
 
   void putHeader(Tag tag, std::uint8_t type, std::uint32_t size) {
-    putLe32(static_cast<std::uint32_t>(tag));
-    putLe32(headerWord(type, size));
+    const std::size_t start = grow(recordHeaderSize);
+    storeLe32(stream_.data() + start, static_cast<std::uint32_t>(tag));
+    storeLe32(stream_.data() + start + 4, headerWord(type, size));
   }
 
   void putLe32(std::uint32_t word) {

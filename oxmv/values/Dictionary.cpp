@@ -87,7 +87,7 @@ class Table final : public Shared {
     if (index_) index_->erase(static_cast<std::uint32_t>(place));
     entries_[place].value = Value();
     --size_;
-    if (entries_.size() >= 2 * size_ + searchedInLine) compact();
+    if (entries_.size() >= 2 * size_ + leastToCompact) compact();
   }
 
  private:
@@ -107,8 +107,11 @@ class Table final : public Shared {
     bool operator()(std::uint32_t a, std::string_view b) const { return table->key(a) < b; }
     bool operator()(std::string_view a, std::uint32_t b) const { return a < table->key(b); }
   };
-  // Up to so many entries are searched one by one, which is faster than any index.
-  static constexpr std::size_t searchedInLine = 32;
+  // Up to so many entries are searched one by one: dictionaries of tags, which never come to more,
+  // need no index.
+  static constexpr std::size_t searchedInLine = 256;
+
+  static constexpr std::size_t leastToCompact = 32;
 
   // `key` must not be there yet.
   void append(std::string_view key, Value value) {
