@@ -1,17 +1,39 @@
 #include "oxmv/metadata/MetadataDictionary.h"
 
+#include <utility>
+
 #include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagTable.h"
+#include "oxmv/values/Array.h"
 
 namespace oxmv {
+namespace {
 
 // The shortest record that holds a value: a header and a word.
 constexpr std::size_t shortestData = 12;
+
+bool accepts(const TagRow& row, const Value& value) {
+  switch (row.accept) {
+    case Accept::any: return !value.isNothing();
+    case Accept::number: return value.isNumber();
+    case Accept::array:
+      // Kept on purpose: a dictionary counts its entries, and may pass.
+      return value.array().size() == row.count || value.dictionary().size() == row.count;
+    // Kept on purpose: the data tags refuse data, too.
+    case Accept::never:
+    case Accept::unknown: return false;
+  }
+  return false;
+}
+
+}  // namespace
 
 MetadataDictionary& MetadataDictionary::init() {
   _simpleTags.reset();
   _isSingle = false;
   _eye = 0;
   _appID = preferencesAppID;
+  resetTagLabels();
   return *this;
 }
 
@@ -39,6 +61,13 @@ Dictionary MetadataDictionary::processBytes(std::span<const std::uint8_t> bytes,
 
 void MetadataDictionary::setMetadata(const std::optional<Dictionary>& tags) {
   _simpleTags = tags.value_or(Dictionary());
+}
+
+bool MetadataDictionary::addObject(Value value, std::string_view key) {
+  const TagRow* row = findTagRow(key);
+  if (row == nullptr || !accepts(*row, value)) return false;
+  if (!_simpleTags) _simpleTags.emplace();
+  return _simpleTags->set(key, std::move(value));
 }
 
 void MetadataDictionary::removeObject(std::string_view key) {

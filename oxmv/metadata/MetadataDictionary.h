@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <span>
 #include <string>
@@ -11,6 +12,7 @@
 #include <vector>
 
 #include "oxmv/metadata/StreamObserver.h"
+#include "oxmv/metadata/TagLabels.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/values/Dictionary.h"
 #include "oxmv/values/myGUID.h"
@@ -31,9 +33,11 @@ constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 class MetadataDictionary {
  public:
   // As after init(), with a zero GUID.
-  MetadataDictionary() = default;
+  MetadataDictionary() { init(); }
 
-  // Back to no tags at all, a combined object (not one eye's). The GUID stays.
+  // Back to no tags at all, a combined object (not one eye's). The GUID stays. Also forgets the
+  // table of labels, for all objects: the next translateTag() makes it anew. Kept on purpose, and
+  // without effect on labels handed out.
   MetadataDictionary& init();
 
   // Takes the tags from a stream; see processBytes(). Everything else stays as it was.
@@ -63,6 +67,15 @@ class MetadataDictionary {
   // Takes over a copy of the entries. None (std::nullopt) gives an empty dictionary.
   void setMetadata(const std::optional<Dictionary>& tags);
 
+  // Stores the value under the key, in place of an earlier one, if the tag table lets that tag take
+  // it: of the 188 tags accepted here 71 take any value, 95 a number of whatever range, 14 an array
+  // (or dictionary) of exactly so many elements; 8, the data tags, refuse everything, and enter a
+  // dictionary by decoding or setMetadata(). The value is stored as it is, never converted or cut.
+  //
+  // Answers whether the value is stored now; if not (unknown tag, wrong kind, wrong count, nothing)
+  // all is as it was.
+  bool addObject(Value value, std::string_view key);
+
   // Does nothing when there is no such key.
   void removeObject(std::string_view key);
 
@@ -78,6 +91,11 @@ class MetadataDictionary {
   // metaDataData() as hexadecimal digits, two lower-case ones a byte; empty when there are no
   // bytes.
   std::string metadataString() const;
+
+  // What people call a tag; null if it has no label. See tagLabel().
+  static std::shared_ptr<const std::string> translateTag(std::string_view tag) {
+    return tagLabel(tag);
+  }
 
   // How this object's tags are encoded unless a call says otherwise. init() leaves it as it is.
   Layout layout() const { return layout_; }
