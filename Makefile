@@ -1,0 +1,68 @@
+# Short names for what the presets, CMake and the scripts do; nothing is built or tested here only.
+
+PREFIX ?= /usr/local
+FUZZ_SECONDS ?= 60
+CMAKE_BUILD_PARALLEL_LEVEL ?= $(shell nproc)
+CTEST_PARALLEL_LEVEL ?= $(shell nproc)
+export CMAKE_BUILD_PARALLEL_LEVEL CTEST_PARALLEL_LEVEL
+
+# What clang-format looks after: every source that is tracked or about to be.
+sources = git ls-files -z --cached --others --exclude-standard -- '*.h' '*.cpp'
+
+MAKEFLAGS += --no-print-directory
+.NOTPARALLEL:
+.PHONY: help build demo test bench install format format-check tidy fuzz clean \
+        packages-build packages-test packages-bench packages-ci
+
+help: ## list these targets
+	@sed -nE 's/^([a-z-]+):[^#]*## (.*)/  make \1\t\2/p' Makefile | expand -t 20
+
+build: ## build the command: build/release/oxmv
+	cmake --preset release
+	cmake --build --preset release
+
+demo: packages-build build ## install what the build needs, build, and show the command at work
+	packaging/demo
+
+test: packages-test ## install what the tests need, build and run every test
+	cmake --preset dev
+	cmake --build --preset dev
+	ctest --preset dev
+
+bench: packages-bench ## measure: install what that needs, build, run the benchmarks
+	cmake --preset release -D OXMV_BENCH=ON
+	cmake --build --preset release --target oxmv_bench
+	build/release/bench/oxmv_bench
+
+install: build ## install below PREFIX, by default /usr/local; DESTDIR is honoured
+	cmake --install build/release --prefix "$(PREFIX)"
+
+format: ## format every source
+	$(sources) | xargs -0 clang-format -i
+
+format-check:
+	$(sources) | xargs -0 clang-format --dry-run -Werror
+
+tidy: ## run clang-tidy over the library and the command
+	cmake --preset dev
+	run-clang-tidy -quiet -p build/dev "$(CURDIR)/(oxmv|cli)/.*"
+
+fuzz: packages-ci ## look for new inputs that break something, FUZZ_SECONDS (60) for each target
+	cmake --preset fuzz
+	cmake --build --preset fuzz
+	packaging/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)
+
+clean: ## remove everything that was built
+	rm -rf build
+
+packages-build:
+	packaging/install-packages build
+
+packages-test:
+	packaging/install-packages build test
+
+packages-bench:
+	packaging/install-packages build bench
+
+packages-ci:
+	packaging/install-packages build ci

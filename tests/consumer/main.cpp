@@ -1,0 +1,18 @@
+// What a project that uses the library starts with: bytes in, a tag out.
+
+#include <cstdint>
+#include <iostream>
+
+#include "oxmv/Version.h"
+#include "oxmv/metadata/MetadataDictionary.h"
+
+int main() {
+  const std::uint8_t stream[] = {'T', 'I', 'M', 'C', 4, 0, 0, 'c', '1', ':', '0', 0};
+
+  oxmv::MetadataDictionary clip;
+  clip.initWithData(stream);
+
+  const auto timecode = clip.metadata()["TIMC"].text();
+  std::cout << "oxmv " << oxmv::version << ": TIMC " << timecode << '\n';
+  return timecode == "1:0" ? 0 : 1;
+}
