@@ -125,14 +125,17 @@ class Encoder {
   }
 
   void putInteger(const TagRow& row, const Value& value) {
-    const std::uint32_t word = integer(value);
-    switch (row.write) {
-      case Write::integerH: return putWord(row.tag, recordType::integerH, word);
-      case Write::integerR: return putWord(row.tag, recordType::integerR, word);
-      case Write::word16: return putWord(row.tag, recordType::small, word & 0xFFFF);
-      case Write::byte8: return putWord(row.tag, recordType::small, word & 0xFF);
-      default: return putWord(row.tag, recordType::integerL, word);
-    }
+    std::uint32_t word = integer(value);
+    if (row.write == Write::word16) word &= 0xFFFF;
+    if (row.write == Write::byte8) word &= 0xFF;
+    putWord(row.tag, integerType(row.write), word);
+  }
+
+  static std::uint8_t integerType(Write rule) {
+    if (rule == Write::integerH) return recordType::integerH;
+    if (rule == Write::integerR) return recordType::integerR;
+    if (rule == Write::word16 || rule == Write::byte8) return recordType::small;
+    return recordType::integerL;
   }
 
   // Texts go out in ASCII. `room` is what the size leaves for a NUL: with 0, kept on purpose for

@@ -23,7 +23,11 @@ class ArrayBox final : public Shared {
 
 namespace {
 
-constexpr std::size_t wordSize = 4;
+constexpr std::size_t wordSize = 4;  // of a float or integer in a block
+
+const std::vector<Value>& boxed(const detail::Shared& owner) {
+  return static_cast<const detail::ArrayBox&>(owner).elements;
+}
 
 }  // namespace
 
@@ -34,29 +38,20 @@ Array::Array(std::vector<Value> elements) {
 
 std::size_t Array::size() const noexcept {
   const Slot slot = value_.slot_;
-  switch (slot.form()) {
-    case Form::floats:
-    case Form::integers: return slot.size() / wordSize;
-    case Form::list: return value_.block().header(slot.body).count;
-    case Form::arrayBox:
-      return value_.owner() == nullptr
-                 ? 0
-                 : static_cast<const detail::ArrayBox*>(value_.owner())->elements.size();
-    default: return 0;
-  }
+  if (value_.owner() == nullptr) return 0;
+  if (slot.form() == Form::arrayBox) return boxed(*value_.owner()).size();
+  if (slot.form() == Form::list) return value_.block().header(slot.body).count;
+  return slot.size() / wordSize;
 }
 
 Value Array::operator[](std::size_t index) const {
   const Slot slot = value_.slot_;
-  const auto word = [&] { return loadLe32(value_.block().bytes(slot).data() + index * wordSize); };
-  switch (slot.form()) {
-    case Form::floats: return Value(std::bit_cast<float>(word()));
-    case Form::integers: return Value(std::bit_cast<std::int32_t>(word()));
-    case Form::list: return Value::in(value_.block(), value_.block().items(slot.body)[index]);
-    case Form::arrayBox:
-      return static_cast<const detail::ArrayBox*>(value_.owner())->elements[index];
-    default: return {};
-  }
+  if (slot.form() == Form::arrayBox) return boxed(*value_.owner())[index];
+  const detail::Block& block = value_.block();
+  if (slot.form() == Form::list) return Value::in(block, block.items(slot.body)[index]);
+  const std::uint32_t word = loadLe32(block.bytes(slot).data() + index * wordSize);
+  return slot.form() == Form::floats ? Value(std::bit_cast<float>(word))
+                                     : Value(std::bit_cast<std::int32_t>(word));
 }
 
 bool operator==(const Array& a, const Array& b) {

@@ -166,17 +166,11 @@ double Value::doubleValue() const noexcept {
 }
 
 std::span<const std::uint8_t> Value::payload() const noexcept {
-  switch (slot_.form()) {
-    case Form::text:
-    case Form::data: return block().bytes(slot_);
-    case Form::wholeText:
-    case Form::wholeDerivedText:
-    case Form::wholeData:
-      if (content_.owner != nullptr) return block().bytes();
-      break;
-    default: break;
-  }
-  return {};
+  const Form form = slot_.form();
+  if (form == Form::text || form == Form::data) return block().bytes(slot_);
+  const bool isWhole =
+      form == Form::wholeText || form == Form::wholeDerivedText || form == Form::wholeData;
+  return isWhole && content_.owner != nullptr ? block().bytes() : std::span<const std::uint8_t>();
 }
 
 std::string_view Value::text() const& noexcept {
