@@ -16,9 +16,9 @@ endif()
 # Kept as a list of their own: whatever links a sanitized library needs them too, such as the
 # consumer in tests/.
 set(oxmv_sanitizer_flags "")
-if(OXMV_SANITIZE OR OXMV_FUZZ)
+if(OXMV_SANITIZE)
   set(oxmv_sanitizer_flags
-    -fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
+    -fsanitize=${OXMV_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
 endif()
 target_compile_options(oxmv_flags INTERFACE
   ${oxmv_sanitizer_flags} $<$<BOOL:${OXMV_FUZZ}>:-fsanitize=fuzzer-no-link>)
