@@ -3,14 +3,12 @@
 #include <utility>
 
 #include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
 
 namespace oxmv {
 namespace {
-
-// The shortest record that holds a value: a header and a word.
-constexpr std::size_t shortestData = 12;
 
 bool accepts(const TagRow& row, const Value& value) {
   switch (row.accept) {

@@ -20,6 +20,10 @@ namespace oxmv {
 constexpr std::size_t recordHeaderSize = 8;
 constexpr std::uint32_t maxRecordSize = 0xFFFFFF;
 
+// Fewer bytes than the shortest record that holds a number are not taken for a stream when a clip
+// is loaded.
+constexpr std::size_t shortestData = 12;
+
 constexpr std::uint32_t paddedToFour(std::uint32_t size) { return (size + 3) & ~3u; }
 
 // `size` has 24 bits, so nothing overflows before the mask.
