@@ -54,8 +54,6 @@ Value Array::operator[](std::size_t index) const {
                                      : Value(std::bit_cast<std::int32_t>(word));
 }
 
-bool operator==(const Array& a, const Array& b) {
-  return std::equal(a.begin(), a.end(), b.begin(), b.end());
-}
+bool operator==(const Array& a, const Array& b) { return Value(a) == Value(b); }
 
 }  // namespace oxmv

@@ -218,10 +218,6 @@ bool Dictionary::remove(std::string_view key) {
   return true;
 }
 
-bool operator==(const Dictionary& a, const Dictionary& b) {
-  return a.size() == b.size() &&
-         std::all_of(a.begin(), a.end(),
-                     [&](const Dictionary::Entry& entry) { return b[entry.key] == entry.value; });
-}
+bool operator==(const Dictionary& a, const Dictionary& b) { return Value(a) == Value(b); }
 
 }  // namespace oxmv

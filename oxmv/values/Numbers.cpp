@@ -32,8 +32,8 @@ bool isHuge(std::string_view number) {
   const std::size_t first = std::min(number.find_first_of("123456789"), end);
   auto magnitude = static_cast<std::int64_t>(point) - static_cast<std::int64_t>(first);
   if (end < number.size() && (number[end] == 'e' || number[end] == 'E')) {
-    magnitude += leadingInteger(number.substr(end + 1)) /
-                 2;  // halved: the sum cannot overflow, the sign stays
+    constexpr std::int64_t most = std::int64_t{1} << 60;  // so that the sum cannot overflow
+    magnitude += std::clamp(leadingInteger(number.substr(end + 1)), -most, most);
   }
   return magnitude > 0;
 }

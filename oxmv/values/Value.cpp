@@ -189,21 +189,52 @@ Dictionary Value::dictionary() const {
   return kind() == Kind::dictionary ? Dictionary(*this) : Dictionary();
 }
 
-bool operator==(const Value& a, const Value& b) {
+// What is equal but for the elements and entries of two containers; those are put into `rest`, to
+// be compared in their turn: values may be nested deeper than a stack is.
+bool Value::equalOutside(const Value& a, const Value& b, Pairs& rest) {
   if (a.kind() != b.kind()) return false;
   switch (a.kind()) {
-    case Value::Kind::nothing: return true;
-    case Value::Kind::integer: return a.content_.integer == b.content_.integer;
-    case Value::Kind::float32: return a.slot_.body == b.slot_.body;
-    case Value::Kind::float64:
+    case Kind::nothing: return true;
+    case Kind::integer: return a.content_.integer == b.content_.integer;
+    case Kind::float32: return a.slot_.body == b.slot_.body;
+    case Kind::float64:
       return std::bit_cast<std::uint64_t>(a.content_.float64) ==
              std::bit_cast<std::uint64_t>(b.content_.float64);
-    case Value::Kind::text:
-    case Value::Kind::data: return std::ranges::equal(a.payload(), b.payload());
-    case Value::Kind::array: return a.array() == b.array();
-    case Value::Kind::dictionary: return a.dictionary() == b.dictionary();
+    case Kind::text:
+    case Kind::data: return std::ranges::equal(a.payload(), b.payload());
+    case Kind::array:
+    case Kind::dictionary: rest.emplace_back(a, b); return true;
   }
   return false;
+}
+
+bool Value::equalInside(const Array& a, const Array& b, Pairs& rest) {
+  if (a.size() != b.size()) return false;
+  for (std::size_t i = 0; i < a.size(); ++i) {
+    if (!equalOutside(a[i], b[i], rest)) return false;
+  }
+  return true;
+}
+
+bool Value::equalInside(const Dictionary& a, const Dictionary& b, Pairs& rest) {
+  return a.size() == b.size() &&
+         std::all_of(a.begin(), a.end(), [&](const Dictionary::Entry& entry) {
+           return equalOutside(entry.value, b[entry.key], rest);
+         });
+}
+
+bool operator==(const Value& a, const Value& b) {
+  std::vector<std::pair<Value, Value>> rest;
+  if (!Value::equalOutside(a, b, rest)) return false;
+  while (!rest.empty()) {
+    const auto [x, y] = std::move(rest.back());
+    rest.pop_back();
+    const bool isEqual = x.kind() == Value::Kind::array
+                             ? Value::equalInside(x.array(), y.array(), rest)
+                             : Value::equalInside(x.dictionary(), y.dictionary(), rest);
+    if (!isEqual) return false;
+  }
+  return true;
 }
 
 }  // namespace oxmv
