@@ -1,0 +1,16 @@
+// Names chosen by somebody who wants a hash table to be slow.
+
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <vector>
+
+namespace oxmv::test {
+
+// Different names of 16 ASCII characters, the last no NUL, that all have one and the same std::hash
+// in GNU's standard library, where that is not seeded. In another standard library they are just
+// names.
+std::vector<std::string> collidingNames(std::size_t count);
+
+}  // namespace oxmv::test
