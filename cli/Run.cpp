@@ -1,0 +1,126 @@
+#include "cli/Run.h"
+
+#include <algorithm>
+#include <initializer_list>
+#include <new>
+#include <string>
+#include <system_error>
+#include <vector>
+
+#include <fmt/format.h>
+
+#include "cli/Verb.h"
+
+namespace oxmv::cli {
+namespace {
+
+constexpr std::string_view introduction =
+    "oxmv shows, checks and makes the metadata tags of clips.\n"
+    "\n"
+    "  oxmv show CLIP                    the tags, with their labels\n"
+    "  oxmv check CLIP...                what is wrong with them, if anything\n"
+    "  oxmv encode TAGS.json -o CLIP     a clip from tags that you wrote\n"
+    "Help: oxmv help, oxmv help VERB\n";
+
+int exitCode(Outcome outcome) { return static_cast<int>(outcome); }
+
+void refuseTogether(const Arguments& arguments, std::initializer_list<Flag> flags) {
+  std::vector<std::string_view> given;
+  for (const Flag flag : flags) {
+    if (arguments.has(flag)) given.push_back(rowOf(flag).name);
+  }
+  if (given.size() > 1)
+    throw UsageError("bad-flags", fmt::format("{} do not go together", fmt::join(given, " and ")));
+}
+
+void checkFlags(const Verb& verb, const Arguments& arguments) {
+  for (const FlagRow& row : flagRows()) {
+    const auto takes = [&](std::span<const Flag> flags) {
+      return std::find(flags.begin(), flags.end(), row.flag) != flags.end();
+    };
+    if (arguments.has(row.flag) && !takes(verb.flags) && !takes(commonFlags))
+      throw UsageError("bad-flags", fmt::format("{} takes no {}; see oxmv help {}", verb.name,
+                                                row.name, verb.name));
+  }
+  refuseTogether(arguments, {Flag::quiet, Flag::verbose});
+  refuseTogether(arguments, {Flag::json, Flag::ndjson, Flag::csv});
+}
+
+void checkWords(const Verb& verb, std::size_t count) {
+  if (count < verb.fewestWords)
+    throw UsageError("missing-words", fmt::format("{} needs {}", verb.name, verb.words));
+  if (count > verb.mostWords)
+    throw UsageError("surplus-words",
+                     verb.words.empty()
+                         ? fmt::format("{} takes nothing behind it", verb.name)
+                         : fmt::format("{} takes {}, not {} words", verb.name, verb.words, count));
+}
+
+// The verb that --help and --version stand for, wherever they are.
+const Verb& verbOf(const Arguments& arguments) {
+  const auto& words = arguments.words();
+  const Verb* verb = words.empty() ? nullptr : &verbNamed(words.front());
+  if (arguments.has(Flag::help)) return helpVerb;
+  if (arguments.has(Flag::version)) return versionVerb;
+  if (verb == nullptr) throw UsageError("missing-verb", "these flags need a verb; see oxmv help");
+  return *verb;
+}
+
+void runVerb(const Arguments& arguments, StandardOutput& output, Messages& messages) {
+  const Verb& verb = verbOf(arguments);
+  std::span<const std::string> words = arguments.words();
+  // "show --help" is "help show"; of what else stands there nothing counts.
+  if (arguments.has(Flag::help)) {
+    words = words.first(std::min<std::size_t>(words.size(), 1));
+  } else if (arguments.has(Flag::version)) {
+    words = {};
+  } else {
+    words = words.subspan(1);
+    checkFlags(verb, arguments);
+    checkWords(verb, words.size());
+  }
+  Call call{words, arguments, output, styleFor(StandardOutput::isTerminal(), arguments), messages};
+  verb.run(call);
+}
+
+int runArguments(std::span<const char* const> argv, StandardOutput& output) {
+  const Arguments arguments = Arguments::parse(argv);
+  Messages messages(output, arguments);
+  try {
+    if (argv.size() <= 1) {
+      output.write(introduction);
+    } else {
+      runVerb(arguments, output, messages);
+    }
+    output.flush();
+  } catch (const OutputFailed& failure) {
+    // Whoever closed the pipe has seen enough, and needs no message.
+    messages.raise(Outcome::failed);
+    if (failure.error != std::errc::broken_pipe)
+      messages.error("standard output", failure.error.message(), "write-failed");
+  }
+  return exitCode(messages.outcome());
+}
+
+int fail(Outcome outcome, std::string_view what, std::string_view code) {
+  writeStandardError(fmt::format("oxmv: error: {} ({})\n", what, code));
+  return exitCode(outcome);
+}
+
+}  // namespace
+
+int run(std::span<const char* const> argv) {
+  prepareStandardStreams();
+  StandardOutput output;
+  try {
+    return runArguments(argv, output);
+  } catch (const UsageError& error) {
+    return fail(Outcome::usage, error.what(), error.code());
+  } catch (const std::bad_alloc&) {
+    return fail(Outcome::failed, "not enough memory", "no-memory");
+  } catch (...) {
+    return fail(Outcome::bug, "a bug in oxmv; please report what you called it with", "bug");
+  }
+}
+
+}  // namespace oxmv::cli

@@ -1,0 +1,155 @@
+#include <algorithm>
+#include <array>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <system_error>
+#include <utility>
+#include <variant>
+#include <vector>
+
+#include <fmt/format.h>
+
+#include "cli/Characters.h"
+#include "cli/Inputs.h"
+#include "cli/TagJson.h"
+#include "cli/ValueText.h"
+#include "cli/Verb.h"
+#include "oxmv/metadata/Losses.h"
+#include "oxmv/metadata/TagStreamEncoder.h"
+#include "oxmv/platform/WholeFile.h"
+
+namespace oxmv::cli {
+namespace {
+
+constexpr std::string_view standardOutput = "-";
+
+Layout layoutOf(const Arguments& arguments) {
+  constexpr auto choices = std::to_array<std::string_view>({"exact", "readable"});
+  return arguments.choice(Flag::layout, choices) == 0 ? Layout::exact : Layout::readable;
+}
+
+// More lines than this hide what they say.
+constexpr std::size_t lossesSaid = 20;
+
+std::vector<LossCode> allowedLosses(const Arguments& arguments) {
+  std::vector<LossCode> allowed;
+  for (const std::string& text : arguments.values(Flag::allow)) {
+    const auto code = lossCodeOf(text);
+    if (!code)
+      throw UsageError("bad-value", fmt::format("--allow knows no code \"{}\"; a refusal names it",
+                                                visible(text)));
+    allowed.push_back(*code);
+  }
+  return allowed;
+}
+
+void checkOutput(const Call& call, const std::string& input) {
+  if (!call.arguments.has(Flag::output))
+    throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
+  std::error_code ignored;  // what is not there is not the same
+  if (std::filesystem::equivalent(input, call.arguments.value(Flag::output), ignored))
+    throw UsageError("same-file", "the output would take the place of the input");
+}
+
+std::optional<Dictionary> readTags(Call& call, const std::string& name) {
+  const auto content = readInput(name);
+  if (const auto* problem = std::get_if<FileProblem>(&content)) {
+    call.messages.error(name, problem->message, problem->code);
+    return std::nullopt;
+  }
+  auto tags = readTagJson(asText(std::get<Bytes>(content)));
+  if (const auto* error = std::get_if<JsonError>(&tags)) {
+    call.messages.error(
+        name, fmt::format("line {}, column {}: {}", error->line, error->column, error->message),
+        error->code);
+    return std::nullopt;
+  }
+  return std::get<Dictionary>(std::move(tags));
+}
+
+std::string inWords(const Loss& loss) {
+  return visible(fmt::format("{} {}", loss.path, loss.message));
+}
+
+std::string wayOut(const Loss& loss) {
+  if (loss.avoidedBy == Layout::readable) return "--layout readable avoids it";
+  return fmt::format("--allow {} lets it through", codeOf(loss.code));
+}
+
+void refuse(Call& call, const std::string& name, const std::vector<Loss>& losses) {
+  for (std::size_t i = 0; i < std::min(losses.size(), lossesSaid); ++i)
+    call.messages.refused(name, inWords(losses[i]), codeOf(losses[i].code),
+                          fmt::format("nothing written; {}", wayOut(losses[i])));
+  if (losses.size() > lossesSaid)
+    call.messages.refused(name, fmt::format("{} losses more", losses.size() - lossesSaid));
+}
+
+// Whether the tags may be written. Those losses that are allowed are said as warnings.
+bool passes(Call& call, const std::string& name, const Dictionary& tags, Layout layout,
+            const std::vector<LossCode>& allowed) {
+  std::vector<Loss> refused;
+  for (Loss& loss : findLosses(tags, layout)) {
+    if (std::find(allowed.begin(), allowed.end(), loss.code) == allowed.end()) {
+      refused.push_back(std::move(loss));
+    } else {
+      call.messages.warning(name, inWords(loss), codeOf(loss.code));
+    }
+  }
+  refuse(call, name, refused);
+  return refused.empty();
+}
+
+void write(Call& call, const std::string& output, const Bytes& stream) {
+  if (call.arguments.has(Flag::dryRun))
+    return call.messages.note(output, fmt::format("would get {}", counted(stream.size(), "byte")));
+  if (output == standardOutput) return call.output.write(asText(stream));
+  std::error_code error;
+  if (!writeWholeFile(output, stream, error))
+    return call.messages.error(output, error.message(), "write-failed");
+  call.messages.note(output, fmt::format("got {}", counted(stream.size(), "byte")));
+}
+
+void run(Call& call) {
+  const std::string& input = call.words.front();
+  const Layout layout = layoutOf(call.arguments);
+  const std::vector<LossCode> allowed = allowedLosses(call.arguments);
+  checkOutput(call, input);
+  const std::string output = call.arguments.value(Flag::output);
+  if (output == standardOutput && StandardOutput::isTerminal())
+    return call.messages.refused("standard output", "a clip is binary, and this is a terminal",
+                                 "binary-to-terminal");
+
+  const auto tags = readTags(call, input);
+  if (!tags) return;
+  if (!passes(call, input, *tags, layout, allowed)) return;
+  const auto stream = encodeStream(*tags, layout);
+  if (!stream) return call.messages.error(input, "not enough memory", "no-memory");
+  write(call, output, *stream);
+}
+
+constexpr auto flags = std::to_array({Flag::output, Flag::layout, Flag::allow, Flag::dryRun});
+
+}  // namespace
+
+const Verb encodeVerb = {
+    .name = "encode",
+    .words = "FILE.json",
+    .summary = "make a clip of tags in JSON",
+    .examples =
+        "oxmv encode tags.json -o clip.colr\n"
+        "oxmv show --json clip.colr | jq '.[0].tags' | oxmv encode - -o copy.colr\n"
+        "oxmv encode tags.json -o clip.colr --layout readable\n",
+    .details =
+        "Tags that would not read back as they are in FILE.json are refused, each with a code,\n"
+        "and nothing is written; --allow CODE lets losses of that code through. The layout\n"
+        "\"exact\" is what writers of clips have always made; \"readable\" pads all records, so\n"
+        "that data of any size read back. A file that is there is replaced, whole or not at\n"
+        "all. What is wrong with FILE.json is said with its line and column.\n",
+    .flags = flags,
+    .fewestWords = 1,
+    .mostWords = 1,
+    .run = run,
+};
+
+}  // namespace oxmv::cli

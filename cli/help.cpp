@@ -1,0 +1,91 @@
+#include <algorithm>
+#include <array>
+#include <string>
+#include <vector>
+
+#include <fmt/format.h>
+
+#include "cli/Verb.h"
+
+namespace oxmv::cli {
+namespace {
+
+constexpr std::string_view commandExamples =
+    "oxmv show clip.colr\n"
+    "oxmv show --csv --columns REEL,TIMC,TAKE *.colr > clips.csv\n"
+    "oxmv check *.colr\n";
+
+constexpr std::string_view exitCodes =
+    "  0    done; nothing found\n"
+    "  1    the answer is no: something was found, nothing matches\n"
+    "  2    called in a way that means nothing; nothing was touched\n"
+    "  3    a file could not be read or written; the others were done\n"
+    "  4    refused, to protect data\n"
+    "  70   a bug in oxmv\n";
+
+// Each line, indented.
+std::string indented(std::string_view lines) {
+  std::string text;
+  while (!lines.empty()) {
+    const std::string_view line = lines.substr(0, lines.find('\n'));
+    text += fmt::format("  {}\n", line);
+    lines.remove_prefix(std::min(line.size() + 1, lines.size()));
+  }
+  return text;
+}
+
+std::string flagLines(std::span<const Flag> flags) {
+  std::string text;
+  for (const Flag flag : flags) {
+    const FlagRow& row = rowOf(flag);
+    const std::string name =
+        fmt::format("{:>2}{} {}{}{}", row.letter, row.letter.empty() ? " " : ",", row.name,
+                    row.argument.empty() ? "" : " ", row.argument);
+    text += fmt::format("  {:<24}  {}\n", name, row.says);
+  }
+  return text;
+}
+
+std::string commandHelp(const Style& style) {
+  std::string text = style.heading("Examples") + '\n' + indented(commandExamples);
+  text += '\n' + style.heading("Verbs") + '\n';
+  for (const Verb* verb : verbs()) {
+    const std::string name = fmt::format("{:<8} {}", verb->name, verb->words);
+    text += fmt::format("  {:<30}  {}\n", name, verb->summary);
+  }
+  text += '\n' + style.heading("Flags for every verb, before or behind it") + '\n';
+  text += flagLines(commonFlags);
+  text += '\n' + style.heading("Exit codes") + '\n';
+  text += exitCodes;
+  return text + "\noxmv help VERB says more about one of them.\n";
+}
+
+std::string verbHelp(const Verb& verb, const Style& style) {
+  std::string text = style.heading("Examples") + '\n' + indented(verb.examples);
+  text += fmt::format("\n{}\n  oxmv {}{}{}\n  {}.\n", style.heading("Use"), verb.name,
+                      verb.words.empty() ? "" : " ", verb.words, verb.summary);
+  if (!verb.details.empty()) text += '\n' + indented(verb.details);
+  text += '\n' + style.heading("Flags") + '\n' + flagLines(verb.flags) + flagLines(commonFlags);
+  return text;
+}
+
+void run(Call& call) {
+  call.output.write(call.words.empty() ? commandHelp(call.style)
+                                       : verbHelp(verbNamed(call.words.front()), call.style));
+}
+
+}  // namespace
+
+const Verb helpVerb = {
+    .name = "help",
+    .words = "[VERB]",
+    .summary = "show what the command can do, or all about a verb",
+    .examples = "oxmv help\noxmv help show\n",
+    .details = "",
+    .flags = {},
+    .fewestWords = 0,
+    .mostWords = 1,
+    .run = run,
+};
+
+}  // namespace oxmv::cli
