@@ -342,12 +342,12 @@ class Decoder {
   Slot asUtf8(Slot name) {
     const std::string_view raw = textOf(name);
     if (isUtf8(raw)) return name;
-    // Each byte becomes at most two: a name this long is cut, for a slot to hold it.
-    const std::string converted = utf8FromLatin1(raw.substr(0, Slot::maxSize / 2));
+    const std::string converted = utf8FromLatin1(raw);
     return putExtra(converted);
   }
 
   Slot putExtra(std::string_view text) {
+    static_assert(2 * maxRecordSize <= Slot::maxSize, "each byte of a name becomes at most two");
     if (text.size() > maxExtra - extra_.size()) throw std::bad_alloc();
     const auto offset = static_cast<std::uint32_t>(bytes_.size() + extra_.size());
     extra_ += text;

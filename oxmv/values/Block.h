@@ -52,18 +52,22 @@ struct Slot {
   std::uint32_t formAndSize = 0;
   std::uint32_t body = 0;
 
-  // Sizes come from records, whose size field has 24 bits.
-  static constexpr std::uint32_t maxSize = 0xFFFFFF;
+  // Sizes come from records, whose size field has 24 bits; a name that had to be converted to UTF-8
+  // may take twice as many bytes.
+  static constexpr std::uint32_t maxSize = 0xFFFFFFF;
 
   static constexpr Slot scalar(Form form, std::uint32_t body) {
     return {static_cast<std::uint32_t>(form), body};
   }
   static constexpr Slot place(Form form, std::uint32_t size, std::uint32_t offset) {
-    return {static_cast<std::uint32_t>(form) | size << 8, offset};
+    return {static_cast<std::uint32_t>(form) | size << formBits, offset};
   }
 
-  constexpr Form form() const { return static_cast<Form>(formAndSize & 0xFF); }
-  constexpr std::uint32_t size() const { return formAndSize >> 8; }
+  constexpr Form form() const { return static_cast<Form>(formAndSize & ((1u << formBits) - 1)); }
+  constexpr std::uint32_t size() const { return formAndSize >> formBits; }
+
+  static constexpr int formBits = 4;
+  static_assert(static_cast<int>(Form::dictionaryBox) < 1 << formBits, "every form fits");
 };
 
 // A dictionary's key in 4 bytes: the characters of a key of four ASCII characters, or where the

@@ -1,0 +1,131 @@
+// Hosts call the library from threads of theirs, whose stacks may be small.
+
+#include <functional>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagStreamEncoder.h"
+#include "oxmv/values/Array.h"
+#include "tests/support/Printing.h"
+#include "tests/support/SmallStack.h"
+#include "tests/support/StreamBuilder.h"
+#include "tests/support/TestData.h"
+
+namespace oxmv::test {
+namespace {
+
+#if defined(__SANITIZE_ADDRESS__)
+#define OXMV_ADDRESS_SANITIZER
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define OXMV_ADDRESS_SANITIZER
+#endif
+#endif
+
+#ifdef OXMV_ADDRESS_SANITIZER
+// The sanitizer surrounds every variable with bytes that nobody may touch, which makes each of the
+// 64 frames of a deep stream several times larger.
+constexpr std::size_t stackSize = 1024 * 1024;
+constexpr std::size_t mayTake = stackSize;
+#else
+constexpr std::size_t stackSize = 128 * 1024;
+#ifdef __OPTIMIZE__
+constexpr std::size_t mayTake = 64 * 1024;  // what we promise hosts
+#else
+constexpr std::size_t mayTake = stackSize;  // an unoptimised build has a place for every temporary
+#endif
+#endif
+
+void expectSmallStack(const std::function<void()>& work) {
+  EXPECT_LE(stackUsedBy(work, stackSize), mayTake);
+}
+
+// As deep as streams nest and deeper, with something of every kind at every level.
+Bytes deepStream() {
+  Bytes level;
+  for (int i = 0; i < 100; ++i) {
+    StreamBuilder outer;
+    outer.record("TAGN", 'c', "Caf\xE9").record("TAGV", 'L', i).record("KWRd", 'c', "word");
+    const Bytes point = StreamBuilder().raw(Bytes(8, 1)).raw(level).bytes();
+    outer.record(i % 2 == 0 ? "CTLp" : "COL1", 0, i % 2 == 0 ? point : level);
+    for (int name = 0; name < 20; ++name)
+      outer.record("REGN", 'c', std::to_string(name)).record("REGV", 'L', name);
+    level = outer.bytes();
+  }
+  return level;
+}
+
+Dictionary decodedFrom(const Bytes& stream) {
+  return decodeStream(stream, static_cast<std::int32_t>(stream.size()));
+}
+
+TEST(Stack, DecodesEncodesComparesAndDropsADeepStream) {
+  const Bytes stream = deepStream();
+  expectSmallStack([&] {
+    const Dictionary tags = decodedFrom(stream);
+    EXPECT_EQ(tags.size(), 4u);
+    const auto encodedTags = encodeStream(tags, Layout::readable);
+    ASSERT_TRUE(encodedTags);
+    EXPECT_GT(encodedTags->size(), 64u * 100u);
+    EXPECT_TRUE(decodedFrom(stream) == tags);
+  });
+}
+
+TEST(Stack, ChangesADeepDictionary) {
+  const Bytes stream = deepStream();
+  expectSmallStack([&] {
+    Dictionary tags = decodedFrom(stream);
+    tags.set("REEL", "A001");
+    const Dictionary copy = tags;
+    tags.remove("REG ");
+    EXPECT_EQ(copy.size(), 5u);
+    EXPECT_EQ(tags.size(), 4u);
+  });
+}
+
+TEST(Stack, DecodesEncodesAndDropsAnOrdinaryStream) {
+  const Bytes stream = testData("streams/typical-clip.colr");
+  expectSmallStack([&] {
+    MetadataDictionary clip;
+    clip.initWithData(stream);
+    EXPECT_TRUE(clip.haveMetadata());
+    const auto written = clip.metaDataData();
+    ASSERT_TRUE(written);
+    EXPECT_FALSE(clip.metadataString().empty());
+    clip.init();
+  });
+}
+
+TEST(Stack, DropsValuesAMillionDeep) {
+  expectSmallStack([] {
+    Value value(1);
+    for (int i = 0; i < 1'000'000; ++i) {
+      if (i % 2 == 0) {
+        value = Array::of(value);
+      } else {
+        value = Dictionary{{"COL1", value}};
+      }
+    }
+    EXPECT_EQ(value.kind(), Value::Kind::dictionary);
+  });
+}
+
+TEST(Stack, DecodesMillionsOfLevelsAndManyNames) {
+  StreamBuilder levels, names;
+  for (std::uint32_t size = 0xFFFFF0;; size -= 8) {
+    levels.header("COL1", size, 0);
+    if (size == 0) break;
+  }
+  for (int i = 0; i < 10'000; ++i)
+    names.record("TAGN", 'c', std::to_string(i) + '\xE9').record("TAGV", 'L', i);
+  expectSmallStack([&] {
+    EXPECT_EQ(decodedFrom(levels.bytes()).size(), 1u);
+    EXPECT_EQ(decodedFrom(names.bytes())["TAG "].dictionary().size(), 10'000u);
+  });
+}
+
+}  // namespace
+}  // namespace oxmv::test

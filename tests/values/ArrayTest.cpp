@@ -1,0 +1,74 @@
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "oxmv/values/Array.h"
+#include "oxmv/values/Dictionary.h"
+#include "tests/support/Printing.h"
+
+namespace oxmv::test {
+namespace {
+
+TEST(Array, IsEmptyByDefault) {
+  const Array array;
+  EXPECT_TRUE(array.empty());
+  EXPECT_EQ(array.size(), 0u);
+  EXPECT_TRUE(array.begin() == array.end());
+}
+
+TEST(Array, KeepsItsElementsInOrder) {
+  const Array array = Array::of(3, "two", 1.5f, Array::of(1), Dictionary{{"k", 2}});
+  ASSERT_EQ(array.size(), 5u);
+  EXPECT_FALSE(array.empty());
+  EXPECT_EQ(array[0], Value(3));
+  EXPECT_EQ(array[1], Value("two"));
+  EXPECT_EQ(array[2], Value(1.5f));
+  EXPECT_EQ(array[3], Value(Array::of(1)));
+  EXPECT_EQ(array[4], Value(Dictionary{{"k", 2}}));
+}
+
+TEST(Array, IteratesOverAllElements) {
+  std::vector<int> numbers;
+  for (const Value& value : Array::of(3, 1, 2)) numbers.push_back(value.intValue());
+  EXPECT_EQ(numbers, (std::vector{3, 1, 2}));
+
+  const Array array = Array::of(3, 1);
+  auto place = array.begin();
+  EXPECT_EQ(*place++, Value(3));
+  EXPECT_EQ(*place, Value(1));
+  EXPECT_TRUE(++place == array.end());
+}
+
+TEST(Array, OfAnArrayHoldsThatArray) {
+  const Array inner = Array::of(1, 2);
+  EXPECT_EQ(Array::of(inner).size(), 1u);
+  EXPECT_EQ(Array(inner).size(), 2u);
+}
+
+TEST(Array, MayHoldNothing) {
+  const Array array(std::vector<Value>{Value(), Value(1)});
+  ASSERT_EQ(array.size(), 2u);
+  EXPECT_TRUE(array[0].isNothing());
+}
+
+TEST(Array, CopyOutlivesTheOriginal) {
+  Array copy;
+  {
+    const Array original = Array::of("a text long enough to be on the heap, wherever it is kept");
+    copy = original;
+  }
+  EXPECT_EQ(copy[0].text(), "a text long enough to be on the heap, wherever it is kept");
+}
+
+TEST(Array, EqualsOneOfTheSameElementsInTheSameOrder) {
+  EXPECT_EQ(Array::of(1, 2), Array::of(1, 2));
+  EXPECT_EQ(Array(), Array(std::vector<Value>()));
+  EXPECT_FALSE(Array::of(1, 2) == Array::of(2, 1));
+  EXPECT_FALSE(Array::of(1, 2) == Array::of(1));
+  EXPECT_FALSE(Array::of(1) == Array::of(1, 2));
+  EXPECT_FALSE(Array::of(1) == Array());
+}
+
+}  // namespace
+}  // namespace oxmv::test

@@ -1,0 +1,358 @@
+#include <functional>
+#include <set>
+#include <string>
+#include <string_view>
+#include <thread>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "oxmv/values/Array.h"
+#include "oxmv/values/Dictionary.h"
+#include "tests/support/CollidingNames.h"
+#include "tests/support/Decoding.h"
+#include "tests/support/Printing.h"
+
+namespace oxmv::test {
+namespace {
+
+using namespace std::string_view_literals;
+
+std::string numbered(int number) { return "key " + std::to_string(number); }
+
+TEST(Dictionary, IsEmptyByDefault) {
+  const Dictionary dictionary;
+  EXPECT_TRUE(dictionary.empty());
+  EXPECT_EQ(dictionary.size(), 0u);
+  EXPECT_TRUE(dictionary.begin() == dictionary.end());
+  EXPECT_FALSE(dictionary.contains("REEL"));
+  EXPECT_TRUE(dictionary["REEL"].isNothing());
+}
+
+TEST(Dictionary, FindsWhatWasSet) {
+  Dictionary dictionary;
+  EXPECT_TRUE(dictionary.set("REEL", "A001"));
+  EXPECT_TRUE(dictionary.set("TAKE", 2));
+  EXPECT_EQ(dictionary.size(), 2u);
+  EXPECT_FALSE(dictionary.empty());
+  EXPECT_TRUE(dictionary.contains("REEL"));
+  EXPECT_EQ(dictionary["REEL"], Value("A001"));
+  EXPECT_EQ(dictionary["TAKE"], Value(2));
+  EXPECT_FALSE(dictionary.contains("SHOT"));
+  EXPECT_TRUE(dictionary["SHOT"].isNothing());
+}
+
+TEST(Dictionary, ComparesKeysByteForByte) {
+  const Dictionary dictionary{{"REEL", 1}};
+  for (const std::string_view other : {"reel"sv, "REE"sv, "REEL "sv, "REEL\0"sv, ""sv, "\0REE"sv})
+    EXPECT_FALSE(dictionary.contains(other)) << other;
+}
+
+TEST(Dictionary, RefusesNothing) {
+  Dictionary dictionary{{"REEL", "A001"}};
+  EXPECT_FALSE(dictionary.set("TAKE", Value()));
+  EXPECT_FALSE(dictionary.set("REEL", Value()));
+  EXPECT_EQ(dictionary, (Dictionary{{"REEL", "A001"}}));
+}
+
+TEST(Dictionary, ListOfEntriesLeavesNothingOutAndTakesTheLastOfAKey) {
+  const Dictionary dictionary{{"A", 1}, {"B", 2}, {"A", 3}, {"C", Value()}};
+  EXPECT_EQ(keys(dictionary), (Names{"A", "B"}));
+  EXPECT_EQ(dictionary["A"], Value(3));
+}
+
+// Order.
+
+TEST(Dictionary, KeepsTheOrderOfFirstInsertion) {
+  Dictionary dictionary;
+  for (const char* key : {"b", "REEL", "", "a", "long key"}) dictionary.set(key, 1);
+  EXPECT_EQ(keys(dictionary), (Names{"b", "REEL", "", "a", "long key"}));
+}
+
+TEST(Dictionary, ReplacedValueKeepsItsPlace) {
+  Dictionary dictionary{{"A", 1}, {"B", 2}, {"C", 3}};
+  EXPECT_TRUE(dictionary.set("A", "new"));
+  EXPECT_EQ(keys(dictionary), (Names{"A", "B", "C"}));
+  EXPECT_EQ(dictionary["A"], Value("new"));
+  EXPECT_EQ(dictionary.size(), 3u);
+}
+
+TEST(Dictionary, KeyRemovedAndAddedAgainGoesToTheEnd) {
+  Dictionary dictionary{{"A", 1}, {"B", 2}, {"C", 3}};
+  EXPECT_TRUE(dictionary.remove("A"));
+  EXPECT_TRUE(dictionary.set("A", 4));
+  EXPECT_EQ(keys(dictionary), (Names{"B", "C", "A"}));
+  EXPECT_EQ(dictionary["A"], Value(4));
+}
+
+TEST(Dictionary, RemovesWhatIsThereAndNothingElse) {
+  Dictionary dictionary{{"A", 1}, {"B", 2}, {"C", 3}};
+  EXPECT_FALSE(dictionary.remove("D"));
+  EXPECT_TRUE(dictionary.remove("B"));
+  EXPECT_FALSE(dictionary.remove("B"));
+  EXPECT_FALSE(dictionary.contains("B"));
+  EXPECT_TRUE(dictionary["B"].isNothing());
+  EXPECT_EQ(keys(dictionary), (Names{"A", "C"}));
+  EXPECT_EQ(dictionary.size(), 2u);
+
+  EXPECT_TRUE(dictionary.remove("A"));
+  EXPECT_TRUE(dictionary.remove("C"));
+  EXPECT_TRUE(dictionary.empty());
+  EXPECT_TRUE(dictionary.begin() == dictionary.end());
+}
+
+TEST(Dictionary, IteratesOverKeysAndValues) {
+  const Dictionary dictionary{{"A", 1}, {"B", "two"}};
+  auto place = dictionary.begin();
+  EXPECT_EQ((*place).key, "A");
+  EXPECT_EQ((*place++).value, Value(1));
+  EXPECT_EQ((*place).key, "B");
+  EXPECT_EQ((*place).value, Value("two"));
+  EXPECT_TRUE(++place == dictionary.end());
+}
+
+TEST(Dictionary, IteratesPastRemovedPlacesAtBothEnds) {
+  Dictionary dictionary{{"A", 1}, {"B", 2}, {"C", 3}, {"D", 4}, {"E", 5}};
+  for (const char* key : {"A", "C", "E"}) dictionary.remove(key);
+  EXPECT_EQ(keys(dictionary), (Names{"B", "D"}));
+}
+
+// Copies.
+
+TEST(Dictionary, CopiesAreIndependentBothWays) {
+  Dictionary original{{"A", 1}, {"B", 2}};
+  Dictionary copy = original;
+  copy.set("A", 10);
+  copy.remove("B");
+  copy.set("C", 30);
+  EXPECT_EQ(original, (Dictionary{{"A", 1}, {"B", 2}}));
+  original.set("A", 100);
+  EXPECT_EQ(copy, (Dictionary{{"A", 10}, {"C", 30}}));
+}
+
+TEST(Dictionary, DecodedCopiesAreIndependentBothWays) {
+  Dictionary original = decoded({'T', 'I', 'M', 'B', 4, 0, 0, 'B', 24, 0, 0, 0,  //
+                                 'T', 'I', 'M', 'D', 4, 0, 0, 'B', 1,  0, 0, 0});
+  Dictionary copy = original;
+  copy.set("TIMB", 30);
+  copy.set("TAKE", 3);
+  EXPECT_EQ(original, (Dictionary{{"TIMB", 24}, {"TIMD", 1}}));
+  original.remove("TIMD");
+  EXPECT_EQ(copy, (Dictionary{{"TIMB", 30}, {"TIMD", 1}, {"TAKE", 3}}));
+  EXPECT_EQ(keys(copy), (Names{"TIMB", "TIMD", "TAKE"}));
+  EXPECT_EQ(original, (Dictionary{{"TIMB", 24}}));
+}
+
+TEST(Dictionary, MayHoldACopyOfItself) {
+  Dictionary dictionary{{"A", 1}};
+  dictionary.set("self", dictionary);
+  dictionary.set("A", 2);
+  EXPECT_EQ(dictionary, (Dictionary{{"A", 2}, {"self", Dictionary{{"A", 1}}}}));
+}
+
+TEST(Dictionary, ValueSetFromAnEntryOfItsOwn) {
+  Dictionary dictionary{{"A", "a text long enough to be on the heap, wherever a text is kept"}};
+  dictionary.set("B", dictionary["A"]);
+  dictionary.remove("A");
+  EXPECT_EQ(dictionary["B"].text(),
+            "a text long enough to be on the heap, wherever a text is kept");
+}
+
+// A key handed out by a dictionary is valid until that dictionary is changed, so it is still valid
+// when the change is asked for.
+TEST(Dictionary, TakesAKeyThatItHandedOut) {
+  const Bytes stream = {'T', 'I', 'M', 'B', 4, 0, 0, 'B', 24, 0, 0, 0,  //
+                        'T', 'I', 'M', 'D', 4, 0, 0, 'B', 1,  0, 0, 0};
+  Dictionary dictionary = decoded(stream);
+  dictionary.set((*dictionary.begin()).key, 30);
+  EXPECT_EQ(dictionary, (Dictionary{{"TIMB", 30}, {"TIMD", 1}}));
+
+  dictionary = decoded(stream);
+  EXPECT_TRUE(dictionary.remove((*dictionary.begin()).key));
+  EXPECT_EQ(dictionary, (Dictionary{{"TIMD", 1}}));
+
+  dictionary = Dictionary{{"a key of no tag", 1}, {"another", 2}};
+  EXPECT_TRUE(dictionary.set((*dictionary.begin()).key, 3));
+  EXPECT_TRUE(dictionary.remove((*dictionary.begin()).key));
+  EXPECT_EQ(dictionary, (Dictionary{{"another", 2}}));
+}
+
+// Equality.
+
+TEST(Dictionary, EqualsWhateverTheOrder) {
+  EXPECT_EQ((Dictionary{{"A", 1}, {"B", 2}}), (Dictionary{{"B", 2}, {"A", 1}}));
+  EXPECT_EQ(Dictionary(), Dictionary{});
+  EXPECT_FALSE((Dictionary{{"A", 1}}) == (Dictionary{{"A", 2}}));
+  EXPECT_FALSE((Dictionary{{"A", 1}}) == (Dictionary{{"B", 1}}));
+  EXPECT_FALSE((Dictionary{{"A", 1}}) == (Dictionary{{"A", 1}, {"B", 2}}));
+  EXPECT_FALSE((Dictionary{{"A", 1}, {"B", 2}}) == (Dictionary{{"A", 1}}));
+}
+
+TEST(Dictionary, EqualsOnceEmptiedAnEmptyOne) {
+  Dictionary dictionary{{"A", 1}};
+  dictionary.remove("A");
+  EXPECT_EQ(dictionary, Dictionary());
+  EXPECT_EQ(Dictionary(), dictionary);
+}
+
+TEST(Dictionary, DecodedEqualsOneMadeByHand) {
+  EXPECT_EQ(decoded({'R', 'E', 'E', 'L', 4, 0, 0, 'c', 'A', '1', 0,    0,  //
+                     'D', 'A', 'S', 'F', 8, 0, 0, 'f', 0,   0,   0x80, 0x3F, 0, 0, 0, 0x40}),
+            (Dictionary{{"DASF", Array::of(1.0f, 2.0f)}, {"REEL", "A1"}}));
+}
+
+// Keys.
+
+TEST(Dictionary, TakesKeysOfEveryLength) {
+  Dictionary dictionary;
+  for (std::size_t size = 0; size <= 300; ++size)
+    dictionary.set(std::string(size, 'k'), static_cast<int>(size));
+  ASSERT_EQ(dictionary.size(), 301u);
+  for (std::size_t size = 0; size <= 300; ++size)
+    EXPECT_EQ(dictionary[std::string(size, 'k')], Value(static_cast<int>(size)));
+  EXPECT_FALSE(dictionary.contains(std::string(301, 'k')));
+}
+
+TEST(Dictionary, TakesKeysWithNulsAndOfOtherLetters) {
+  const std::vector<std::string_view> names = {
+      "\0\0\0\0"sv, "\0\0\0"sv,           "A\0\0\0"sv,         "A\0"sv,
+      "A"sv,        "\xC3\xA9\xC3\xA9"sv, "\x7F\x7F\x7F\x7F"sv};
+  Dictionary dictionary;
+  for (const std::string_view name : names) dictionary.set(name, name);
+  ASSERT_EQ(dictionary.size(), names.size());
+  for (const std::string_view name : names) EXPECT_EQ(dictionary[name], Value(name));
+}
+
+TEST(Dictionary, KeyThatIsNotUtf8IsReadAsLatin1) {
+  Dictionary dictionary;
+  dictionary.set("Caf\xE9", 1);
+  EXPECT_EQ(keys(dictionary), (Names{"Caf\xC3\xA9"}));
+  EXPECT_EQ(dictionary["Caf\xE9"], Value(1));
+  EXPECT_EQ(dictionary["Caf\xC3\xA9"], Value(1));
+  dictionary.set("Caf\xC3\xA9", 2);
+  EXPECT_EQ(dictionary.size(), 1u);
+  EXPECT_TRUE(dictionary.remove("Caf\xE9"));
+  EXPECT_TRUE(dictionary.empty());
+}
+
+// Many entries: from some number on look-ups go through an index.
+
+TEST(Dictionary, FindsEveryKeyAtEverySize) {
+  Dictionary dictionary;
+  for (int size = 1; size <= 200; ++size) {
+    dictionary.set(numbered(size), size);
+    ASSERT_EQ(dictionary.size(), static_cast<std::size_t>(size));
+    for (int i = 1; i <= size; ++i) ASSERT_EQ(dictionary[numbered(i)], Value(i)) << "of " << size;
+    ASSERT_FALSE(dictionary.contains(numbered(size + 1)));
+    ASSERT_FALSE(dictionary.contains("0"));
+    ASSERT_FALSE(dictionary.contains("zzzz"));
+  }
+}
+
+TEST(Dictionary, KeepsOrderAndValuesThroughManyRemovals) {
+  // The same in a plain list, as the measure.
+  std::vector<std::pair<std::string, int>> expected;
+  Dictionary dictionary;
+  const auto set = [&](const std::string& key, int value) {
+    dictionary.set(key, value);
+    for (auto& [name, held] : expected) {
+      if (name == key) {
+        held = value;
+        return;
+      }
+    }
+    expected.emplace_back(key, value);
+  };
+  const auto remove = [&](const std::string& key) {
+    const auto count =
+        std::erase_if(expected, [&](const auto& entry) { return entry.first == key; });
+    ASSERT_EQ(dictionary.remove(key), count == 1) << key;
+  };
+  const auto check = [&] {
+    std::vector<std::pair<std::string, int>> entries;
+    for (const auto& [key, value] : dictionary) entries.emplace_back(key, value.intValue());
+    ASSERT_EQ(entries, expected);
+    ASSERT_EQ(dictionary.size(), expected.size());
+    for (const auto& [key, value] : expected) ASSERT_EQ(dictionary[key], Value(value)) << key;
+  };
+
+  for (int i = 0; i < 300; ++i) set(numbered(i), i);
+  check();
+  for (int i = 0; i < 300; i += 3) remove(numbered(i));
+  check();
+  for (int i = 0; i < 300; i += 2) set(numbered(i), -i);
+  check();
+  for (int i = 290; i >= 0; --i) {
+    remove(numbered(i));
+    check();
+  }
+  for (int i = 0; i < 50; ++i) set(numbered(i), i);
+  check();
+  for (int i = 0; i < 300; ++i) remove(numbered(i));
+  check();
+  EXPECT_TRUE(dictionary.empty());
+}
+
+TEST(Dictionary, CopyOfAnIndexedOneIsIndexedToo) {
+  Dictionary original;
+  for (int i = 0; i < 100; ++i) original.set(numbered(i), i);
+  original.remove(numbered(50));
+  Dictionary copy = original;
+  copy.set("new", 1);
+  EXPECT_EQ(copy.size(), 100u);
+  EXPECT_EQ(copy[numbered(99)], Value(99));
+  EXPECT_FALSE(copy.contains(numbered(50)));
+  EXPECT_FALSE(original.contains("new"));
+  EXPECT_EQ(keys(copy).back(), "new");
+}
+
+TEST(Dictionary, IsNotSlowedDownByKeysThatCollide) {
+  const std::vector<std::string> names = collidingNames(50'000);
+#ifdef __GLIBCXX__
+  std::set<std::size_t> hashes;
+  for (const std::string& name : names) hashes.insert(std::hash<std::string>()(name));
+  ASSERT_EQ(hashes.size(), 1u) << "the names are not what this test is about";
+#endif
+  Dictionary dictionary;
+  for (const std::string& name : names) dictionary.set(name, name);
+  ASSERT_EQ(dictionary.size(), names.size());
+  for (const std::string& name : names) ASSERT_EQ(dictionary[name], Value(name));
+  for (std::size_t i = 0; i < names.size(); i += 2) ASSERT_TRUE(dictionary.remove(names[i]));
+  EXPECT_EQ(dictionary.size(), names.size() / 2);
+  EXPECT_FALSE(dictionary.contains(names[0]));
+  EXPECT_TRUE(dictionary.contains(names[1]));
+}
+
+// Threads.
+
+TEST(Dictionary, ThreadsAtOnceReadCopyAndChangeTheirOwn) {
+  StreamBuilder stream;
+  for (int i = 0; i < 50; ++i)
+    stream.record("REGN", 'c', numbered(i) + "\xE9").record("REGV", 'L', i);
+  Dictionary made = decoded(stream.bytes());
+  for (int i = 0; i < 50; ++i) made.set(numbered(i), "a text that all of them share");
+  const Dictionary shared = made;
+
+  std::vector<std::thread> threads;
+  std::vector<Dictionary> results(4);
+  for (std::size_t number = 0; number < results.size(); ++number) {
+    threads.emplace_back([&shared, &result = results[number], number] {
+      for (int i = 0; i < 50; ++i) {
+        Dictionary own = shared;
+        own.set("mine", static_cast<int>(number));
+        own.remove(numbered(i));
+        own.set(numbered(i), shared[numbered(49 - i)]);
+        result = own;
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  for (std::size_t number = 0; number < results.size(); ++number) {
+    Dictionary expected = shared;
+    expected.set("mine", static_cast<int>(number));
+    EXPECT_EQ(results[number], expected);
+  }
+}
+
+}  // namespace
+}  // namespace oxmv::test

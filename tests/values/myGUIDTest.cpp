@@ -1,0 +1,106 @@
+#include <numeric>
+#include <span>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "oxmv/values/myGUID.h"
+#include "tests/support/Printing.h"
+
+namespace oxmv::test {
+namespace {
+
+static_assert(sizeof(myGUID) == sizeof(unsigned long) * 2 + 8,
+              "24 bytes where unsigned long has 8, 16 where it has 4");
+
+// These tests write down the image of a 64-bit build.
+constexpr bool is64Bit = sizeof(unsigned long) == 8;
+
+// 0x01, 0x02, ... so that every byte tells its place.
+std::vector<std::uint8_t> image(std::size_t size) {
+  std::vector<std::uint8_t> bytes(size);
+  std::iota(bytes.begin(), bytes.end(), std::uint8_t{1});
+  return bytes;
+}
+
+TEST(myGUID, IsZeroByDefault) {
+  const myGUID guid;
+  EXPECT_EQ(guid.Data1, 0u);
+  EXPECT_EQ(guid.Data2, 0u);
+  EXPECT_EQ(guid.Data3, 0u);
+  EXPECT_EQ(guid.Data4, (std::array<std::uint8_t, 8>{}));
+}
+
+TEST(myGUID, TakesItsFieldsFromALittleEndianImage) {
+  if (!is64Bit) GTEST_SKIP();
+  myGUID guid;
+  copyOverImage(guid, image(24));
+  EXPECT_EQ(
+      guid,
+      (myGUID{
+          0x0807060504030201u, 0x0A09, 0x0C0B, {0x0D, 0x0E, 0x0F, 0x10, 0x11, 0x12, 0x13, 0x14}}));
+}
+
+TEST(myGUID, ShortImageLeavesTheRest) {
+  if (!is64Bit) GTEST_SKIP();
+  const myGUID before{
+      0xAAAAAAAAAAAAAAAAu, 0xBBBB, 0xCCCC, {0xD0, 0xD1, 0xD2, 0xD3, 0xD4, 0xD5, 0xD6, 0xD7}};
+  const auto after = [&](std::size_t size) {
+    myGUID guid = before;
+    copyOverImage(guid, image(size));
+    return guid;
+  };
+  EXPECT_EQ(after(0), before);
+
+  myGUID expected = before;
+  expected.Data1 = 0xAAAAAAAAAAAAAA01u;
+  EXPECT_EQ(after(1), expected);
+  expected.Data1 = 0xAA07060504030201u;
+  EXPECT_EQ(after(7), expected);
+  expected.Data1 = 0x0807060504030201u;
+  EXPECT_EQ(after(8), expected);
+  expected.Data2 = 0xBB09;
+  EXPECT_EQ(after(9), expected);
+  expected.Data2 = 0x0A09;
+  expected.Data3 = 0xCC0B;
+  EXPECT_EQ(after(11), expected);
+  expected.Data3 = 0x0C0B;
+  EXPECT_EQ(after(12), expected);
+  expected.Data4 = {0x0D, 0x0E, 0x0F, 0x10, 0xD4, 0xD5, 0xD6, 0xD7};
+  EXPECT_EQ(after(16), expected);
+}
+
+TEST(myGUID, PaddingAndWhatFollowsIsInNoField) {
+  if (!is64Bit) GTEST_SKIP();
+  myGUID of20;
+  copyOverImage(of20, image(20));
+  for (const std::size_t size : {21u, 24u, 25u, 100u}) {
+    myGUID guid;
+    copyOverImage(guid, image(size));
+    EXPECT_EQ(guid, of20) << size;
+  }
+}
+
+TEST(myGUID, DiffersByEveryField) {
+  const myGUID guid{1, 2, 3, {4}};
+  EXPECT_EQ(guid, (myGUID{1, 2, 3, {4}}));
+  EXPECT_FALSE(guid == (myGUID{0, 2, 3, {4}}));
+  EXPECT_FALSE(guid == (myGUID{1, 0, 3, {4}}));
+  EXPECT_FALSE(guid == (myGUID{1, 2, 0, {4}}));
+  EXPECT_FALSE(guid == (myGUID{1, 2, 3, {4, 0, 0, 0, 0, 0, 0, 1}}));
+}
+
+TEST(myGUID, TextIsUpperCaseIn8And4And4And4And12Digits) {
+  EXPECT_EQ(
+      guidText({0x0A1B2C3D, 0x4E5F, 0x0607, {0x08, 0x09, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0x0F}}),
+      "0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F");
+  EXPECT_EQ(guidText({}), "00000000-0000-0000-0000-000000000000");
+}
+
+TEST(myGUID, TextShowsTheLow32BitsOfData1) {
+  if (!is64Bit) GTEST_SKIP();
+  EXPECT_EQ(guidText({0xFFFFFFFF12345678u, 0, 0, {}}), "12345678-0000-0000-0000-000000000000");
+}
+
+}  // namespace
+}  // namespace oxmv::test
