@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <iterator>
+#include <utility>
 #include <vector>
 
 #include "oxmv/values/Value.h"
@@ -21,7 +22,10 @@ class Array {
   // list of one.
   template <class... T>
   static Array of(const T&... elements) {
-    return Array(std::vector<Value>{Value(elements)...});
+    std::vector<Value> values;
+    values.reserve(sizeof...(elements));
+    (values.emplace_back(elements), ...);
+    return Array(std::move(values));
   }
 
   std::size_t size() const noexcept;
