@@ -206,6 +206,7 @@ Value Dictionary::operator[](std::string_view key) const {
 
 bool Dictionary::set(std::string_view key, Value value) {
   if (value.isNothing()) return false;
+  const Value block = isTable() ? Value() : value_;  // whose own key this may be
   ownTable().set(KeyText(key).text(), std::move(value));
   return true;
 }
@@ -213,6 +214,7 @@ bool Dictionary::set(std::string_view key, Value value) {
 bool Dictionary::remove(std::string_view key) {
   const KeyText wanted(key);
   if (!contains(wanted.text())) return false;
+  const Value block = isTable() ? Value() : value_;  // whose own key this may be
   detail::Table& own = ownTable();
   own.remove(*own.find(wanted.text()));
   return true;
