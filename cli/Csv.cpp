@@ -6,11 +6,8 @@
 
 #include "cli/Characters.h"
 #include "cli/Flags.h"
-#include "cli/JsonWriter.h"
-#include "cli/TagJson.h"
 #include "cli/TagNames.h"
 #include "cli/ValueText.h"
-#include "oxmv/values/Array.h"
 
 namespace oxmv::cli {
 namespace {
@@ -26,20 +23,6 @@ std::string field(std::string_view text) {
     quoted += c;
   }
   return quoted + '"';
-}
-
-std::string inField(const Value& value) {
-  if (value.isNothing()) return {};
-  if (value.isText()) return visible(value.text());
-  const Array array = value.array();
-  const bool areNumbers =
-      !array.empty() &&
-      std::all_of(array.begin(), array.end(), [](const Value& v) { return v.isNumber(); });
-  if (value.isNumber() || areNumbers) return inLine(value, Extent::whole);
-  StringSink sink;
-  JsonWriter json(sink);
-  writeTagJson(json, value);
-  return sink.text;
 }
 
 // A blank in front of a name is the user's way to write a list.
@@ -67,7 +50,7 @@ void CsvWriter::add(std::string_view file, const Dictionary& tags) {
   for (const TagRow* column : columns_) {
     const auto characters = charactersOf(column->tag);
     const std::string_view key(characters.data(), characters.size());
-    line += fmt::format(",{}", field(inField(tags[key])));
+    line += fmt::format(",{}", field(bare(tags[key])));
   }
   sink_.write(line + '\n');
 }

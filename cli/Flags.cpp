@@ -28,6 +28,9 @@ constexpr auto rows = std::to_array<FlagRow>({
     {Flag::layout, "", "--layout", "LAYOUT", "exact (default) or readable"},
     {Flag::allow, "", "--allow", "CODE", "let this kind of loss through; may be repeated"},
     {Flag::dryRun, "-n", "--dry-run", "", "do everything but write"},
+    {Flag::backup, "", "--backup", "", "keep the old file beside it: CLIP~, or CLIP~2 and so on"},
+    {Flag::create, "", "--create", "", "make a clip that does not exist"},
+    {Flag::raw, "", "--raw", "", "values as they are: nothing escaped, data as bytes"},
     {Flag::color, "", "--color", "WHEN", "auto (default), always or never"},
 });
 

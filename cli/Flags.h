@@ -29,6 +29,9 @@ enum class Flag : std::uint8_t {
   layout,
   allow,
   dryRun,
+  backup,
+  create,
+  raw,
   color,
 };
 

@@ -15,11 +15,11 @@ namespace oxmv::cli {
 namespace {
 
 constexpr std::string_view introduction =
-    "oxmv shows, checks and makes the metadata tags of clips.\n"
+    "oxmv shows, changes, checks and makes the metadata tags of clips.\n"
     "\n"
     "  oxmv show CLIP                    the tags, with their labels\n"
+    "  oxmv set CLIP REEL=A002           a tag changed, and no other byte\n"
     "  oxmv check CLIP...                what is wrong with them, if anything\n"
-    "  oxmv encode TAGS.json -o CLIP     a clip from tags that you wrote\n"
     "Help: oxmv help, oxmv help VERB\n";
 
 int exitCode(Outcome outcome) { return static_cast<int>(outcome); }

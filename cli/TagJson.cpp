@@ -9,6 +9,7 @@
 
 #include <fmt/format.h>
 
+#include "cli/Sink.h"
 #include "oxmv/values/Array.h"
 
 namespace oxmv::cli {
@@ -66,6 +67,13 @@ void writeTagJson(JsonWriter& json, const Value& value) {
     case Value::Kind::array: return writeArray(json, value.array());
     case Value::Kind::dictionary: return writeDictionary(json, value.dictionary());
   }
+}
+
+std::string tagJsonOf(const Value& value) {
+  StringSink sink;
+  JsonWriter json(sink);
+  writeTagJson(json, value);
+  return sink.text;
 }
 
 std::string digitsOf(float number) { return shortestDigits(number); }

@@ -36,7 +36,11 @@ struct JsonError {
 // an array within an array; a group stands on the level of its dictionary).
 std::variant<Dictionary, JsonError> readTagJson(std::string_view text);
 
+// The same for the value of one member of an object, of that name.
+std::variant<Value, JsonError> readTagJsonValue(std::string_view name, std::string_view text);
+
 void writeTagJson(JsonWriter& json, const Value& value);
+std::string tagJsonOf(const Value& value);
 
 // The digits of a number as tag JSON has them: the fewest that give the same number, and never
 // without `.` or `e` for a float. Not for numbers that are not finite.

@@ -97,10 +97,16 @@ class Builder final : public nlohmann::json_sax<nlohmann::json> {
   explicit Builder(std::string_view text) : text_(text), reached_(text.data()) {}
 
   std::variant<Dictionary, JsonError> build() {
-    const TracedIterator begin(text_.data(), &reached_);
-    const TracedIterator end(text_.data() + text_.size(), &reached_);
-    if (!nlohmann::json::sax_parse(begin, end, this)) return std::move(error_);
+    if (!parse()) return std::move(error_);
     return std::move(result_);
+  }
+
+  // The text is a value only: of that member of an object that stays unwritten.
+  std::variant<Value, JsonError> buildMember(std::string_view name) {
+    frames_.push_back({false, 1, std::string(name)});
+    isMember_ = true;
+    if (!parse()) return std::move(error_);
+    return frames_.front().dictionary[name];
   }
 
   bool null() override { return failLiteral("null"); }
@@ -145,6 +151,12 @@ class Builder final : public nlohmann::json_sax<nlohmann::json> {
     Value specialValue = {};
   };
 
+  bool parse() {
+    const TracedIterator begin(text_.data(), &reached_);
+    const TracedIterator end(text_.data() + text_.size(), &reached_);
+    return nlohmann::json::sax_parse(begin, end, this);
+  }
+
   bool isSpecial() const { return !frames_.empty() && frames_.back().special != Special::none; }
 
   bool begin(bool isArray);
@@ -171,6 +183,7 @@ class Builder final : public nlohmann::json_sax<nlohmann::json> {
   std::vector<Frame> frames_;
   Dictionary result_;
   bool isComplete_ = false;
+  bool isMember_ = false;
   JsonError error_{};
 };
 
@@ -201,6 +214,7 @@ bool Builder::add(const Value& value, const char* start) {
     frame.elements.push_back(value);
   } else {
     frame.dictionary.set(frame.key, value);
+    if (isMember_ && frames_.size() == 1) isComplete_ = true;
   }
   return true;
 }
@@ -274,7 +288,9 @@ bool Builder::parse_error(std::size_t position, const std::string& token,
   const std::string_view rest = text_.substr(static_cast<std::size_t>(at - text_.data()));
   if (sentence.find("UTF-8") != std::string::npos || (!rest.empty() && firstCharacter(rest).isByte))
     return fail("json-utf8", "the text is not UTF-8", at);
-  if (isComplete_) return fail("json-trailing-text", "more text behind the tags", at);
+  if (isComplete_)
+    return fail("json-trailing-text",
+                isMember_ ? "more text behind the value" : "more text behind the tags", at);
   return fail("json-syntax", sentence, at);
 }
 
@@ -328,6 +344,10 @@ const char* Builder::startOfNumber() const {
 
 std::variant<Dictionary, JsonError> readTagJson(std::string_view text) {
   return Builder(text).build();
+}
+
+std::variant<Value, JsonError> readTagJsonValue(std::string_view name, std::string_view text) {
+  return Builder(text).buildMember(name);
 }
 
 }  // namespace oxmv::cli

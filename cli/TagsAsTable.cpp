@@ -9,6 +9,7 @@
 #include <fmt/format.h>
 
 #include "cli/Characters.h"
+#include "cli/TagPaths.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
 
@@ -57,10 +58,6 @@ class TableWriter {
   }
 
  private:
-  static bool isGroup(const TagRow& row) {
-    return row.write == Write::tagGroup || row.write == Write::regGroup;
-  }
-
   static std::string padded(std::string styled, std::string_view bare, std::size_t width) {
     const std::size_t taken = columns(bare);
     return styled.append(width > taken ? width - taken : 0, ' ');

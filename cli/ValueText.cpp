@@ -36,10 +36,13 @@ std::string dataInLine(std::span<const std::uint8_t> bytes, Extent extent) {
                      counted(bytes.size(), "byte"));
 }
 
+bool holdsNumbers(const Array& array) {
+  return !array.empty() &&
+         std::all_of(array.begin(), array.end(), [](const Value& v) { return v.isNumber(); });
+}
+
 std::string arrayInLine(const Array& array, Extent extent) {
-  const bool areNumbers =
-      std::all_of(array.begin(), array.end(), [](const Value& v) { return v.isNumber(); });
-  if (!areNumbers || array.empty()) return counted(array.size(), "element");
+  if (!holdsNumbers(array)) return counted(array.size(), "element");
   const bool isCut = extent == Extent::abbreviated && array.size() > shownElements;
   std::vector<std::string> numbers;
   for (const Value& element : array) {
@@ -64,6 +67,13 @@ std::string inLine(const Value& value, Extent extent) {
     case Value::Kind::dictionary: return counted(value.dictionary().size(), "tag");
   }
   return {};
+}
+
+std::string bare(const Value& value) {
+  if (value.isNothing()) return {};
+  if (value.isText()) return visible(value.text());
+  if (value.isNumber() || holdsNumbers(value.array())) return inLine(value, Extent::whole);
+  return tagJsonOf(value);
 }
 
 std::string textInLine(std::string_view text, Extent extent) {

@@ -23,6 +23,10 @@ constexpr std::size_t shownElements = 16;
 // with blanks between them. Other lists, and dictionaries, by their sizes. All of it visible text.
 std::string inLine(const Value& value, Extent extent);
 
+// A value that stands alone: a number or text bare, a list of numbers with blanks between them,
+// everything else as tag JSON. Nothing gives nothing. All of it visible text.
+std::string bare(const Value& value);
+
 // A name or text, the NULs at its end counted.
 std::string textInLine(std::string_view text, Extent extent);
 

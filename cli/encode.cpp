@@ -1,4 +1,3 @@
-#include <algorithm>
 #include <array>
 #include <filesystem>
 #include <optional>
@@ -10,7 +9,7 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
+#include "cli/AllowedLosses.h"
 #include "cli/Inputs.h"
 #include "cli/TagJson.h"
 #include "cli/ValueText.h"
@@ -23,26 +22,6 @@ namespace oxmv::cli {
 namespace {
 
 constexpr std::string_view standardOutput = "-";
-
-Layout layoutOf(const Arguments& arguments) {
-  constexpr auto choices = std::to_array<std::string_view>({"exact", "readable"});
-  return arguments.choice(Flag::layout, choices) == 0 ? Layout::exact : Layout::readable;
-}
-
-// More lines than this hide what they say.
-constexpr std::size_t lossesSaid = 20;
-
-std::vector<LossCode> allowedLosses(const Arguments& arguments) {
-  std::vector<LossCode> allowed;
-  for (const std::string& text : arguments.values(Flag::allow)) {
-    const auto code = lossCodeOf(text);
-    if (!code)
-      throw UsageError("bad-value", fmt::format("--allow knows no code \"{}\"; a refusal names it",
-                                                visible(text)));
-    allowed.push_back(*code);
-  }
-  return allowed;
-}
 
 void checkOutput(const Call& call, const std::string& input) {
   if (!call.arguments.has(Flag::output))
@@ -68,38 +47,6 @@ std::optional<Dictionary> readTags(Call& call, const std::string& name) {
   return std::get<Dictionary>(std::move(tags));
 }
 
-std::string inWords(const Loss& loss) {
-  return visible(fmt::format("{} {}", loss.path, loss.message));
-}
-
-std::string wayOut(const Loss& loss) {
-  if (loss.avoidedBy == Layout::readable) return "--layout readable avoids it";
-  return fmt::format("--allow {} lets it through", codeOf(loss.code));
-}
-
-void refuse(Call& call, const std::string& name, const std::vector<Loss>& losses) {
-  for (std::size_t i = 0; i < std::min(losses.size(), lossesSaid); ++i)
-    call.messages.refused(name, inWords(losses[i]), codeOf(losses[i].code),
-                          fmt::format("nothing written; {}", wayOut(losses[i])));
-  if (losses.size() > lossesSaid)
-    call.messages.refused(name, fmt::format("{} losses more", losses.size() - lossesSaid));
-}
-
-// Whether the tags may be written. Those losses that are allowed are said as warnings.
-bool passes(Call& call, const std::string& name, const Dictionary& tags, Layout layout,
-            const std::vector<LossCode>& allowed) {
-  std::vector<Loss> refused;
-  for (Loss& loss : findLosses(tags, layout)) {
-    if (std::find(allowed.begin(), allowed.end(), loss.code) == allowed.end()) {
-      refused.push_back(std::move(loss));
-    } else {
-      call.messages.warning(name, inWords(loss), codeOf(loss.code));
-    }
-  }
-  refuse(call, name, refused);
-  return refused.empty();
-}
-
 void write(Call& call, const std::string& output, const Bytes& stream) {
   if (call.arguments.has(Flag::dryRun))
     return call.messages.note(output, fmt::format("would get {}", counted(stream.size(), "byte")));
@@ -122,7 +69,7 @@ void run(Call& call) {
 
   const auto tags = readTags(call, input);
   if (!tags) return;
-  if (!passes(call, input, *tags, layout, allowed)) return;
+  if (!passes(call, input, findLosses(*tags, layout), allowed)) return;
   const auto stream = encodeStream(*tags, layout);
   if (!stream) return call.messages.error(input, "not enough memory", "no-memory");
   write(call, output, *stream);

@@ -13,11 +13,12 @@ namespace {
 constexpr std::string_view commandExamples =
     "oxmv show clip.colr\n"
     "oxmv show --csv --columns REEL,TIMC,TAKE *.colr > clips.csv\n"
+    "oxmv set clip.colr REEL=A002 \"White balance=1,1.2,1,1.5\"\n"
     "oxmv check *.colr\n";
 
 constexpr std::string_view exitCodes =
     "  0    done; nothing found\n"
-    "  1    the answer is no: something was found, nothing matches\n"
+    "  1    the answer is no: found something, differs, is not there\n"
     "  2    called in a way that means nothing; nothing was touched\n"
     "  3    a file could not be read or written; the others were done\n"
     "  4    refused, to protect data\n"

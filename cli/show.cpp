@@ -1,12 +1,13 @@
-#include <algorithm>
 #include <array>
 #include <optional>
 #include <string>
 #include <utility>
+#include <variant>
 #include <vector>
 
 #include <fmt/format.h>
 
+#include "cli/Clips.h"
 #include "cli/Csv.h"
 #include "cli/Findings.h"
 #include "cli/Inputs.h"
@@ -14,27 +15,9 @@
 #include "cli/TagJson.h"
 #include "cli/TagsAsTable.h"
 #include "cli/Verb.h"
-#include "oxmv/metadata/MetadataDictionary.h"
 
 namespace oxmv::cli {
 namespace {
-
-// More warnings than this hide what they warn of.
-constexpr std::size_t warningsSaid = 20;
-
-struct Clip {
-  MetadataDictionary metadata;
-  std::vector<Finding> losses;
-};
-
-Clip decode(const Bytes& bytes) {
-  Clip clip;
-  FindingCollector collector(bytes);
-  clip.metadata.initWithData(bytes, &collector);
-  clip.losses = collector.finish();
-  std::erase_if(clip.losses, [](const Finding& finding) { return !isLoss(finding); });
-  return clip;
-}
 
 // What is made of the clips, one after the other.
 class Presentation {
@@ -136,27 +119,17 @@ class AsCsv final : public Presentation {
   CsvWriter csv_;
 };
 
-void warn(Call& call, const std::string& name, const std::vector<Finding>& losses) {
-  for (std::size_t i = 0; i < std::min(losses.size(), warningsSaid); ++i)
-    call.messages.warning(name, locate(losses[i]), codeOf(losses[i]));
-  if (losses.size() > warningsSaid)
-    call.messages.warning(name, fmt::format("{} more; oxmv check lists them all",
-                                            counted(losses.size() - warningsSaid, "warning")));
-}
-
 void showEach(Call& call, const std::vector<std::string>& names, Presentation& presentation) {
   for (const std::string& name : names) {
-    const auto content = readInput(name);
-    if (const auto* problem = std::get_if<FileProblem>(&content)) {
-      call.messages.error(name, problem->message, problem->code);
+    const auto read = readClip(call, name);
+    if (const auto* problem = std::get_if<FileProblem>(&read)) {
       presentation.addProblem(name, *problem);
       continue;
     }
-    const Bytes& bytes = std::get<Bytes>(content);
-    const Clip clip = decode(bytes);
+    const Clip& clip = std::get<Clip>(read);
     presentation.add(name, clip);
-    warn(call, name, clip.losses);
-    call.messages.note(name, fmt::format("{}, {}", counted(bytes.size(), "byte"),
+    warnOfLosses(call, name, clip);
+    call.messages.note(name, fmt::format("{}, {}", counted(clip.size, "byte"),
                                          counted(clip.metadata.metadata().size(), "tag")));
   }
   presentation.finish();

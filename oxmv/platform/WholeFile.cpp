@@ -20,11 +20,14 @@ class FileCategory final : public std::error_category {
     switch (FileError{code}) {
       case FileError::notRegular: return "Not a regular file";
       case FileError::tooLarge: return "Larger than 256 MiB";
+      case FileError::changed: return "Changed since it was read";
     }
     return "Unknown error";
   }
 };
 static_assert(maxFileSize == std::size_t{256} * 1024 * 1024, "the message names it");
+
+using Content = std::vector<std::uint8_t>;
 
 std::error_code lastError() { return {errno, std::generic_category()}; }
 
@@ -140,15 +143,25 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
   return content;
 }
 
-bool writeWholeFile(const std::filesystem::path& path, std::span<const std::uint8_t> content,
-                    std::error_code& error) {
+namespace {
+
+// Whether a file has that content, or is not there if there is none.
+bool hasContent(const std::filesystem::path& path, const std::optional<Content>& content) {
+  std::error_code error;
+  const auto now = readWholeFile(path, error);
+  return now == content && (now || error == std::errc::no_such_file_or_directory);
+}
+
+// Null for `old`: whatever is there is replaced.
+bool write(const std::filesystem::path& path, std::span<const std::uint8_t> content,
+           const std::optional<Content>* old, std::error_code& error) {
   error.clear();
   const std::filesystem::path target = followLinks(path, error);
   if (error) return false;
-  struct stat old = {};
-  const bool isThere = ::lstat(target.c_str(), &old) == 0;
+  struct stat replaced = {};
+  const bool isThere = ::lstat(target.c_str(), &replaced) == 0;
   if (!isThere && errno != ENOENT) return error = lastError(), false;
-  if (isThere && (error = objectionTo(old))) return false;
+  if (isThere && (error = objectionTo(replaced))) return false;
 
   const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
   const std::filesystem::path temporary = folder / temporaryName();
@@ -156,17 +169,30 @@ bool writeWholeFile(const std::filesystem::path& path, std::span<const std::uint
   const mode_t mode = isThere ? 0600 : 0666;
   Descriptor file(::open(temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));
   if (!file.isOpen()) return error = lastError(), false;
-  const bool isWritten = writeAll(file.number(), content) &&
-                         (!isThere || takeOver(file.number(), old)) &&
-                         ::fsync(file.number()) == 0 && file.close() &&
-                         ::rename(temporary.c_str(), target.c_str()) == 0;
-  if (!isWritten) {
-    error = lastError();
+  const bool isComplete = writeAll(file.number(), content) &&
+                          (!isThere || takeOver(file.number(), replaced)) &&
+                          ::fsync(file.number()) == 0 && file.close();
+  if (!isComplete) error = lastError();
+  if (!error && old != nullptr && !hasContent(target, *old)) error = FileError::changed;
+  if (!error && ::rename(temporary.c_str(), target.c_str()) != 0) error = lastError();
+  if (error) {
     ::unlink(temporary.c_str());
     return false;
   }
   if (!syncFolder(folder)) return error = lastError(), false;
   return true;
+}
+
+}  // namespace
+
+bool writeWholeFile(const std::filesystem::path& path, std::span<const std::uint8_t> content,
+                    std::error_code& error) {
+  return write(path, content, nullptr, error);
+}
+
+bool replaceWholeFile(const std::filesystem::path& path, const std::optional<Content>& old,
+                      std::span<const std::uint8_t> content, std::error_code& error) {
+  return write(path, content, &old, error);
 }
 
 }  // namespace oxmv

@@ -16,11 +16,12 @@ namespace oxmv {
 // larger is no file of ours, and must not fill the host's memory.
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 
-// Why a file that is there is none of ours to read or replace. Everything else comes as the
+// Why a file is none of ours to read or replace. Everything else comes as the
 // system's own error.
 enum class FileError {
   notRegular = 1,  // a pipe, a device ... (a folder gives std::errc::is_a_directory)
   tooLarge,        // more than maxFileSize
+  changed,         // it is not any more what its reader found
 };
 std::error_code make_error_code(FileError error) noexcept;
 
@@ -40,6 +41,13 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
 // nothing else.
 [[nodiscard]] bool writeWholeFile(const std::filesystem::path& path,
                                   std::span<const std::uint8_t> content, std::error_code& error);
+
+// The same, for content that was made of what stood there before: `old`, or none if there was no
+// file. When the file has another content by now, somebody else's change would be lost; that is
+// FileError::changed. Looks right before the new file takes its place.
+[[nodiscard]] bool replaceWholeFile(const std::filesystem::path& path,
+                                    const std::optional<std::vector<std::uint8_t>>& old,
+                                    std::span<const std::uint8_t> content, std::error_code& error);
 
 }  // namespace oxmv
 

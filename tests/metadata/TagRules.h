@@ -1,6 +1,5 @@
-// The tags of every rule of reading and writing, in the order in which the format's description
-// lists them. Written down a second time on purpose: a test that took them from the library's own
-// table would agree with every slip in it.
+// The tags of every rule of reading and writing. Written down a second time on purpose: a test that
+// took them from the library's own table would agree with every slip in it.
 
 #pragma once
 

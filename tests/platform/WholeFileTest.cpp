@@ -257,5 +257,64 @@ TEST(WriteWholeFile, KeepsTheOldFileAndNothingElseWhenWritingFails) {
   EXPECT_EQ(filesIn(folder.path()), 1);
 }
 
+TEST(ReplaceWholeFile, ReplacesWhatIsAsItWasRead) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  ASSERT_EQ(::chmod((folder / "clip").c_str(), 0604), 0);
+  fs::create_symlink("clip", folder / "link");
+  std::error_code error;
+  EXPECT_TRUE(replaceWholeFile(folder / "link", oldContent, newContent, error));
+  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(modeOf(folder / "clip"), 0604u);
+  EXPECT_TRUE(fs::is_symlink(folder / "link"));
+  EXPECT_EQ(filesIn(folder.path()), 2);
+}
+
+TEST(ReplaceWholeFile, MakesAFileThatIsStillNotThere) {
+  const TempDir folder;
+  std::error_code error;
+  EXPECT_TRUE(replaceWholeFile(folder / "clip", std::nullopt, newContent, error));
+  EXPECT_EQ(get(folder / "clip"), newContent);
+}
+
+TEST(ReplaceWholeFile, LeavesWhatHasChangedMeanwhile) {
+  const TempDir folder;
+  const auto refuses = [&](const std::optional<Bytes>& read) {
+    std::error_code error;
+    return !replaceWholeFile(folder / "clip", read, newContent, error) &&
+           error == FileError::changed && error.message() == "Changed since it was read";
+  };
+  EXPECT_TRUE(refuses(oldContent));  // gone
+  EXPECT_EQ(filesIn(folder.path()), 0);
+  put(folder / "clip", oldContent);
+  EXPECT_TRUE(refuses(std::nullopt));  // come into being
+  EXPECT_TRUE(refuses(Bytes{}));
+  EXPECT_TRUE(refuses(Bytes{'o', 'l', 'd', 'e', 'r'}));
+  EXPECT_TRUE(refuses(Bytes{'o', 'd', 'd'}));  // of the same size
+  EXPECT_EQ(get(folder / "clip"), oldContent);
+  EXPECT_EQ(filesIn(folder.path()), 1);
+}
+
+TEST(ReplaceWholeFile, TakesAFileOfTheSameContentForTheSame) {
+  const TempDir folder;
+  put(folder / "clip", oldContent);
+  put(folder / "copy", oldContent);
+  fs::rename(folder / "copy", folder / "clip");
+  std::error_code error;
+  EXPECT_TRUE(replaceWholeFile(folder / "clip", oldContent, newContent, error));
+}
+
+TEST(ReplaceWholeFile, LeavesAFileThatMayNotBeReadAnyMore) {
+  const TempDir folder;
+  fs::permissions(folder.path(), fs::perms::all);
+  put(folder / "clip", oldContent);
+  fs::permissions(folder / "clip", fs::perms::none);
+  EXPECT_TRUE(asOrdinaryUser([&] {
+    std::error_code error;
+    return !replaceWholeFile(folder / "clip", std::nullopt, newContent, error) &&
+           error == FileError::changed;
+  }));
+}
+
 }  // namespace
 }  // namespace oxmv

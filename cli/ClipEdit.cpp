@@ -1,0 +1,144 @@
+#include "cli/ClipEdit.h"
+
+#include <filesystem>
+#include <system_error>
+#include <utility>
+#include <variant>
+
+#include <fmt/format.h>
+
+#include "cli/AllowedLosses.h"
+#include "cli/Characters.h"
+#include "cli/Differences.h"
+#include "cli/ValueText.h"
+#include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/platform/WholeFile.h"
+
+namespace oxmv::cli {
+namespace {
+
+constexpr std::string_view standardStreams = "-";
+
+Dictionary tagsOf(const Bytes& stream) {
+  return MetadataDictionary().initWithData(stream).metadata();
+}
+
+void checkFlags(const Call& call, bool isStandard) {
+  for (const Flag flag : {Flag::backup, Flag::create}) {
+    if (isStandard && call.arguments.has(flag))
+      throw UsageError("bad-flags", fmt::format("{} needs a file", rowOf(flag).name));
+  }
+}
+
+// "REEL: A001 -> A002"
+std::string inWords(const Difference& difference) {
+  const ShownDifference shown = show(difference, Extent::abbreviated);
+  const auto orAbsent = [](const Value& value, const std::string& text) {
+    return value.isNothing() ? "(absent)" : text;
+  };
+  return fmt::format("{}: {} -> {}", shown.path, orAbsent(difference.before, shown.before),
+                     orAbsent(difference.after, shown.after));
+}
+
+// Beside the clip, where nothing is yet.
+std::filesystem::path backupPath(const std::string& name) {
+  for (int i = 1;; ++i) {
+    const std::filesystem::path path = i == 1 ? name + '~' : fmt::format("{}~{}", name, i);
+    std::error_code ignored;  // what cannot be looked at cannot be written either, and is said then
+    if (!std::filesystem::exists(std::filesystem::symlink_status(path, ignored))) return path;
+  }
+}
+
+}  // namespace
+
+ClipEdit::ClipEdit(Call& call, std::optional<Bytes> original, Layout layout)
+    : call_(&call),
+      name_(call.words.front()),
+      original_(std::move(original)),
+      editor_(original_.value_or(Bytes()), layout) {}
+
+std::optional<ClipEdit> ClipEdit::begin(Call& call, std::string_view ifMissing) {
+  const std::string& name = call.words.front();
+  const bool isStandard = name == standardStreams;
+  const Layout layout = layoutOf(call.arguments);
+  checkFlags(call, isStandard);
+  if (isStandard && !call.arguments.has(Flag::dryRun) && StandardOutput::isTerminal()) {
+    call.messages.refused("standard output", "a clip is binary, and this is a terminal",
+                          "binary-to-terminal");
+    return std::nullopt;
+  }
+  auto content = readInput(name);
+  if (auto* bytes = std::get_if<Bytes>(&content)) return ClipEdit(call, std::move(*bytes), layout);
+  const FileProblem& problem = std::get<FileProblem>(content);
+  const bool isMissing = problem.code == "missing";
+  if (isMissing && call.arguments.has(Flag::create)) return ClipEdit(call, std::nullopt, layout);
+  const bool isHelped = isMissing && !ifMissing.empty();
+  call.messages.error(
+      name, isHelped ? fmt::format("{}; {}", problem.message, ifMissing) : problem.message,
+      problem.code);
+  return std::nullopt;
+}
+
+Dictionary ClipEdit::tags() const { return tagsOf(editor_.stream()); }
+
+void ClipEdit::sayRefused(const std::string& path, const EditError& error) {
+  const bool isDamaged = error.refusal == EditRefusal::damagedStream;
+  const std::string where = isDamaged ? fmt::format(" at byte {}", error.offset) : "";
+  call_->messages.refused(
+      name_, fmt::format("{}{}: {}", visible(path), where, error.message), codeOf(error.refusal),
+      nothingWritten(isDamaged ? "oxmv check says what is wrong with the clip" : ""));
+}
+
+void ClipEdit::finish() {
+  const bool isChanged = editor_.stream() != original_;
+  if (!isChanged) call_->messages.note(name_, "nothing to change");
+  if (isChanged) showChanges();
+  if (call_->arguments.has(Flag::dryRun)) return;
+  if (name_ == standardStreams) return call_->output.write(asText(editor_.stream()));
+  if (isChanged) save();
+}
+
+// On a dry run they are what was asked for, and else no more than a note.
+void ClipEdit::showChanges() {
+  for (const Difference& difference :
+       differencesBetween(tagsOf(original_.value_or(Bytes())), tags())) {
+    const std::string line = inWords(difference);
+    call_->arguments.has(Flag::dryRun) ? call_->output.write(line + '\n')
+                                       : call_->messages.note(name_, line);
+  }
+}
+
+void ClipEdit::save() {
+  Messages& messages = call_->messages;
+  std::optional<std::string> backup;
+  if (original_ && call_->arguments.has(Flag::backup) && !(backup = backUp())) return;
+  std::error_code error;
+  if (replaceWholeFile(name_, original_, editor_.stream(), error)) {
+    if (backup) messages.note(name_, fmt::format("the old file is {}", visible(*backup)));
+    return messages.note(name_, fmt::format("got {}", counted(editor_.stream().size(), "byte")));
+  }
+  std::error_code ignored;
+  // The clip is as it was, and needs no copy.
+  if (backup && readWholeFile(name_, ignored) == original_)
+    std::filesystem::remove(*backup, ignored);
+  if (error == FileError::changed) {
+    messages.refused(name_, "another program has changed it meanwhile", "file-changed",
+                     nothingWritten("try again"));
+  } else {
+    messages.error(name_, error.message(), "write-failed");
+  }
+}
+
+// Answers nothing when there is no copy, which is said then.
+std::optional<std::string> ClipEdit::backUp() {
+  const std::filesystem::path path = backupPath(name_);
+  std::error_code error;
+  if (std::filesystem::copy_file(name_, path, error)) return path.string();
+  std::error_code ignored;
+  // Half a copy is none.
+  if (error != std::errc::file_exists) std::filesystem::remove(path, ignored);
+  call_->messages.error(path.string(), error.message(), "write-failed");
+  return std::nullopt;
+}
+
+}  // namespace oxmv::cli
