@@ -273,9 +273,10 @@ class LossFinder {
     const std::string_view text = element.text();
     const bool isPadded = element.isText() && text.size() < 256 && isAscii(text);
     if (!isPadded) return explainText(element, back, path, 255);
+    const std::size_t added = back.text().size() - text.size();
     add(LossCode::listPads, path,
-        quoted(text) + " would gain " + std::to_string(back.text().size() - text.size()) +
-            " NULs at its end");
+        quoted(text) + " would gain " + (added == 1 ? "a NUL" : std::to_string(added) + " NULs") +
+            " at its end");
   }
 
   void explainNested(const Value& value, const std::string& path, int level) {

@@ -512,14 +512,18 @@ class Decoder {
   std::size_t overlapLeft_;
 
   // Streams of ordinary size are gathered on the stack, so that their block is the only allocation.
+  // Larger ones are not, for this memory never takes back what a vector has outgrown.
+  static constexpr std::size_t ordinarySize = 4 * 1024;
   std::array<std::byte, 8 * 1024> arena_;
   std::pmr::monotonic_buffer_resource memory_{arena_.data(), arena_.size()};
+  std::pmr::memory_resource* const resource_ =
+      bytes_.size() <= ordinarySize ? &memory_ : std::pmr::new_delete_resource();
   std::pmr::vector<Reading> readings_{
-      &memory_};  // of the streams being walked, inner ones behind outer ones
-  std::pmr::vector<Slot> slots_{&memory_};  // of the block to be
-  std::pmr::vector<Key> keys_{&memory_};    // of the block to be
-  std::string extra_;                       // bytes behind those of the stream: converted names
-  std::vector<GroupEntry> group_;           // scratch of gatherGroup
+      resource_};  // of the streams being walked, inner ones behind outer ones
+  std::pmr::vector<Slot> slots_{resource_};  // of the block to be
+  std::pmr::vector<Key> keys_{resource_};    // of the block to be
+  std::string extra_;                        // bytes behind those of the stream: converted names
+  std::vector<GroupEntry> group_;            // scratch of gatherGroup
   std::optional<Key> nameOfControlPoint_;
 
   // Scratch of putDictionary. Not on its stack, which would be there once for every level.

@@ -160,9 +160,13 @@ const detail::Table* Dictionary::table() const noexcept {
   return static_cast<const detail::Table*>(value_.owner());
 }
 
+bool Dictionary::ownsTable() const noexcept {
+  return isTable() && table() != nullptr && table()->isUnique();
+}
+
 // The table to change: this dictionary's alone.
 detail::Table& Dictionary::ownTable() {
-  if (!isTable() || table() == nullptr || !table()->isUnique()) {
+  if (!ownsTable()) {
     value_ = Value(Slot::scalar(Form::dictionaryBox, 0), new detail::Table(*this));
   }
   return const_cast<detail::Table&>(*table());  // made above without const, and shared with nobody
@@ -206,7 +210,7 @@ Value Dictionary::operator[](std::string_view key) const {
 
 bool Dictionary::set(std::string_view key, Value value) {
   if (value.isNothing()) return false;
-  const Value block = isTable() ? Value() : value_;  // whose own key this may be
+  const Value before = ownsTable() ? Value() : value_;  // whose own key this may be
   ownTable().set(KeyText(key).text(), std::move(value));
   return true;
 }
@@ -214,7 +218,7 @@ bool Dictionary::set(std::string_view key, Value value) {
 bool Dictionary::remove(std::string_view key) {
   const KeyText wanted(key);
   if (!contains(wanted.text())) return false;
-  const Value block = isTable() ? Value() : value_;  // whose own key this may be
+  const Value before = ownsTable() ? Value() : value_;  // whose own key this may be
   detail::Table& own = ownTable();
   own.remove(*own.find(wanted.text()));
   return true;

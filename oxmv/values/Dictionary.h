@@ -63,6 +63,7 @@ class Dictionary {
 
   bool isTable() const noexcept { return value_.slot_.form() == detail::Form::dictionaryBox; }
   const detail::Table* table() const noexcept;
+  bool ownsTable() const noexcept;
   detail::Table& ownTable();
   // Places in the order, some of which are vacant in a dictionary that had keys removed.
   std::size_t places() const noexcept;
