@@ -10,6 +10,7 @@
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
+#include "tests/support/Printing.h"
 
 namespace oxmv {
 namespace {

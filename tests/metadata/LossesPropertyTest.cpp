@@ -12,6 +12,7 @@
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
+#include "tests/support/Printing.h"
 
 namespace oxmv {
 namespace {

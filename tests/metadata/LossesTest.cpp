@@ -8,6 +8,7 @@
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
+#include "tests/support/Printing.h"
 
 namespace oxmv {
 namespace {

@@ -8,6 +8,7 @@
 
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagLabels.h"
+#include "tests/support/Printing.h"
 
 namespace oxmv {
 namespace {
