@@ -9,6 +9,7 @@
 
 #include "cli/AllowedLosses.h"
 #include "cli/Characters.h"
+#include "cli/Clips.h"
 #include "cli/Differences.h"
 #include "cli/ValueText.h"
 #include "oxmv/metadata/MetadataDictionary.h"
@@ -40,6 +41,13 @@ std::string inWords(const Difference& difference) {
                      orAbsent(difference.after, shown.after));
 }
 
+// Any file is a stream to a tolerant reader; one that gives it nothing is most likely something
+// else.
+void refuseNoClip(Call& call) {
+  call.messages.refused(call.words.front(), "there is no tag in it: is it a clip?", "no-tags",
+                        nothingWritten("oxmv encode makes a new one in its place"));
+}
+
 // Beside the clip, where nothing is yet.
 std::filesystem::path backupPath(const std::string& name) {
   for (int i = 1;; ++i) {
@@ -68,7 +76,12 @@ std::optional<ClipEdit> ClipEdit::begin(Call& call, std::string_view ifMissing) 
     return std::nullopt;
   }
   auto content = readInput(name);
-  if (auto* bytes = std::get_if<Bytes>(&content)) return ClipEdit(call, std::move(*bytes), layout);
+  if (auto* bytes = std::get_if<Bytes>(&content)) {
+    const Clip clip = decodeClip(*bytes);
+    if (!bytes->empty() && !clip.metadata.haveMetadata()) return refuseNoClip(call), std::nullopt;
+    warnOfLosses(call, name, clip);
+    return ClipEdit(call, std::move(*bytes), layout);
+  }
   const FileProblem& problem = std::get<FileProblem>(content);
   const bool isMissing = problem.code == "missing";
   if (isMissing && call.arguments.has(Flag::create)) return ClipEdit(call, std::nullopt, layout);
@@ -117,9 +130,9 @@ void ClipEdit::save() {
     if (backup) messages.note(name_, fmt::format("the old file is {}", visible(*backup)));
     return messages.note(name_, fmt::format("got {}", counted(editor_.stream().size(), "byte")));
   }
+  // Unless the new content got there all the same, nothing was replaced that needs a copy.
   std::error_code ignored;
-  // The clip is as it was, and needs no copy.
-  if (backup && readWholeFile(name_, ignored) == original_)
+  if (backup && readWholeFile(name_, ignored) != editor_.stream())
     std::filesystem::remove(*backup, ignored);
   if (error == FileError::changed) {
     messages.refused(name_, "another program has changed it meanwhile", "file-changed",
@@ -129,14 +142,17 @@ void ClipEdit::save() {
   }
 }
 
-// Answers nothing when there is no copy, which is said then.
+// What was read, so that the copy is of what is replaced. Answers nothing when there is no copy,
+// which is said then.
 std::optional<std::string> ClipEdit::backUp() {
   const std::filesystem::path path = backupPath(name_);
   std::error_code error;
-  if (std::filesystem::copy_file(name_, path, error)) return path.string();
-  std::error_code ignored;
-  // Half a copy is none.
-  if (error != std::errc::file_exists) std::filesystem::remove(path, ignored);
+  if (replaceWholeFile(path, std::nullopt, *original_, error)) {
+    std::error_code ignored;  // on a file system without permissions there are none to keep
+    const auto permissions = std::filesystem::status(name_, ignored).permissions();
+    std::filesystem::permissions(path, permissions, ignored);
+    return path.string();
+  }
   call_->messages.error(path.string(), error.message(), "write-failed");
   return std::nullopt;
 }

@@ -65,6 +65,7 @@ bool isStandardErrorTerminal() noexcept { return ::isatty(STDERR_FILENO) == 1; }
 
 void prepareStandardStreams() noexcept {
   std::signal(SIGPIPE, SIG_IGN);
+  std::signal(SIGXFSZ, SIG_IGN);  // a file over the user's limit is an error like any other
   for (const int descriptor : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
     if (::fcntl(descriptor, F_GETFD) >= 0) continue;
     // Takes the lowest number that is free, which is this one. The wrong way round, so that using

@@ -51,8 +51,14 @@ std::optional<Value> hexadecimalFrom(std::string_view digits, bool isNegative) {
                 : Value(number);
 }
 
+// Takes a '+' off; one that another sign follows stays, and makes the text no number.
+std::string_view withoutPlus(std::string_view text) {
+  const bool isPlus = text.starts_with('+') && !text.starts_with("+-");
+  return text.substr(isPlus ? 1 : 0);
+}
+
 std::optional<Value> integerFrom(std::string_view text) {
-  if (text.starts_with('+')) text.remove_prefix(1);
+  text = withoutPlus(text);
   const bool isNegative = text.starts_with('-');
   const std::string_view digits = text.substr(isNegative ? 1 : 0);
   if (digits.starts_with("0x") || digits.starts_with("0X"))
@@ -62,7 +68,7 @@ std::optional<Value> integerFrom(std::string_view text) {
 }
 
 std::optional<Value> floatFrom(std::string_view text) {
-  if (text.starts_with('+')) text.remove_prefix(1);
+  text = withoutPlus(text);
   const auto number = whole<float>(text);
   return number ? std::optional<Value>(*number) : std::nullopt;
 }
@@ -142,11 +148,27 @@ Result dictionaries(const TagPath& path, std::string_view json) {
   return isBare ? Result(Array::of(*element)) : value;
 }
 
-// Only what would be shown in the same characters: "007" stays a text.
-Value entry(std::string_view text, const Value& old) {
+// An entry keeps its kind. A new one is an integer only if it would be shown in the same
+// characters: "007" is a text.
+Result entry(std::string_view text, const Value& old) {
+  if (old.isNumber()) {
+    auto value = number(integerFrom, "an integer", text);
+    if (auto* problem = std::get_if<ValueProblem>(&value))
+      problem->message += "; := takes a text in quotes";
+    return value;
+  }
   const auto number = whole<std::int32_t>(text);
   const bool isNumber = number && fmt::format("{}", *number) == text;
   return isNumber && !old.isText() ? Value(*number) : Value(text);
+}
+
+// What every reader takes for a GUID. Others can be stored, and then it is not the clip's.
+Result guid(std::string_view digits) {
+  constexpr std::size_t guidSize = 16;
+  Result value = data(digits);
+  const auto* bytes = std::get_if<Value>(&value);
+  if (bytes == nullptr || bytes->data().size() == guidSize) return value;
+  return ValueProblem{"guid-length", fmt::format("needs 16 bytes, got {}", bytes->data().size())};
 }
 
 // By how the tag is read; where nobody reads it, by how it would be written.
@@ -159,8 +181,8 @@ Result byKind(const TagPath& path, std::string_view text) {
     case Read::floats: return floats(path.row->count, text);
     case Read::integers:
     case Read::ints: return numbers(integerFrom, "integers", text);
-    case Read::data:
-    case Read::guid: return data(text);
+    case Read::data: return data(text);
+    case Read::guid: return guid(text);
     case Read::texts: return Array::of(filled(text));
     case Read::nested: return jsonValue(path, text);
     case Read::nestedList:
@@ -180,7 +202,7 @@ Result byKind(const TagPath& path, std::string_view text) {
 }  // namespace
 
 Result typedValue(const TagPath& path, std::string_view text, const Value& old) {
-  return path.isEntry ? Result(entry(text, old)) : byKind(path, text);
+  return path.isEntry ? entry(text, old) : byKind(path, text);
 }
 
 Result jsonValue(const TagPath& path, std::string_view json) {

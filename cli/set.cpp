@@ -64,6 +64,8 @@ std::vector<Loss> lossesOf(const TagPath& path, const Value& value, Layout layou
   const std::string text = path.text();
   std::erase_if(losses, [&](const Loss& loss) {
     return loss.code == LossCode::shortStream ||
+           // Around what is set there may be more in the clip.
+           (loss.code == LossCode::emptyNested && loss.path != text) ||
            (loss.code == LossCode::pairAdded && folderOf(loss.path) == folderOf(text)) ||
            (loss.code == LossCode::nameGrows && path.isEntry && loss.path == text);
   });

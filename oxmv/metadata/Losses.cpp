@@ -200,11 +200,7 @@ class LossFinder {
       return add(LossCode::textNul, path,
                  quoted(text.substr(0, text.find('\0'))) + " is followed by a NUL, which ends it");
     }
-    if (text.size() > most) {
-      add(LossCode::textLong, path,
-          quoted(text) + " has " + std::to_string(value.length()) + " characters, of which " +
-              std::to_string(most) + " would be stored");
-    }
+    if (text.size() > most) addTextLong(value, path, most);
   }
 
   void explainNumber(const Value& value, const Value& back, const std::string& path) {
@@ -272,6 +268,9 @@ class LossFinder {
   void explainElementText(const Value& element, const Value& back, const std::string& path) {
     const std::string_view text = element.text();
     const bool isPadded = element.isText() && text.size() < 256 && isAscii(text);
+    // NULs inside it are kept, unlike those of other texts.
+    const bool isCut = element.isText() && text.size() > 255 && isAscii(text.substr(0, 255));
+    if (isCut) return addTextLong(element, path, 255);
     if (!isPadded) return explainText(element, back, path, 255);
     const std::size_t added = back.text().size() - text.size();
     add(LossCode::listPads, path,
@@ -447,6 +446,11 @@ class LossFinder {
     }
   }
 
+  void addTextLong(const Value& value, const std::string& path, std::size_t most) {
+    add(LossCode::textLong, path,
+        quoted(value.text()) + " has " + std::to_string(value.length()) + " characters, of which " +
+            std::to_string(most) + " would be stored");
+  }
   void addWrongKind(const Value& value, const Value& back, const std::string& path) {
     std::string message = "is " + std::string(nameOf(value.kind()));
     message += back.isNothing() ? ", which is not stored there"

@@ -19,8 +19,9 @@ namespace {
 using Bytes = std::vector<std::uint8_t>;
 using BytesView = std::span<const std::uint8_t>;
 
-constexpr auto refusals = std::to_array<std::string_view>(
-    {"bad-path", "absent", "not-stored", "would-not-read-back", "damaged-stream"});
+constexpr auto refusals =
+    std::to_array<std::string_view>({"bad-path", "absent", "not-stored", "would-not-read-back",
+                                     "too-short", "marker-first", "damaged-stream"});
 static_assert(refusals.size() == static_cast<std::size_t>(EditRefusal::damagedStream) + 1);
 
 // Whether a stream stands for itself or within another one.
@@ -213,14 +214,42 @@ class StreamEdit {
       editNested(target);
     }
     Bytes edited = splice_.applyTo(stream_);
-    if (decoded(edited, standing_) != expected_) {
-      refuse(EditRefusal::damagedStream,
-             "readers would not find the change there, or would lose something else", at_);
-    }
+    check(edited);
     return edited;
   }
 
  private:
+  void check(const Bytes& edited) const {
+    if (decoded(edited, standing_) == expected_) return;
+    if (standing_ == Standing::outermost && edited.size() < shortestData) {
+      refuse(EditRefusal::tooShort, "fewer than 12 bytes would be left, which nobody reads", at_);
+    }
+    if (startsWithMarker(edited) && !startsWithMarker(stream_)) {
+      refuse(EditRefusal::markerFirst, "a marker would come first, where it is none", at_);
+    }
+    refuse(EditRefusal::damagedStream,
+           "readers would not find the change there, or would lose something else", at_);
+  }
+
+  static bool startsWithMarker(BytesView stream) {
+    return stream.size() >= markerBytes.size() &&
+           std::equal(markerBytes.begin(), markerBytes.end(), stream.begin());
+  }
+
+  // A writer that does not pad leaves the start of the next record where readers see padding. Who
+  // takes out the record, or puts something behind it, would cut that one in two.
+  void checkPadding(const Spot& spot) const {
+    const std::size_t payloadEnd = spot.offset + recordHeaderSize + spot.size;
+    const bool isClean = payloadEnd >= spot.end ||
+                         std::all_of(stream_.begin() + static_cast<std::ptrdiff_t>(payloadEnd),
+                                     stream_.begin() + static_cast<std::ptrdiff_t>(spot.end),
+                                     [](std::uint8_t byte) { return byte == 0; });
+    if (!isClean) {
+      refuse(EditRefusal::damagedStream,
+             "what stands in the padding of a record there would be lost", payloadEnd);
+    }
+  }
+
   void editTag(const Target& target) {
     expected_ = tags_;
     const std::vector<std::size_t> own = spotsOf(target);
@@ -427,6 +456,7 @@ class StreamEdit {
     at_ = spots_[own.front()].offset;
     for (std::size_t i = 0; i < own.size(); ++i) {
       const Spot& spot = spots_[own[i]];
+      checkPadding(spot);
       splice_.replace(spot.offset, spot.end, i == 0 ? joined(records) : Bytes());
     }
   }
@@ -451,6 +481,7 @@ class StreamEdit {
   void insertBehind(std::size_t spot, const std::vector<Bytes>& records) {
     // The stream's last record may lack its padding, and gets it now.
     const Spot& before = spots_[spot];
+    checkPadding(before);
     Bytes padding((4 - (before.end - before.offset) % 4) % 4);
     at_ = before.end;
     Bytes bytes = std::move(padding);

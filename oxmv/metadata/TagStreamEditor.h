@@ -21,8 +21,9 @@ enum class EditRefusal : std::uint8_t {
   absent,            // nothing there to remove
   notStored,         // the encoder would write nothing for the value
   wouldNotReadBack,  // the value would come back changed
-  damagedStream,  // the stream is such that the edit would change, or not reach, what readers make
-                  // of it
+  tooShort,          // fewer than 12 bytes would be left, which nobody takes for a stream
+  markerFirst,       // a marker would come first, where it is none
+  damagedStream,  // the edit would change what readers make of the rest, or they would not find it
 };
 
 // The stable code: "damaged-stream".

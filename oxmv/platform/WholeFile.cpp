@@ -110,11 +110,16 @@ bool syncFolder(const std::filesystem::path& folder) {
   return ::fsync(descriptor.number()) == 0 || errno == EINVAL || errno == ENOTSUP;
 }
 
-// Gives the new file the permissions and owner of the old one. An owner that cannot be given leaves
-// the file ours, without the bits that would let it run as somebody else.
+// Gives the new file the permissions, owner and group of the old one. An owner or group that cannot
+// be given leaves ours, without the bits that would let the file run as somebody else, and without
+// what another group was allowed.
 bool takeOver(int file, const struct stat& old) {
+  constexpr auto asItIs = static_cast<uid_t>(-1);
   mode_t mode = old.st_mode & 07777;
-  if (::fchown(file, old.st_uid, old.st_gid) != 0) mode &= 0777;
+  const bool hasGroup = ::fchown(file, asItIs, old.st_gid) == 0;
+  const bool hasOwner = ::fchown(file, old.st_uid, asItIs) == 0;
+  if (!hasGroup) mode &= ~static_cast<mode_t>(S_IRWXG);
+  if (!hasGroup || !hasOwner) mode &= 0777;
   return ::fchmod(file, mode) == 0;
 }
 

@@ -209,7 +209,8 @@ TEST(Set, ReadsData) {
     expectRefused(
         {"FREE=" + text}, "error",
         "FREE needs hexadecimal digits, two for each byte, got \"" + text + "\" (bad-value)");
-  expectRefused({"GUID=0011"}, "refused",
+  expectRefused({"GUID=0011"}, "error", "GUID needs 16 bytes, got 2 (guid-length)");
+  expectRefused({R"(GUID:={"$data":"0011"})"}, "refused",
                 "GUID has 2 bytes and would be stored as if it had 16 (guid-length);"
                 " nothing written; --layout readable avoids it");
 }
@@ -233,6 +234,39 @@ TEST(Set, MakesEntriesIntegersOnlyIfNothingIsLost) {
             R"("d":"4294967296"})"
             "\n");
   EXPECT_NE(set(clip, {"REG/a=text"}).err.find("(reg-text); nothing written\n"), std::string::npos);
+}
+
+TEST(Set, KeepsTheKindOfAnEntry) {
+  const EditedClip clip("groups-and-lists.colr");
+  EXPECT_EQ(
+      set(clip, {"TAG/ISO=1.5"}).err,
+      "oxmv: error: " + clip.path() +
+          ": TAG /ISO needs an integer, got \"1.5\"; := takes a text in quotes (bad-value)\n");
+  EXPECT_EQ(set(clip, {"TAG/ISO=5000000000"}).exitCode, 4);
+  EXPECT_EQ(set(clip, {R"(TAG/ISO:="1.5")"}).exitCode, 0);
+  EXPECT_EQ(valueOf(clip.path(), "TAG/ISO"), "1.5\n");
+}
+
+TEST(Set, TakesOneSignAtMost) {
+  expectSet("SATU=+0.5", "SATU", "0.5");
+  expectSet("TAKE=+5", "TAKE", "5");
+  expectRefused({"SATU=+-5"}, "error", "SATU needs a number, got \"+-5\" (bad-value)");
+  expectRefused({"TAKE=+-5"}, "error", "TAKE needs an integer, got \"+-5\" (bad-value)");
+}
+
+TEST(Set, LeavesFilesThatAreNoClipsAlone) {
+  const TempDir folder;
+  const std::string file = (folder / "notes.txt").string();
+  for (const std::string content : {"abc", "These are notes, and no clip at all.\n"}) {
+    writeFile(file, std::vector<std::uint8_t>(content.begin(), content.end()));
+    const std::string original = readFile(file);
+    const Outcome outcome = run({"set", file, "REEL=A"});
+    EXPECT_EQ(outcome.exitCode, 4);
+    EXPECT_EQ(outcome.err, "oxmv: refused: " + file +
+                               ": there is no tag in it: is it a clip? (no-tags); nothing written;"
+                               " oxmv encode makes a new one in its place\n");
+    EXPECT_EQ(readFile(file), original);
+  }
 }
 
 TEST(Set, ChangesEntriesInRegWhoseNamesEndWithNuls) {
@@ -302,7 +336,7 @@ TEST(Set, RefusesJsonThatDoesNotFit) {
                 "WBAL takes an array of 4, got 1.0 2.0 (not-accepted)");
   expectRefused({"WBAL:=5"}, "error", "WBAL takes an array of 4, got 5 (not-accepted)");
   expectRefused({"KWRd:=[\"day\"]"}, "refused",
-                "KWRd[0] \"day\" would gain 1 NULs at its end (list-pads); nothing written;"
+                "KWRd[0] \"day\" would gain a NUL at its end (list-pads); nothing written;"
                 " --allow list-pads lets it through");
   expectRefused({"COL1:={\"DTIN\":1}"}, "refused",
                 "COL1/DTDR would come into being as 0, because DTIN is there (pair-added);"
@@ -356,10 +390,11 @@ TEST(Set, PromisesNothingThatAllowWouldNotDo) {
 
 TEST(Set, EncodesInTheLayoutThatIsAskedFor) {
   const EditedClip clip;
-  EXPECT_EQ(set(clip, {"GUID=0011", "--layout", "exact"}).exitCode, 4);
-  EXPECT_EQ(set(clip, {"GUID=0011", "--layout", "readable"}).exitCode, 0);
+  const std::string two = R"(GUID:={"$data":"0011"})";
+  EXPECT_EQ(set(clip, {two, "--layout", "exact"}).exitCode, 4);
+  EXPECT_EQ(set(clip, {two, "--layout", "readable"}).exitCode, 0);
   EXPECT_EQ(valueOf(clip.path(), "GUID"), "0011\n");
-  EXPECT_EQ(set(clip, {"GUID=0011", "--layout", "tidy"}).exitCode, 2);
+  EXPECT_EQ(set(clip, {two, "--layout", "tidy"}).exitCode, 2);
 }
 
 TEST(Set, MakesAllAssignmentsOrNone) {
@@ -526,7 +561,10 @@ TEST(Set, RefusesToEditWhatReadersWouldNotFind) {
   const std::string original = readFile(clip);
   const Outcome outcome = run({"set", clip, "NAME=x"});
   EXPECT_EQ(outcome.exitCode, 4);
-  EXPECT_EQ(outcome.err, "oxmv: refused: " + clip +
+  EXPECT_EQ(outcome.err, "oxmv: warning: " + clip +
+                             ": byte 0: REEL claims 9000 bytes, 4 are there (incomplete-record)\n"
+                             "oxmv: refused: " +
+                             clip +
                              ": NAME at byte 12: readers would not find the change there, or would"
                              " lose something else (damaged-stream); nothing written; oxmv check"
                              " says what is wrong with the clip\n");

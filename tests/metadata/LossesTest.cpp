@@ -13,6 +13,7 @@
 namespace oxmv {
 namespace {
 
+using namespace std::string_literals;
 using namespace std::string_view_literals;
 using Found = std::vector<std::string>;
 
@@ -149,6 +150,7 @@ TEST(Losses, NamesListsOfTexts) {
   EXPECT_EQ(losses({{"KWRd", Array::of("one\0"sv, "a\0bc"sv)}}), Found());
   EXPECT_EQ(losses({{"KWRd", Array::of(letters(255))}}), Found{"list-pads KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of(letters(256))}}), Found{"text-long KWRd[0]"});
+  EXPECT_EQ(losses({{"KWRd", Array::of("a\0"s + letters(300))}}), Found{"text-long KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of("Caf\xC3\xA9")}}), Found{"text-nonascii KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of("four", 4)}}), Found{"wrong-kind KWRd[1]"});
   EXPECT_EQ(losses({{"KWRd", Array()}}), Found{"list-empty KWRd"});

@@ -328,6 +328,29 @@ TEST(TagStreamEditor, PadsWhatItWritesSoThatReadersFindWhatFollows) {
             StreamBuilder().record("FREE", 'c', five).record("TAKE", 'B', 1).bytes());
 }
 
+// A writer that does not pad leaves a record where readers see the padding of the one before.
+TEST(TagStreamEditor, LeavesWhatStandsInThePaddingOfARecord) {
+  const StreamBuilder unpadded = StreamBuilder()
+                                     .record("FREE", 'c', Bytes(5, 0x5A))
+                                     .dropLast(3)
+                                     .record("REEL", 'c', "A001")
+                                     .record("TAKE", 'B', 1);
+  for (const Value& value : {data(4), data(8)})
+    expectRefused(unpadded, "FREE", value, "damaged-stream at 13");
+  expectRefused(unpadded, "SHOT", 1, "damaged-stream at 13");
+  TagStreamEditor editor(unpadded.bytes());
+  EXPECT_EQ(outcome(editor.remove("FREE")), "damaged-stream at 13");
+  EXPECT_EQ(editor.stream(), unpadded.bytes());
+  EXPECT_EQ(set(unpadded, "PRCS", 1),
+            StreamBuilder().record("PRCS", 'L', 1).raw(unpadded.bytes()).bytes());
+}
+
+TEST(TagStreamEditor, RefusesToPutAMarkerFirst) {
+  TagStreamEditor editor(
+      StreamBuilder().record("REEL", 'c', "A001").marker(2).record("TAKE", 'B', 1).bytes());
+  EXPECT_EQ(outcome(editor.remove("REEL")), "marker-first at 0");
+}
+
 TEST(TagStreamEditor, LeavesMarkersWhereTheyAre) {
   const StreamBuilder stream = StreamBuilder()
                                    .record("PRCS", 'L', 1)
@@ -425,7 +448,7 @@ TEST(TagStreamEditor, TakesTooFewBytesForNoStream) {
   expectRefused(StreamBuilder().header("KWRd", 0, 'c'), "TAKE", 1, "damaged-stream at 0");
   // And removing may not leave so few.
   TagStreamEditor editor(StreamBuilder().header("KWRd", 0, 'c').record("TAKE", 'B', 1).bytes());
-  EXPECT_EQ(outcome(editor.remove("TAKE")), "damaged-stream at 8");
+  EXPECT_EQ(outcome(editor.remove("TAKE")), "too-short at 8");
 }
 
 TEST(TagStreamEditor, UsesTheLayoutItIsGiven) {
