@@ -92,6 +92,34 @@ bool isSingleValued(const TagRow& row) {
          row.read != Read::controlPoint;
 }
 
+// How many bytes of payload the rule of a record's tag takes, whatever its size says; its size, where it takes all.
+std::uint32_t bytesTaken(const Record& record) {
+  constexpr std::uint32_t number = 4;
+  constexpr std::uint32_t guid = 16;
+  switch (record.row->read) {
+    case Read::int32:
+    case Read::uint8:
+    case Read::uint16:
+    case Read::float32:
+    case Read::ints: return number;
+    case Read::integers: return record.size / number * number;
+    case Read::guid: return guid;
+    case Read::controlPoint: return std::max(record.size, controlPointSize);
+    case Read::tagValue:
+    case Read::regValue: return isText(record) ? record.size : number;
+    case Read::none:
+    case Read::text:
+    case Read::floats:
+    case Read::data:
+    case Read::nested:
+    case Read::texts:
+    case Read::nestedList:
+    case Read::tagName:
+    case Read::regName: break;
+  }
+  return record.size;
+}
+
 bool isZeros(const Record& record) {
   return record.tag == Tag{} && record.size == 0 && record.type == 0;
 }
@@ -108,6 +136,7 @@ std::string_view codeOf(const Finding& finding) noexcept {
     case Oddity::zeros: return oxmv::codeOf(SkipReason::unknownTag);
     case Oddity::terminator: return "terminator";
     case Oddity::replaced: return "replaced-value";
+    case Oddity::oddSize: return "odd-size";
     case Oddity::notUtf8: return "text-not-utf8";
     case Oddity::withoutNul: return "text-without-nul";
     case Oddity::paddingMissing: return "padding-missing";
@@ -128,6 +157,8 @@ std::string describe(const Finding& finding) {
     case Oddity::terminator: return "end of the control points";
     case Oddity::replaced:
       return fmt::format("{}: its value is replaced at byte {}", tag, finding.other);
+    case Oddity::oddSize:
+      return fmt::format("{} size {}: read as if it were {}", tag, finding.size, finding.count);
     case Oddity::notUtf8: return fmt::format("{}: not UTF-8, read as ISO-8859-1", tag);
     case Oddity::withoutNul: return fmt::format("{}: its text has no NUL at its end", tag);
     case Oddity::paddingMissing:
@@ -160,6 +191,7 @@ bool isLoss(const Finding& finding) noexcept {
     case Oddity::skipped:
     case Oddity::stopped:
     case Oddity::cutPayload:
+    case Oddity::oddSize:
     case Oddity::zeros: return true;
     case Oddity::tooShort: return finding.count != 0;
     case Oddity::terminator:
@@ -212,10 +244,12 @@ void FindingCollector::onRecord(const Record& record) {
   } else {
     checkPadding(record);
   }
+  if (record.row != nullptr && record.row->read == Read::controlPoint) checkSize(record);
   if (record.row != nullptr && record.row->read == Read::nested) nested_ = record;
 }
 
 void FindingCollector::onValue(const Record& record, const Value& value) {
+  checkSize(record);
   checkText(record);
   takeValue(record, &value);
 }
@@ -259,6 +293,14 @@ void FindingCollector::add(const Record& record, Finding finding) {
   finding.tag = record.tag;
   finding.size = record.size;
   findings_.push_back(finding);
+}
+
+// A number is read from its own bytes, also from behind a payload that is too short for it; of a longer one the rest
+// is read by nobody.
+void FindingCollector::checkSize(const Record& record) {
+  if (record.payload.size() < record.size) return;  // said already
+  const std::uint32_t taken = bytesTaken(record);
+  if (taken != record.size) add(record, {.oddity = Oddity::oddSize, .count = taken});
 }
 
 void FindingCollector::checkPadding(const Record& record) {

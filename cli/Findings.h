@@ -24,6 +24,7 @@ enum class Oddity : std::uint8_t {
   zeros,           // `count` bytes of zeros, where records would stand
   terminator,      // the eight bytes of zeros behind control points: as it should be
   replaced,        // a later record, at `other`, gives the tag another value
+  oddSize,         // read as if it had `count` bytes of payload, which is not its size
   notUtf8,         // text that is read as ISO-8859-1
   withoutNul,      // text that ends with its payload, where a writer puts a NUL
   paddingMissing,  // `count` bytes of padding that are not there
@@ -40,8 +41,8 @@ struct Finding {
   std::uint32_t offset = 0;  // of the record, or where the walk ended
   std::optional<Tag> tag = {};
   std::uint32_t size = 0;  // of the record, as its header has it
-  std::uint32_t count =
-      0;  // bytes; of a payload those that are there, of a stop those that are left
+  // Bytes; of a payload those that are there, of a stop those that are left.
+  std::uint32_t count = 0;
   std::uint32_t other = 0;  // offset of another record
 };
 
@@ -97,6 +98,7 @@ class FindingCollector final : public StreamObserver {
   Walk& walk(int level) { return walks_[static_cast<std::size_t>(level)]; }
   void begin(int level, std::size_t end);
   void add(const Record& record, Finding finding);
+  void checkSize(const Record& record);
   void checkPadding(const Record& record);
   void checkText(const Record& record);
   bool isPaddedWithNul(const Record& record) const;

@@ -78,7 +78,7 @@ const Verb checkVerb = {
     .examples =
         "oxmv check *.colr\n"
         "oxmv check --json clip.colr\n"
-        "oxmv check -q clip.colr && echo well\n",
+        "oxmv check clip.colr && echo well\n",
     .details =
         "One line for each finding: the file, the byte, what it is, and its code. Exit code 1\n"
         "when something was found. Findings are whatever readers leave out, and whatever a\n"

@@ -65,7 +65,7 @@ class Reporter final : public StreamObserver {
   }
   void onValue(const Record&, const Value& value) override { telling_->value = value; }
   void onMarker(std::size_t offset, std::uint32_t bytes, int level) override {
-    flush();
+    flush(offset);
     report_.addMarker(offset, bytes, level);
   }
   void finish() {
@@ -75,10 +75,11 @@ class Reporter final : public StreamObserver {
 
  private:
   // Reports what stands before the place that the decoder has come to.
-  void flush() {
+  void flush(std::size_t place = static_cast<std::size_t>(-1)) {
     if (telling_) finishRecord(*telling_);
     telling_.reset();
     for (; !findings_.empty() && findings_[0].order <= 2 * records_; drop()) {
+      if (findings_[0].offset > place) break;
       if (findings_[0].oddity == Oddity::stopped) {
         report_.addUnread(findings_[0]);
       } else {

@@ -85,7 +85,6 @@ const Verb encodeVerb = {
     .summary = "make a clip of tags in JSON",
     .examples =
         "oxmv encode tags.json -o clip.colr\n"
-        "oxmv show --json clip.colr | jq '.[0].tags' | oxmv encode - -o copy.colr\n"
         "oxmv encode tags.json -o clip.colr --layout readable\n",
     .details =
         "Tags that would not read back as they are in FILE.json are refused, each with a code,\n"

@@ -106,6 +106,10 @@ class LossFinder {
     const bool isShort = !back.empty() && stream.size() < shortestData;
     if (back == tags && !isShort) return {};
     explain(tags, "", 0);
+    for (std::size_t i = 0; i < nested_.size(); ++i) {
+      const Nested next = nested_[i];  // explaining it may bring more
+      explain(next.tags, next.prefix, next.level);
+    }
     if (isShort) {
       add(LossCode::shortStream, std::string((*back.begin()).key),
           "takes " + std::to_string(stream.size()) +
@@ -139,7 +143,7 @@ class LossFinder {
 
   void explainEntry(std::string_view key, const Value& value, const Value& back,
                     const std::string& path, int level) {
-    const std::size_t before = losses_.size();
+    const std::size_t before = explained();
     const TagRow* row = findTagRow(key);
     if (row == nullptr || row->write == Write::none) {
       explainKey(key, path);
@@ -149,7 +153,7 @@ class LossFinder {
     } else {
       explainValue(*row, value, back, path, level);
     }
-    if (losses_.size() == before) add(LossCode::notReadBack, path, "would come back changed");
+    if (explained() == before) add(LossCode::notReadBack, path, "would come back changed");
   }
 
   void explainKey(std::string_view key, const std::string& path) {
@@ -293,7 +297,7 @@ class LossFinder {
     const Stream stream = encoded(nested, layout_);
     if (stream.size() + before > maxRecordSize) return addTooLarge(path, stream.size());
     if (decoded(stream) != nested || nestsTooDeep(nested, level + 1))
-      explain(nested, path + "/", level + 1);
+      nested_.push_back({nested, path + "/", level + 1});
     addCutSize(path, stream.size());
   }
 
@@ -351,12 +355,12 @@ class LossFinder {
                  quoted(value.text()) + " would be written as a name, and be lost");
     }
     const Value was = back.empty() ? Value() : (*back.begin()).value;
-    const std::size_t before = losses_.size();
+    const std::size_t before = explained();
     if (!back.contains(name)) explainName(isReg, name, path);
     if (!(was == value))
       value.isText() && was.isText() ? explainGroupText(value, was, path)
                                      : explainNumber(value, was, path);
-    if (losses_.size() == before) add(LossCode::notReadBack, path, "would come back changed");
+    if (explained() == before) add(LossCode::notReadBack, path, "would come back changed");
   }
 
   void explainName(bool isReg, std::string_view name, const std::string& path) {
@@ -487,8 +491,18 @@ class LossFinder {
     losses_.push_back({code, std::move(path), std::move(message), std::nullopt});
   }
 
+  std::size_t explained() const { return losses_.size() + nested_.size(); }
+
   const Layout layout_;
   std::vector<Loss> losses_;
+  // Nested streams that have to be explained in their turn: a stack frame for each would not do, they
+  // may stand 64 deep.
+  struct Nested {
+    Dictionary tags;
+    std::string prefix;
+    int level;
+  };
+  std::vector<Nested> nested_;
   std::set<std::pair<LossCode, std::string>> known_;
 };
 

@@ -26,7 +26,7 @@ bool accepts(const TagRow& row, const Value& value) {
 
 }  // namespace
 
-MetadataDictionary& MetadataDictionary::init() {
+MetadataDictionary& MetadataDictionary::init() & {
   _simpleTags.reset();
   _isSingle = false;
   _eye = 0;
@@ -37,13 +37,13 @@ MetadataDictionary& MetadataDictionary::init() {
 
 MetadataDictionary& MetadataDictionary::initWithBytes(std::span<const std::uint8_t> bytes,
                                                       std::int32_t length,
-                                                      StreamObserver* observer) {
+                                                      StreamObserver* observer) & {
   _simpleTags = processBytes(bytes, length, observer);
   return *this;
 }
 
 MetadataDictionary& MetadataDictionary::initWithData(std::span<const std::uint8_t> data,
-                                                     StreamObserver* observer) {
+                                                     StreamObserver* observer) & {
   if (data.size() < shortestData) return *this;
   return initWithBytes(data, static_cast<std::int32_t>(static_cast<std::uint32_t>(data.size())),
                        observer);

@@ -28,6 +28,7 @@ constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 //   auto clip = MetadataDictionary().initWithData(bytes);
 //   std::cout << clip.metadata()["REEL"].text();
 //
+// The initialisers work on the object they are called on and give it back: a temporary by value.
 // Copies are independent of each other, and cheap. One object is used from one thread at a time;
 // different objects from different threads as one likes.
 class MetadataDictionary {
@@ -38,17 +39,25 @@ class MetadataDictionary {
   // Back to no tags at all, a combined object (not one eye's). The GUID stays. Also forgets the
   // table of labels, for all objects: the next translateTag() makes it anew. Kept on purpose, and
   // without effect on labels handed out.
-  MetadataDictionary& init();
+  MetadataDictionary& init() &;
 
   // Takes the tags from a stream; see processBytes(). Everything else stays as it was.
   MetadataDictionary& initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
-                                    StreamObserver* observer = nullptr);
+                                    StreamObserver* observer = nullptr) &;
+  MetadataDictionary initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
+                                   StreamObserver* observer = nullptr) && {
+    return initWithBytes(bytes, length, observer);
+  }
 
   // The same for a whole stream. Fewer than 12 bytes, the shortest record with a value, change
   // nothing. The length is cut to 32 bits, so data of 2 GiB and more count as a length that may be
   // negative, which gives no tags.
   MetadataDictionary& initWithData(std::span<const std::uint8_t> data,
-                                   StreamObserver* observer = nullptr);
+                                   StreamObserver* observer = nullptr) &;
+  MetadataDictionary initWithData(std::span<const std::uint8_t> data,
+                                  StreamObserver* observer = nullptr) && {
+    return initWithData(data, observer);
+  }
 
   // Decodes a stream of `length` bytes into a dictionary of its own; the object's tags stay as they
   // are. `bytes` are the bytes really there, see decodeStream(). A GUID record in the stream

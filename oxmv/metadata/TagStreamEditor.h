@@ -48,9 +48,8 @@ enum class Fidelity : std::uint8_t {
 // A path names what is edited:
 //
 //   WBAL           a tag of the stream
-//   COL1/WBAL      a tag of the stream nested in it under COL1 (or COL2), which is made if it is
-//   not there TAG /ISO       an entry of the group "TAG " (or "REG "); everything behind the '/' is
-//   its name
+//   COL1/WBAL      a tag of the stream nested in it under COL1 or COL2 (made if it is not there)
+//   TAG /ISO       an entry of the group "TAG " or "REG "; all behind the '/' is its name
 //
 // A new record stands where the encoder would put it: PRCS, UFRM and TIMC first, then all others,
 // then COL1, COL2, DTIN, DTDR, DTFI, DTFO and CTLp. A replaced one keeps its place; of several

@@ -13,13 +13,11 @@ namespace oxmv {
 // How records are laid out.
 enum class Layout : std::uint8_t {
   // As the format's writer has always done: raw data and nested streams without padding, their
-  // sizes by the low 16
-  // bits, a GUID's size always 16. What is not a multiple of 4 or longer than 65535 bytes does not
-  // read back.
+  // sizes by the low 16 bits, a GUID's size always 16. What is not a multiple of 4, or longer than
+  // 65535 bytes, does not read back.
   exact,
   // True sizes of 24 bits, every record padded to 4: all readers step over it rightly. The same as
-  // `exact` for
-  // dictionaries whose data are short and come in multiples of 4.
+  // `exact` for dictionaries whose data are short and come in multiples of 4.
   readable,
 };
 

@@ -24,9 +24,13 @@ class Dictionary;
 // payload, so copying one is cheap and needs no memory. A value taken out of a decoded stream keeps
 // that stream's block alive.
 //
-// The accessors answer for every kind and never fail: see each. Those that hand out views do so
-// only for a value that has a name; asked of a temporary, they hand out a copy, which nothing can
-// pull away.
+// The accessors answer for every kind and never fail: see each. Those that hand out views do so only
+// for a value that has a name; asked of a temporary, they hand out a copy. Keep that copy as what it
+// is: a std::string_view or std::span made of it would outlive it.
+//
+//   const auto reel = tags["REEL"].text();        // a std::string
+//   const Value value = tags["REEL"];             // or keep the value,
+//   const std::string_view view = value.text();   // and a view of it
 //
 // Different threads may use different values freely, also where they share a payload.
 class Value {
@@ -56,6 +60,7 @@ class Value {
   // Text that is not valid UTF-8 is taken as ISO-8859-1.
   Value(std::string_view text);
   Value(const std::string& text) : Value(std::string_view(text)) {}
+  Value(std::nullptr_t) = delete;
   Value(const char* text) : Value(std::string_view(text)) {}
   // Text of a derived string kind. It differs from other text in one place: as a value in the "REG
   // " group the encoder takes it for a number.

@@ -65,6 +65,25 @@ TEST(Check, FindsWhatReadersIgnore) {
             "byte 12: TIMB: ignored, too few bytes left for its number (short-payload)\n");
 }
 
+TEST(Check, FindsNumbersWhoseSizeIsNotTheirs) {
+  // Read from the record behind them, or leaving bytes that nobody reads.
+  const auto found = [](const char* tag, std::uint32_t size, char type) {
+    return findingsIn(
+        StreamBuilder().header(tag, size, type).raw(Bytes((size + 3) / 4 * 4)).raw(take().bytes()));
+  };
+  EXPECT_EQ(found("GAIN", 0, 'B'), "byte 0: GAIN size 0: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("TIMB", 1, 'B'), "byte 0: TIMB size 1: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("PRCS", 8, 'L'), "byte 0: PRCS size 8: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("SATU", 2, 'f'), "byte 0: SATU size 2: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("SCPg", 0, 'H'), "byte 0: SCPg size 0: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("BADP", 6, 'H'), "byte 0: BADP size 6: read as if it were 4 (odd-size)\n");
+  EXPECT_EQ(found("GUID", 4, 'G'), "byte 0: GUID size 4: read as if it were 16 (odd-size)\n");
+  EXPECT_EQ(found("CTLp", 4, 0), "byte 0: CTLp size 4: read as if it were 8 (odd-size)\n");
+  for (const char* tag : {"GAIN", "TIMB", "PRCS", "SATU", "SCPg", "BADP"})
+    EXPECT_EQ(found(tag, 4, 'L'), "");
+  EXPECT_EQ(found("GUID", 16, 'G'), "");
+}
+
 TEST(Check, FindsWhereReadersStop) {
   EXPECT_EQ(findingsIn(take().raw({0, 0, 0, 0})),
             "stopped at byte 12: 4 bytes are left, a record needs 8 (cut-header)\n");

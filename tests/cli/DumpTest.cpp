@@ -44,6 +44,17 @@ std::size_t accountedFor(const Json& dump) {
   return sum;
 }
 
+TEST(Dump, ShowsWhatStopsBehindAMarkerBehindIt) {
+  const TempDir folder;
+  const std::string file = (folder / "clip.colr").string();
+  writeFile(
+      file,
+      StreamBuilder().record("TAKE", 'B', 1).marker(2).marker(2).record("SHOT", 'B', 2).bytes());
+  const std::string out = run({"dump", file}).out;
+  EXPECT_LT(out.find("    12  marker"), out.find("    16 "));
+  EXPECT_NE(out.find("    16 "), std::string::npos);
+}
+
 TEST(Dump, ShowsEveryRecord) {
   const Outcome outcome = run({"dump", data + "eye-left.col1"});
   EXPECT_EQ(outcome.exitCode, 0);
