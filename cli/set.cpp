@@ -81,6 +81,12 @@ bool isAccepted(const TagPath& path, const Value& value) {
   return MetadataDictionary().addObject(value, path.keys.back());
 }
 
+// Where nothing would be written even if the loss were allowed.
+std::string otherWay(LossCode code) {
+  if (code == LossCode::regText) return "entries of \"TAG \" take texts";
+  return "oxmv tags says what is stored, and how";
+}
+
 // Makes the assignments of one call, as long as none is refused.
 class Assigner {
  public:
@@ -154,7 +160,7 @@ class Assigner {
     // There are losses that leave nothing to be written.
     const bool isPossible =
         loss.avoidedBy || !edit(trial, path, value, isAppended, Fidelity::lossy);
-    return isPossible ? wayOut(loss) : "";
+    return isPossible ? wayOut(loss) : otherWay(loss.code);
   }
 
   Call& call_;

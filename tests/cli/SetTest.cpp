@@ -135,7 +135,7 @@ TEST(Set, ChangesEveryTagByItsLabel) {
 TEST(Set, NamesTheTagThatIsMeantByTheOneThatIsNeverStored) {
   expectRefused({"Mark good take=1"}, "refused",
                 "MKGD is a tag that is never stored; the tag that is stored is MRKG (unknown-tag);"
-                " nothing written");
+                " nothing written; oxmv tags says what is stored, and how");
   expectSet("MRKG=1", "MRKG", "1");
 }
 
@@ -233,7 +233,9 @@ TEST(Set, MakesEntriesIntegersOnlyIfNothingIsLost) {
             R"({"ISO":400,"Lens":"50","Filter":"ND6","Height":140,"a":12,"b":"012","c":-3,)"
             R"("d":"4294967296"})"
             "\n");
-  EXPECT_NE(set(clip, {"REG/a=text"}).err.find("(reg-text); nothing written\n"), std::string::npos);
+  EXPECT_NE(set(clip, {"REG/a=text"})
+                .err.find("(reg-text); nothing written; entries of \"TAG \" take texts\n"),
+            std::string::npos);
 }
 
 TEST(Set, KeepsTheKindOfAnEntry) {
@@ -375,10 +377,13 @@ TEST(Set, LetsThroughWhatIsAllowedAndWarns) {
 }
 
 TEST(Set, PromisesNothingThatAllowWouldNotDo) {
-  for (const std::string word : {"GHTL=5", "REG/a=b"}) {
+  const auto said = [](const std::string& word) {
     const EditedClip clip;
-    EXPECT_TRUE(set(clip, {word}).err.ends_with("); nothing written\n")) << word;
-  }
+    return set(clip, {word}).err;
+  };
+  EXPECT_TRUE(
+      said("GHTL=5").ends_with("; nothing written; oxmv tags says what is stored, and how\n"));
+  EXPECT_TRUE(said("REG/a=b").ends_with("; nothing written; entries of \"TAG \" take texts\n"));
   const EditedClip clip;
   const Outcome outcome = set(clip, {"MKGD=1", "--allow", "unknown-tag"});
   EXPECT_EQ(outcome.exitCode, 4);
