@@ -35,8 +35,8 @@ std::error_code lastError() { return {errno, std::generic_category()}; }
 class Descriptor {
  public:
   explicit Descriptor(int number) : number_(number) {}
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
+  Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+  Descriptor& operator=(Descriptor&&) = delete;
   ~Descriptor() {
     if (isOpen()) ::close(number_);
   }
@@ -50,6 +50,13 @@ class Descriptor {
   int number_;
 };
 
+// What keeps a path from naming a file; none when nothing does.
+std::error_code objectionTo(const std::filesystem::path& path) {
+  if (path.native().find('\0') != std::string::npos)
+    return make_error_code(std::errc::invalid_argument);
+  return {};
+}
+
 // What keeps a file of this kind and size from being ours; none when nothing does.
 std::error_code objectionTo(const struct stat& status) {
   if (S_ISDIR(status.st_mode)) return make_error_code(std::errc::is_a_directory);
@@ -57,17 +64,47 @@ std::error_code objectionTo(const struct stat& status) {
   return {};
 }
 
+// Opened for reading if it is a regular file; else not open, with the cause in `error`.
+Descriptor openFile(const std::filesystem::path& path, struct stat& status,
+                    std::error_code& error) {
+  error = objectionTo(path);
+  if (error) return Descriptor(-1);
+  // Non-blocking, so that a pipe without a writer answers at once; it means nothing to a regular
+  // file.
+  Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  if (!file.isOpen() || ::fstat(file.number(), &status) != 0) {
+    error = lastError();
+  } else {
+    error = objectionTo(status);
+  }
+  return error ? Descriptor(-1) : std::move(file);
+}
+
+// Reads until `content` is full or the file ends. Answers how many bytes that were; nothing, with the
+// cause in `error`, when the reading fails.
+std::optional<std::size_t> readInto(std::span<std::uint8_t> content, int file,
+                                    std::error_code& error) {
+  std::size_t size = 0;
+  while (size < content.size()) {
+    const ssize_t count = ::read(file, content.data() + size, content.size() - size);
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) return error = lastError(), std::nullopt;
+    if (count == 0) break;
+    size += static_cast<std::size_t>(count);
+  }
+  return size;
+}
+
+// `content` comes with the size that is expected.
 bool readAll(int file, std::vector<std::uint8_t>& content, std::error_code& error) {
   std::size_t size = 0;
   for (;;) {
-    if (size == content.size())
-      content.resize(std::min(std::max<std::size_t>(2 * size, 4096), maxFileSize + 1));
-    const ssize_t count = ::read(file, content.data() + size, content.size() - size);
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return error = lastError(), false;
-    if (count == 0) break;
-    size += static_cast<std::size_t>(count);
+    const auto count = readInto(std::span(content).subspan(size), file, error);
+    if (!count) return false;
+    size += *count;
     if (size > maxFileSize) return error = FileError::tooLarge, false;
+    if (size < content.size()) break;
+    content.resize(std::min(std::max<std::size_t>(2 * size, 4096), maxFileSize + 1));
   }
   content.resize(size);
   return true;
@@ -132,19 +169,26 @@ std::error_code make_error_code(FileError error) noexcept {
 
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error) {
-  error.clear();
-  // Non-blocking, so that a pipe without a writer answers at once; it means nothing to a regular
-  // file.
-  const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   struct stat status = {};
-  if (!file.isOpen() || ::fstat(file.number(), &status) != 0)
-    return error = lastError(), std::nullopt;
-  if ((error = objectionTo(status))) return std::nullopt;
+  const Descriptor file = openFile(path, status, error);
+  if (!file.isOpen()) return std::nullopt;
   const auto size = static_cast<std::uintmax_t>(status.st_size);
   if (size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
   std::vector<std::uint8_t> content(static_cast<std::size_t>(size) +
                                     1);  // one more, to meet the end in one go
   if (!readAll(file.number(), content, error)) return std::nullopt;
+  return content;
+}
+
+std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
+                                                       std::size_t count, std::error_code& error) {
+  struct stat status = {};
+  const Descriptor file = openFile(path, status, error);
+  if (!file.isOpen()) return std::nullopt;
+  std::vector<std::uint8_t> content(count);
+  const auto size = readInto(content, file.number(), error);
+  if (!size) return std::nullopt;
+  content.resize(*size);
   return content;
 }
 
@@ -160,7 +204,8 @@ bool hasContent(const std::filesystem::path& path, const std::optional<Content>&
 // Null for `old`: whatever is there is replaced.
 bool write(const std::filesystem::path& path, std::span<const std::uint8_t> content,
            const std::optional<Content>* old, std::error_code& error) {
-  error.clear();
+  error = objectionTo(path);
+  if (error) return false;
   const std::filesystem::path target = followLinks(path, error);
   if (error) return false;
   struct stat replaced = {};
@@ -198,6 +243,12 @@ bool writeWholeFile(const std::filesystem::path& path, std::span<const std::uint
 bool replaceWholeFile(const std::filesystem::path& path, const std::optional<Content>& old,
                       std::span<const std::uint8_t> content, std::error_code& error) {
   return write(path, content, &old, error);
+}
+
+bool removeFile(const std::filesystem::path& path, std::error_code& error) {
+  error = objectionTo(path);
+  if (!error && ::unlink(path.c_str()) != 0) error = lastError();
+  return !error;
 }
 
 }  // namespace oxmv

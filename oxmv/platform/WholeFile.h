@@ -1,4 +1,5 @@
-// Whole files in, whole files out.
+// Whole files in, whole files out. A path that has a NUL in it names no file: the system would cut it
+// there, and with that reach another one. It is std::errc::invalid_argument.
 
 #pragma once
 
@@ -31,6 +32,10 @@ std::error_code make_error_code(FileError error) noexcept;
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error);
 
+// The first `count` bytes of such a file, or all of them if it has fewer; it may be of any size.
+std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
+                                                       std::size_t count, std::error_code& error);
+
 // Puts a file with this content at `path`, in place of the regular file that may be there: whoever
 // opens it finds the old content or the new, whole, also after a crash. The content goes to a
 // temporary file of random name in the same folder (".oxmv-<16 digits>.tmp"), which then takes the
@@ -48,6 +53,10 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
 [[nodiscard]] bool replaceWholeFile(const std::filesystem::path& path,
                                     const std::optional<std::vector<std::uint8_t>>& old,
                                     std::span<const std::uint8_t> content, std::error_code& error);
+
+// Removes the file, or the symbolic link, of that name; never a folder. Answers false with the cause
+// in `error` when that fails, also when there is none.
+[[nodiscard]] bool removeFile(const std::filesystem::path& path, std::error_code& error);
 
 }  // namespace oxmv
 

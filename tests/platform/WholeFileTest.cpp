@@ -126,6 +126,52 @@ TEST(ReadWholeFile, SaysThatTheFileMayNotBeRead) {
   }));
 }
 
+TEST(ReadWholeFile, RefusesANameWithANulInIt) {
+  const TempDir dir;
+  put(dir / "clip", oldContent);
+  std::error_code error;
+  EXPECT_EQ(readWholeFile(dir / std::string("clip\0.colr", 10), error), std::nullopt);
+  EXPECT_EQ(error, std::errc::invalid_argument);
+}
+
+TEST(ReadFileStart, GivesAsManyBytesAsAreAskedFor) {
+  const TempDir dir;
+  put(dir / "clip", newContent);
+  std::error_code error = FileError::tooLarge;
+  EXPECT_EQ(readFileStart(dir / "clip", 3, error), (Bytes{'n', 'e', 'w'}));
+  EXPECT_FALSE(error);
+  EXPECT_EQ(readFileStart(dir / "clip", 5, error), newContent);
+  EXPECT_EQ(readFileStart(dir / "clip", 0, error), Bytes());
+}
+
+TEST(ReadFileStart, GivesAllOfAFileThatHasFewer) {
+  const TempDir dir;
+  put(dir / "clip", newContent);
+  std::error_code error;
+  EXPECT_EQ(readFileStart(dir / "clip", 64, error), newContent);
+  EXPECT_FALSE(error);
+}
+
+TEST(ReadFileStart, LooksIntoAFileOfAnySize) {
+  const TempDir dir;
+  put(dir / "clip", newContent);
+  fs::resize_file(dir / "clip",
+                  std::uintmax_t{1} << 31);  // two gibibytes, none of them on the disk
+  std::error_code error;
+  EXPECT_EQ(readFileStart(dir / "clip", 5, error), newContent);
+  EXPECT_EQ(readWholeFile(dir / "clip", error), std::nullopt);
+  EXPECT_EQ(error, FileError::tooLarge);
+}
+
+TEST(ReadFileStart, SaysWhyThereIsNothingToRead) {
+  const TempDir dir;
+  std::error_code error;
+  EXPECT_EQ(readFileStart(dir / "clip", 5, error), std::nullopt);
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+  EXPECT_EQ(readFileStart(dir.path(), 5, error), std::nullopt);
+  EXPECT_EQ(error, std::errc::is_a_directory);
+}
+
 TEST(WriteWholeFile, MakesANewFile) {
   const TempDir folder;
   const mode_t mask = ::umask(027);
@@ -255,6 +301,58 @@ TEST(WriteWholeFile, KeepsTheOldFileAndNothingElseWhenWritingFails) {
   EXPECT_EQ(error, std::errc::file_too_large);
   EXPECT_EQ(get(folder / "clip"), oldContent);
   EXPECT_EQ(filesIn(folder.path()), 1);
+}
+
+TEST(WriteWholeFile, RefusesANameWithANulInIt) {
+  const TempDir dir;
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(dir / std::string("clip\0.colr", 10), newContent, error));
+  EXPECT_EQ(error, std::errc::invalid_argument);
+  EXPECT_EQ(filesIn(dir.path()), 0);
+}
+
+TEST(RemoveFile, RemovesAFile) {
+  const TempDir dir;
+  put(dir / "clip", oldContent);
+  std::error_code error = FileError::tooLarge;
+  EXPECT_TRUE(removeFile(dir / "clip", error));
+  EXPECT_FALSE(error);
+  EXPECT_EQ(filesIn(dir.path()), 0);
+}
+
+TEST(RemoveFile, RemovesALinkAndNotWhatItLeadsTo) {
+  const TempDir dir;
+  put(dir / "clip", oldContent);
+  fs::create_symlink("clip", dir / "link");
+  std::error_code error;
+  EXPECT_TRUE(removeFile(dir / "link", error));
+  EXPECT_EQ(get(dir / "clip"), oldContent);
+  EXPECT_EQ(filesIn(dir.path()), 1);
+}
+
+TEST(RemoveFile, SaysThatThereIsNone) {
+  const TempDir dir;
+  std::error_code error;
+  EXPECT_FALSE(removeFile(dir / "clip", error));
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+}
+
+TEST(RemoveFile, NeverRemovesAFolder) {
+  const TempDir dir;
+  fs::create_directory(dir / "clip");
+  std::error_code error;
+  EXPECT_FALSE(removeFile(dir / "clip", error));
+  EXPECT_EQ(error, std::errc::is_a_directory);
+  EXPECT_TRUE(fs::is_directory(dir / "clip"));
+}
+
+TEST(RemoveFile, RefusesANameWithANulInIt) {
+  const TempDir dir;
+  put(dir / "clip", oldContent);
+  std::error_code error;
+  EXPECT_FALSE(removeFile(dir / std::string("clip\0.colr", 10), error));
+  EXPECT_EQ(error, std::errc::invalid_argument);
+  EXPECT_EQ(get(dir / "clip"), oldContent);
 }
 
 TEST(ReplaceWholeFile, ReplacesWhatIsAsItWasRead) {
