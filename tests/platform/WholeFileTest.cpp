@@ -13,32 +13,19 @@
 #include <unistd.h>
 
 #include "oxmv/platform/WholeFile.h"
-#include "support/TempDir.h"
+#include "tests/support/Files.h"
+#include "tests/support/TempDir.h"
 
 namespace oxmv {
 namespace {
 
 namespace fs = std::filesystem;
+using test::asOrdinaryUser;
+using test::Bytes;
 using test::TempDir;
-using Bytes = std::vector<std::uint8_t>;
 
 const Bytes oldContent = {'o', 'l', 'd'};
 const Bytes newContent = {'n', 'e', 'w', 0, 0xFF};
-
-void put(const fs::path& path, const Bytes& content) {
-  std::ofstream(path, std::ios::binary)
-      .write(reinterpret_cast<const char*>(content.data()),
-             static_cast<std::streamsize>(content.size()));
-}
-
-Bytes get(const fs::path& path) {
-  std::ifstream file(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(file), {}};
-}
-
-std::ptrdiff_t filesIn(const fs::path& folder) {
-  return std::distance(fs::directory_iterator(folder), {});
-}
 
 mode_t modeOf(const fs::path& path) {
   struct stat status = {};
@@ -46,23 +33,9 @@ mode_t modeOf(const fs::path& path) {
   return status.st_mode & 07777;
 }
 
-// Runs `body` in a process of its own, as a user who may not do everything; answers whether it
-// returned true.
-template <class Body>
-bool asOrdinaryUser(Body body) {
-  const pid_t child = ::fork();
-  if (child == 0) {
-    const bool isOrdinary = ::geteuid() != 0 || (::setegid(65534) == 0 && ::seteuid(65534) == 0);
-    ::_exit(isOrdinary && body() ? 0 : 1);
-  }
-  int status = 1;
-  EXPECT_EQ(::waitpid(child, &status, 0), child);
-  return WIFEXITED(status) && WEXITSTATUS(status) == 0;
-}
-
 TEST(ReadWholeFile, GivesTheContent) {
   const TempDir folder;
-  put(folder / "clip", newContent);
+  test::putFile(folder / "clip", newContent);
   std::error_code error = std::make_error_code(std::errc::io_error);
   EXPECT_EQ(readWholeFile(folder / "clip", error), newContent);
   EXPECT_FALSE(error);
@@ -70,7 +43,7 @@ TEST(ReadWholeFile, GivesTheContent) {
 
 TEST(ReadWholeFile, GivesNoBytesOfAnEmptyFile) {
   const TempDir folder;
-  put(folder / "empty", {});
+  test::putFile(folder / "empty", {});
   std::error_code error;
   EXPECT_EQ(readWholeFile(folder / "empty", error), Bytes());
 }
@@ -108,7 +81,7 @@ TEST(ReadWholeFile, RefusesAPipeWithoutWaitingForIt) {
 
 TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
   const TempDir folder;
-  put(folder / "large", {});
+  test::putFile(folder / "large", {});
   fs::resize_file(folder / "large", maxFileSize + 1);  // sparse
   std::error_code error;
   EXPECT_FALSE(readWholeFile(folder / "large", error));
@@ -118,7 +91,7 @@ TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
 TEST(ReadWholeFile, SaysThatTheFileMayNotBeRead) {
   const TempDir folder;
   fs::permissions(folder.path(), fs::perms::all);
-  put(folder / "secret", oldContent);
+  test::putFile(folder / "secret", oldContent);
   fs::permissions(folder / "secret", fs::perms::none);
   EXPECT_TRUE(asOrdinaryUser([&] {
     std::error_code error;
@@ -128,7 +101,7 @@ TEST(ReadWholeFile, SaysThatTheFileMayNotBeRead) {
 
 TEST(ReadWholeFile, RefusesANameWithANulInIt) {
   const TempDir dir;
-  put(dir / "clip", oldContent);
+  test::putFile(dir / "clip", oldContent);
   std::error_code error;
   EXPECT_EQ(readWholeFile(dir / std::string("clip\0.colr", 10), error), std::nullopt);
   EXPECT_EQ(error, std::errc::invalid_argument);
@@ -136,7 +109,7 @@ TEST(ReadWholeFile, RefusesANameWithANulInIt) {
 
 TEST(ReadFileStart, GivesAsManyBytesAsAreAskedFor) {
   const TempDir dir;
-  put(dir / "clip", newContent);
+  test::putFile(dir / "clip", newContent);
   std::error_code error = FileError::tooLarge;
   EXPECT_EQ(readFileStart(dir / "clip", 3, error), (Bytes{'n', 'e', 'w'}));
   EXPECT_FALSE(error);
@@ -146,7 +119,7 @@ TEST(ReadFileStart, GivesAsManyBytesAsAreAskedFor) {
 
 TEST(ReadFileStart, GivesAllOfAFileThatHasFewer) {
   const TempDir dir;
-  put(dir / "clip", newContent);
+  test::putFile(dir / "clip", newContent);
   std::error_code error;
   EXPECT_EQ(readFileStart(dir / "clip", 64, error), newContent);
   EXPECT_FALSE(error);
@@ -154,7 +127,7 @@ TEST(ReadFileStart, GivesAllOfAFileThatHasFewer) {
 
 TEST(ReadFileStart, LooksIntoAFileOfAnySize) {
   const TempDir dir;
-  put(dir / "clip", newContent);
+  test::putFile(dir / "clip", newContent);
   fs::resize_file(dir / "clip",
                   std::uintmax_t{1} << 31);  // two gibibytes, none of them on the disk
   std::error_code error;
@@ -179,25 +152,25 @@ TEST(WriteWholeFile, MakesANewFile) {
   EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
   ::umask(mask);
   EXPECT_FALSE(error);
-  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
   EXPECT_EQ(modeOf(folder / "clip"), 0640u);
-  EXPECT_EQ(filesIn(folder.path()), 1);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
 TEST(WriteWholeFile, ReplacesAFileAndKeepsItsPermissions) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   ASSERT_EQ(::chmod((folder / "clip").c_str(), 0604), 0);
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
-  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
   EXPECT_EQ(modeOf(folder / "clip"), 0604u);
-  EXPECT_EQ(filesIn(folder.path()), 1);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
 TEST(WriteWholeFile, LeavesTheOldContentToThoseWhoHaveItOpen) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   std::ifstream reader(folder / "clip", std::ios::binary);
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
@@ -206,7 +179,7 @@ TEST(WriteWholeFile, LeavesTheOldContentToThoseWhoHaveItOpen) {
 
 TEST(WriteWholeFile, WritesAnEmptyFile) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "clip", {}, error));
   EXPECT_EQ(fs::file_size(folder / "clip"), 0u);
@@ -215,14 +188,14 @@ TEST(WriteWholeFile, WritesAnEmptyFile) {
 TEST(WriteWholeFile, FollowsSymbolicLinks) {
   const TempDir folder;
   fs::create_directory(folder / "inner");
-  put(folder / "inner/clip", oldContent);
+  test::putFile(folder / "inner/clip", oldContent);
   fs::create_symlink("inner/clip", folder / "relative");
   fs::create_symlink(folder / "relative", folder / "absolute");
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "absolute", newContent, error));
   EXPECT_TRUE(fs::is_symlink(folder / "absolute"));
   EXPECT_TRUE(fs::is_symlink(folder / "relative"));
-  EXPECT_EQ(get(folder / "inner/clip"), newContent);
+  EXPECT_EQ(test::getFile(folder / "inner/clip"), newContent);
 }
 
 TEST(WriteWholeFile, MakesTheFileThatALinkLeadsTo) {
@@ -231,7 +204,7 @@ TEST(WriteWholeFile, MakesTheFileThatALinkLeadsTo) {
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "link", newContent, error));
   EXPECT_TRUE(fs::is_symlink(folder / "link"));
-  EXPECT_EQ(get(folder / "target"), newContent);
+  EXPECT_EQ(test::getFile(folder / "target"), newContent);
 }
 
 TEST(WriteWholeFile, RefusesLinksThatLeadInACircle) {
@@ -266,12 +239,12 @@ TEST(WriteWholeFile, MakesNoFolders) {
   std::error_code error;
   EXPECT_FALSE(writeWholeFile(folder / "absent/clip", newContent, error));
   EXPECT_EQ(error, std::errc::no_such_file_or_directory);
-  EXPECT_EQ(filesIn(folder.path()), 0);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 0u);
 }
 
 TEST(WriteWholeFile, SaysThatTheFolderMayNotBeWritten) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   fs::permissions(folder.path(), fs::perms::owner_read | fs::perms::owner_exec |
                                      fs::perms::others_read | fs::perms::others_exec);
   EXPECT_TRUE(asOrdinaryUser([&] {
@@ -280,12 +253,12 @@ TEST(WriteWholeFile, SaysThatTheFolderMayNotBeWritten) {
            error == std::errc::permission_denied;
   }));
   fs::permissions(folder.path(), fs::perms::owner_all);
-  EXPECT_EQ(get(folder / "clip"), oldContent);
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
 }
 
 TEST(WriteWholeFile, KeepsTheOldFileAndNothingElseWhenWritingFails) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   struct rlimit before = {};
   ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &before), 0);
   const auto handler = std::signal(SIGXFSZ, SIG_IGN);
@@ -299,8 +272,8 @@ TEST(WriteWholeFile, KeepsTheOldFileAndNothingElseWhenWritingFails) {
   std::signal(SIGXFSZ, handler);
   EXPECT_FALSE(written);
   EXPECT_EQ(error, std::errc::file_too_large);
-  EXPECT_EQ(get(folder / "clip"), oldContent);
-  EXPECT_EQ(filesIn(folder.path()), 1);
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
 TEST(WriteWholeFile, RefusesANameWithANulInIt) {
@@ -308,26 +281,26 @@ TEST(WriteWholeFile, RefusesANameWithANulInIt) {
   std::error_code error;
   EXPECT_FALSE(writeWholeFile(dir / std::string("clip\0.colr", 10), newContent, error));
   EXPECT_EQ(error, std::errc::invalid_argument);
-  EXPECT_EQ(filesIn(dir.path()), 0);
+  EXPECT_EQ(test::namesIn(dir.path()).size(), 0u);
 }
 
 TEST(RemoveFile, RemovesAFile) {
   const TempDir dir;
-  put(dir / "clip", oldContent);
+  test::putFile(dir / "clip", oldContent);
   std::error_code error = FileError::tooLarge;
   EXPECT_TRUE(removeFile(dir / "clip", error));
   EXPECT_FALSE(error);
-  EXPECT_EQ(filesIn(dir.path()), 0);
+  EXPECT_EQ(test::namesIn(dir.path()).size(), 0u);
 }
 
 TEST(RemoveFile, RemovesALinkAndNotWhatItLeadsTo) {
   const TempDir dir;
-  put(dir / "clip", oldContent);
+  test::putFile(dir / "clip", oldContent);
   fs::create_symlink("clip", dir / "link");
   std::error_code error;
   EXPECT_TRUE(removeFile(dir / "link", error));
-  EXPECT_EQ(get(dir / "clip"), oldContent);
-  EXPECT_EQ(filesIn(dir.path()), 1);
+  EXPECT_EQ(test::getFile(dir / "clip"), oldContent);
+  EXPECT_EQ(test::namesIn(dir.path()).size(), 1u);
 }
 
 TEST(RemoveFile, SaysThatThereIsNone) {
@@ -348,31 +321,31 @@ TEST(RemoveFile, NeverRemovesAFolder) {
 
 TEST(RemoveFile, RefusesANameWithANulInIt) {
   const TempDir dir;
-  put(dir / "clip", oldContent);
+  test::putFile(dir / "clip", oldContent);
   std::error_code error;
   EXPECT_FALSE(removeFile(dir / std::string("clip\0.colr", 10), error));
   EXPECT_EQ(error, std::errc::invalid_argument);
-  EXPECT_EQ(get(dir / "clip"), oldContent);
+  EXPECT_EQ(test::getFile(dir / "clip"), oldContent);
 }
 
 TEST(ReplaceWholeFile, ReplacesWhatIsAsItWasRead) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   ASSERT_EQ(::chmod((folder / "clip").c_str(), 0604), 0);
   fs::create_symlink("clip", folder / "link");
   std::error_code error;
   EXPECT_TRUE(replaceWholeFile(folder / "link", oldContent, newContent, error));
-  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
   EXPECT_EQ(modeOf(folder / "clip"), 0604u);
   EXPECT_TRUE(fs::is_symlink(folder / "link"));
-  EXPECT_EQ(filesIn(folder.path()), 2);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 2u);
 }
 
 TEST(ReplaceWholeFile, MakesAFileThatIsStillNotThere) {
   const TempDir folder;
   std::error_code error;
   EXPECT_TRUE(replaceWholeFile(folder / "clip", std::nullopt, newContent, error));
-  EXPECT_EQ(get(folder / "clip"), newContent);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
 }
 
 TEST(ReplaceWholeFile, LeavesWhatHasChangedMeanwhile) {
@@ -383,20 +356,20 @@ TEST(ReplaceWholeFile, LeavesWhatHasChangedMeanwhile) {
            error == FileError::changed && error.message() == "Changed since it was read";
   };
   EXPECT_TRUE(refuses(oldContent));  // gone
-  EXPECT_EQ(filesIn(folder.path()), 0);
-  put(folder / "clip", oldContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 0u);
+  test::putFile(folder / "clip", oldContent);
   EXPECT_TRUE(refuses(std::nullopt));  // come into being
   EXPECT_TRUE(refuses(Bytes{}));
   EXPECT_TRUE(refuses(Bytes{'o', 'l', 'd', 'e', 'r'}));
   EXPECT_TRUE(refuses(Bytes{'o', 'd', 'd'}));  // of the same size
-  EXPECT_EQ(get(folder / "clip"), oldContent);
-  EXPECT_EQ(filesIn(folder.path()), 1);
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
 TEST(ReplaceWholeFile, TakesAFileOfTheSameContentForTheSame) {
   const TempDir folder;
-  put(folder / "clip", oldContent);
-  put(folder / "copy", oldContent);
+  test::putFile(folder / "clip", oldContent);
+  test::putFile(folder / "copy", oldContent);
   fs::rename(folder / "copy", folder / "clip");
   std::error_code error;
   EXPECT_TRUE(replaceWholeFile(folder / "clip", oldContent, newContent, error));
@@ -405,7 +378,7 @@ TEST(ReplaceWholeFile, TakesAFileOfTheSameContentForTheSame) {
 TEST(ReplaceWholeFile, LeavesAFileThatMayNotBeReadAnyMore) {
   const TempDir folder;
   fs::permissions(folder.path(), fs::perms::all);
-  put(folder / "clip", oldContent);
+  test::putFile(folder / "clip", oldContent);
   fs::permissions(folder / "clip", fs::perms::none);
   EXPECT_TRUE(asOrdinaryUser([&] {
     std::error_code error;
