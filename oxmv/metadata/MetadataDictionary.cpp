@@ -31,6 +31,8 @@ MetadataDictionary& MetadataDictionary::init() & {
   _isSingle = false;
   _eye = 0;
   _appID = preferencesAppID;
+  loadError_ = LoadError::none;
+  loadErrorCode_.clear();
   resetTagLabels();
   return *this;
 }
@@ -39,6 +41,8 @@ MetadataDictionary& MetadataDictionary::initWithBytes(std::span<const std::uint8
                                                       std::int32_t length,
                                                       StreamObserver* observer) & {
   _simpleTags = processBytes(bytes, length, observer);
+  loadError_ = LoadError::none;
+  loadErrorCode_.clear();
   return *this;
 }
 

@@ -4,11 +4,13 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <filesystem>
 #include <memory>
 #include <optional>
 #include <span>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
 #include "oxmv/metadata/StreamObserver.h"
@@ -22,6 +24,14 @@ namespace oxmv {
 // The identifier under which the library's preferences are kept.
 constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
+// Why an object that was to be loaded from a file has no tags.
+enum class LoadError {
+  none,        // it was loaded; a file of no bytes at all is a clip without tags
+  missing,     // there is no such file
+  unreadable,  // the system's reason is in MetadataDictionary::loadErrorCode()
+  tooShort,    // 1 to 11 bytes hold no stream; a "last" file needs its GUID
+};
+
 // One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
 // stereo clip, which eye the object stands for.
 //
@@ -31,6 +41,8 @@ constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 // The initialisers work on the object they are called on and give it back: a temporary by value.
 // Copies are independent of each other, and cheap. One object is used from one thread at a time;
 // different objects from different threads as one likes.
+//
+// Whatever has to do with files is in the library oxmv, all else also in oxmv_core.
 class MetadataDictionary {
  public:
   // As after init(), with a zero GUID.
@@ -58,6 +70,60 @@ class MetadataDictionary {
                                   StreamObserver* observer = nullptr) && {
     return initWithData(data, observer);
   }
+
+  // The initialisers below load a file. They never fail: without a file that can be read the object
+  // has no tags, and loadError() says why. Ask it before saving such an object: over a file that
+  // could not be read just now, saving would lose everything in it.
+
+  // A combined object with the tags of the override file.
+  static MetadataDictionary initFromOverride();
+
+  // A combined object with GUID and tags of the "last" file; see LastRecord.h. Kept on purpose: a
+  // GUID record in its stream replaces the GUID that the file begins with.
+  static MetadataDictionary initFromLast();
+
+  // The GUID at the head of the "last" file; zero in every byte that is not there.
+  static myGUID lastGUID();
+
+  // A clip of the database: the combined object of that GUID.
+  static MetadataDictionary initFromGUID(const myGUID& guid);
+
+  // With `rightEye` the object of eye 1, else the combined object. That one keeps the GUID that is
+  // asked for, whatever GUID record its file has.
+  static MetadataDictionary initFromGUIDForRightEye(const myGUID& guid, bool rightEye);
+
+  // The object of one eye, 0 left, 1 right. Kept on purpose: a GUID record in its file replaces the
+  // GUID, and with it where the object is saved.
+  static MetadataDictionary initFromGUIDForSingleEye(const myGUID& guid, std::size_t eye);
+
+  // What kept the tags from being loaded. init() and initWithBytes() set it back to none.
+  LoadError loadError() const { return loadError_; }
+  // The system's error behind LoadError::missing and LoadError::unreadable.
+  std::error_code loadErrorCode() const { return loadErrorCode_; }
+
+  // The path of the override file. Stores the default of the preference "OverridePath", as do
+  // initFromOverride(), initFromLast(), lastGUID() and writeToOverride(), if it is missing or no
+  // text. For this and the two below see Locations.h.
+  static std::string overridePath();
+
+  // Where the combined file of this object's GUID is, whether it is there or not.
+  std::filesystem::path fileURL() const;
+
+  // The same for the file of one eye.
+  std::filesystem::path fileURLS(std::size_t eye) const;
+
+  // Saves the object where it belongs by GUID and eye, in place of what is there; see
+  // writeWholeFile(). An object of one eye without tags has no file: saving it removes the file, and
+  // fails if there is none. Kept on purpose: a combined object without tags leaves an empty file.
+  // Folders are not made.
+  //
+  // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
+  // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
+  // there still.
+  [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
+
+  // The same for the override file, which is never removed: an object without tags leaves it empty.
+  [[nodiscard]] bool writeToOverride(std::error_code* error = nullptr) const;
 
   // Decodes a stream of `length` bytes into a dictionary of its own; the object's tags stay as they
   // are. `bytes` are the bytes really there, see decodeStream(). A GUID record in the stream
@@ -115,12 +181,17 @@ class MetadataDictionary {
   std::size_t eye() const { return _eye; }
 
  private:
+  void load(const std::filesystem::path& path);
+  void setLoadError(std::error_code error);
+
   std::optional<Dictionary> _simpleTags;  // none until something is loaded or set
   myGUID _guid;
   bool _isSingle = false;
   std::size_t _eye = 0;
   std::string_view _appID = preferencesAppID;
   Layout layout_ = Layout::exact;
+  LoadError loadError_ = LoadError::none;
+  std::error_code loadErrorCode_;
 };
 
 }  // namespace oxmv
