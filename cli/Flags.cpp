@@ -31,6 +31,10 @@ constexpr auto rows = std::to_array<FlagRow>({
     {Flag::backup, "", "--backup", "", "keep the old file beside it: CLIP~, or CLIP~2 and so on"},
     {Flag::create, "", "--create", "", "make a clip that does not exist"},
     {Flag::raw, "", "--raw", "", "values as they are: nothing escaped, data as bytes"},
+    {Flag::eye, "", "--eye", "N", "the file of one eye: 0 left, 1 right"},
+    {Flag::noProgress, "", "--no-progress", "", "show no progress, also on a terminal"},
+    {Flag::db, "", "--db", "DIR", "the clip database is in DIR (or in $OXMV_DB)"},
+    {Flag::looks, "", "--looks", "DIR", "the look tables are in DIR (or in $OXMV_LOOKS)"},
     {Flag::color, "", "--color", "WHEN", "auto (default), always or never"},
 });
 

@@ -32,6 +32,10 @@ enum class Flag : std::uint8_t {
   backup,
   create,
   raw,
+  eye,
+  noProgress,
+  db,
+  looks,
   color,
 };
 
@@ -48,8 +52,8 @@ std::span<const FlagRow> flagRows() noexcept;
 const FlagRow& rowOf(Flag flag) noexcept;
 
 // The flags that go with every verb.
-constexpr auto commonFlags =
-    std::to_array({Flag::quiet, Flag::verbose, Flag::color, Flag::help, Flag::version});
+constexpr auto commonFlags = std::to_array(
+    {Flag::quiet, Flag::verbose, Flag::db, Flag::looks, Flag::color, Flag::help, Flag::version});
 
 // The command was called in a way that means nothing. Thrown before anything is done; ends the run.
 class UsageError : public std::runtime_error {

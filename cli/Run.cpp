@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <initializer_list>
+#include <memory>
 #include <new>
 #include <string>
 #include <system_error>
+#include <utility>
 #include <vector>
 
 #include <fmt/format.h>
@@ -56,12 +58,32 @@ void checkWords(const Verb& verb, std::size_t count) {
                          : fmt::format("{} takes {}, not {} words", verb.name, verb.words, count));
 }
 
+// Lets the library ask us while this lives.
+class InstalledHost {
+ public:
+  explicit InstalledHost(std::shared_ptr<CommandHost> host) : host_(std::move(host)) {
+    installHost(host_);
+  }
+  InstalledHost(const InstalledHost&) = delete;
+  InstalledHost& operator=(const InstalledHost&) = delete;
+  ~InstalledHost() { installHost(nullptr); }
+
+  CommandHost& host() const { return *host_; }
+
+ private:
+  std::shared_ptr<CommandHost> host_;
+};
+
 // The verb that --help and --version stand for, wherever they are.
 const Verb& verbOf(const Arguments& arguments) {
   const auto& words = arguments.words();
-  const Verb* verb = words.empty() ? nullptr : &verbNamed(words.front());
+  // "db --help" is good, a mistyped verb is not.
+  const bool isFamily = !words.empty() && !familyOf(words.front()).empty();
+  const bool isNamed = !words.empty() && !(isFamily && words.size() == 1);
+  const Verb* verb = isNamed ? &verbNamed(words) : nullptr;
   if (arguments.has(Flag::help)) return helpVerb;
   if (arguments.has(Flag::version)) return versionVerb;
+  if (isFamily) return verbNamed(words);  // says what is missing
   if (verb == nullptr) throw UsageError("missing-verb", "these flags need a verb; see oxmv help");
   return *verb;
 }
@@ -71,15 +93,18 @@ void runVerb(const Arguments& arguments, StandardOutput& output, Messages& messa
   std::span<const std::string> words = arguments.words();
   // "show --help" is "help show"; of what else stands there nothing counts.
   if (arguments.has(Flag::help)) {
-    words = words.first(std::min<std::size_t>(words.size(), 1));
+    const std::size_t most = words.empty() || familyOf(words.front()).empty() ? 1 : 2;
+    words = words.first(std::min(words.size(), most));
   } else if (arguments.has(Flag::version)) {
     words = {};
   } else {
-    words = words.subspan(1);
+    words = words.subspan(verb.wordsInName());
     checkFlags(verb, arguments);
     checkWords(verb, words.size());
   }
-  Call call{words, arguments, output, styleFor(StandardOutput::isTerminal(), arguments), messages};
+  const InstalledHost installed(std::make_shared<CommandHost>(arguments, messages));
+  Call call{words,    arguments,       output, styleFor(StandardOutput::isTerminal(), arguments),
+            messages, installed.host()};
   verb.run(call);
 }
 

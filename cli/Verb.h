@@ -6,7 +6,9 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
+#include "cli/CommandHost.h"
 #include "cli/Flags.h"
 #include "cli/Messages.h"
 #include "cli/StandardStreams.h"
@@ -21,11 +23,13 @@ struct Call {
   StandardOutput& output;
   Style style;  // of the output
   Messages& messages;
+  CommandHost& host;  // what the library asks
 };
 
-// A verb stands in a file of its own. Its help text begins with the examples.
+// A verb stands in a file of its own, or with the others of its family. Its help text begins with the
+// examples.
 struct Verb {
-  std::string_view name;
+  std::string_view name;        // "show"; a verb of a family has two words: "db list"
   std::string_view words;       // what follows it: "CLIP..."
   std::string_view summary;     // in a line
   std::string_view examples;    // one a line
@@ -34,6 +38,8 @@ struct Verb {
   std::size_t fewestWords;
   std::size_t mostWords;
   void (*run)(Call& call);
+
+  std::size_t wordsInName() const;  // 1 or 2
 };
 
 constexpr std::size_t anyNumber = static_cast<std::size_t>(-1);
@@ -44,7 +50,11 @@ extern const Verb showVerb, getVerb, setVerb, unsetVerb, diffVerb, dumpVerb, che
 // Every verb, in the order in which help lists them.
 std::span<const Verb* const> verbs() noexcept;
 
-// Throws UsageError, with the nearest verbs in it, when there is none of that name.
-const Verb& verbNamed(std::string_view name);
+// The verbs of a family: those named "db ..." for "db"; none for any other word.
+std::vector<const Verb*> familyOf(std::string_view word);
+
+// The verb that the words begin with; there must be one word. Throws UsageError, with the nearest
+// verbs in it, when there is none of that name.
+const Verb& verbNamed(std::span<const std::string> words);
 
 }  // namespace oxmv::cli

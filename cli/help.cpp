@@ -47,13 +47,19 @@ std::string flagLines(std::span<const Flag> flags) {
   return text;
 }
 
+std::string verbLines(std::span<const Verb* const> verbs) {
+  std::string text;
+  for (const Verb* verb : verbs) {
+    const std::string name = fmt::format("{:<11} {}", verb->name, verb->words);
+    text += fmt::format("  {:<33}  {}\n", name, verb->summary);
+  }
+  return text;
+}
+
 std::string commandHelp(const Style& style) {
   std::string text = style.heading("Examples") + '\n' + indented(commandExamples);
   text += '\n' + style.heading("Verbs") + '\n';
-  for (const Verb* verb : verbs()) {
-    const std::string name = fmt::format("{:<8} {}", verb->name, verb->words);
-    text += fmt::format("  {:<30}  {}\n", name, verb->summary);
-  }
+  text += verbLines(verbs());
   text += '\n' + style.heading("Flags for every verb, before or behind it") + '\n';
   text += flagLines(commonFlags);
   text += '\n' + style.heading("Exit codes") + '\n';
@@ -70,10 +76,25 @@ std::string verbHelp(const Verb& verb, const Style& style) {
   return text;
 }
 
-void run(Call& call) {
-  call.output.write(call.words.empty() ? commandHelp(call.style)
-                                       : verbHelp(verbNamed(call.words.front()), call.style));
+std::string familyHelp(std::span<const Verb* const> family, const Style& style) {
+  std::string text = style.heading("Examples") + '\n';
+  for (const Verb* verb : family)
+    text += indented(verb->examples.substr(0, verb->examples.find('\n')));
+  text += '\n' + style.heading("Verbs") + '\n' + verbLines(family);
+  return text + fmt::format("\noxmv help {} says more about one of them.\n", family.front()->name);
 }
+
+std::string helpOn(std::span<const std::string> words, const Style& style) {
+  if (words.empty()) return commandHelp(style);
+  const auto family = familyOf(words.front());
+  if (words.size() == 1 && !family.empty()) return familyHelp(family, style);
+  const Verb& verb = verbNamed(words);
+  if (words.size() > verb.wordsInName())
+    throw UsageError("surplus-words", fmt::format("help takes one verb, not {}", words.size()));
+  return verbHelp(verb, style);
+}
+
+void run(Call& call) { call.output.write(helpOn(call.words, call.style)); }
 
 }  // namespace
 
@@ -81,11 +102,11 @@ const Verb helpVerb = {
     .name = "help",
     .words = "[VERB]",
     .summary = "show what the command can do, or all about a verb",
-    .examples = "oxmv help\noxmv help show\n",
+    .examples = "oxmv help\noxmv help show\noxmv help db list\n",
     .details = "",
     .flags = {},
     .fewestWords = 0,
-    .mostWords = 1,
+    .mostWords = 2,
     .run = run,
 };
 
