@@ -140,11 +140,18 @@ std::string temporaryName() {
   return name + ".tmp";
 }
 
-// The folder's own record of the new name. Some file systems cannot do this, and need not.
-bool syncFolder(const std::filesystem::path& folder) {
-  const Descriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!descriptor.isOpen()) return errno == EACCES;  // may be written, not read: nothing to sync by
-  return ::fsync(descriptor.number()) == 0 || errno == EINVAL || errno == ENOTSUP;
+// Opened to be synchronised. A folder that may be written but not read cannot be, and that is no
+// error.
+Descriptor openFolder(const std::filesystem::path& folder, std::error_code& error) {
+  Descriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!descriptor.isOpen() && errno != EACCES) error = lastError();
+  return descriptor;
+}
+
+// Brings the folder's own record of a new name to the disk. Some file systems cannot do this, and
+// need not.
+bool syncFolder(const Descriptor& folder) {
+  return !folder.isOpen() || ::fsync(folder.number()) == 0 || errno == EINVAL || errno == ENOTSUP;
 }
 
 // Gives the new file the permissions, owner and group of the old one. An owner or group that cannot
@@ -214,6 +221,9 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
   if (isThere && (error = objectionTo(replaced))) return false;
 
   const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
+  // Now, so that nothing but the synchronisation itself can fail once the file has its name.
+  const Descriptor openedFolder = openFolder(folder, error);
+  if (error) return false;
   const std::filesystem::path temporary = folder / temporaryName();
   // Readable by nobody else until it has the permissions of the file that it replaces.
   const mode_t mode = isThere ? 0600 : 0666;
@@ -229,7 +239,7 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
     ::unlink(temporary.c_str());
     return false;
   }
-  if (!syncFolder(folder)) return error = lastError(), false;
+  if (!syncFolder(openedFolder)) return error = lastError(), false;
   return true;
 }
 

@@ -43,7 +43,8 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
 // link is followed: the file it leads to is replaced. Folders are not made.
 //
 // Answers false with the cause in `error` when that fails; then what was there is there still, and
-// nothing else.
+// nothing else. In one case the new file is there already: when the system fails to say that its name
+// has reached the disk.
 [[nodiscard]] bool writeWholeFile(const std::filesystem::path& path,
                                   std::span<const std::uint8_t> content, std::error_code& error);
 

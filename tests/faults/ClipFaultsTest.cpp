@@ -1,0 +1,371 @@
+// Clips in a file system that fails, and in a process that is killed.
+
+#include <cerrno>
+#include <csignal>
+#include <filesystem>
+#include <string>
+#include <system_error>
+
+#include <gtest/gtest.h>
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/platform/WholeFile.h"
+#include "tests/faults/SystemCalls.h"
+#include "tests/support/FakeHost.h"
+#include "tests/support/Files.h"
+#include "tests/support/StreamBuilder.h"
+#include "tests/support/TempDir.h"
+
+namespace oxmv::test {
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr myGUID guid = {1, 2, 3, {4, 5, 6, 7, 8, 9, 10, 11}};
+const std::string fileName = "00000001-0002-0003-0405-060708090A0B.colr";
+
+const Bytes oldContent = StreamBuilder().record("REEL", 'c', "A001\0\0\0\0").bytes();
+const Bytes newContent = {'R', 'E', 'E', 'L', 8,   0,   0, 'c', 'B', '0', '0', '2', 0, 0,
+                          0,   0,   'T', 'A', 'K', 'E', 4, 0,   0,   'B', 3,   0,   0, 0};
+
+MetadataDictionary newClip() {
+  auto clip = MetadataDictionary::initFromGUID(guid);
+  clip.setMetadata(Dictionary{{"REEL", "B002"}, {"TAKE", 3}});
+  return clip;
+}
+
+bool isOldOrNew(const Dictionary& tags) {
+  return tags == Dictionary{{"REEL", "A001"}} || tags == Dictionary{{"REEL", "B002"}, {"TAKE", 3}};
+}
+
+bool isTemporary(const std::string& name) {
+  return name.starts_with(".oxmv-") && name.ends_with(".tmp");
+}
+
+// A database in a folder of the test's own.
+class Database {
+ public:
+  Database() { place(dir_.path()); }
+  explicit Database(const fs::path& folder) { place(folder); }
+
+  const fs::path& folder() const { return folder_; }
+  fs::path file() const { return folder_ / fileName; }
+
+ private:
+  void place(const fs::path& folder) {
+    folder_ = folder / "db";
+    fs::create_directory(folder_);
+    host_->preferences[std::string(preferencesAppID)]["LUTsPath"] = folder.string();
+  }
+
+  TempDir dir_;
+  fs::path folder_;
+  InstalledFakeHost host_;
+};
+
+// How a process ended that saved the new clip with a fault armed.
+struct Ending {
+  bool wasKilled = false;
+  bool hasSaved = false;
+  std::string function;  // of the faulty call; empty if the process made fewer calls
+};
+
+Ending saveWithFault(std::size_t nth, const Fault& fault) {
+  int pipes[2] = {};
+  EXPECT_EQ(::pipe(pipes), 0);
+  const pid_t child = ::fork();
+  if (child == 0) {
+    const MetadataDictionary clip = newClip();
+    std::error_code error;
+    armFault(nth, fault);
+    const bool hasSaved = clip.writeToGUIDFile(&error);
+    disarmFault();
+    const std::string function = faultyFunction();
+    const bool isTold = ::write(pipes[1], function.data(), function.size()) >= 0;
+    // A failure has a reason.
+    const bool isGood = isTold && (hasSaved || error);
+    ::_exit(!isGood ? 2 : hasSaved ? 0 : 1);
+  }
+  ::close(pipes[1]);
+  Ending ending;
+  char buffer[32];
+  for (ssize_t size = 0; (size = ::read(pipes[0], buffer, sizeof buffer)) > 0;)
+    ending.function.append(buffer, static_cast<std::size_t>(size));
+  ::close(pipes[0]);
+  int status = 0;
+  EXPECT_EQ(::waitpid(child, &status, 0), child);
+  ending.wasKilled = WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL;
+  EXPECT_TRUE(ending.wasKilled || (WIFEXITED(status) && WEXITSTATUS(status) < 2)) << status;
+  ending.hasSaved = WIFEXITED(status) && WEXITSTATUS(status) == 0;
+  return ending;
+}
+
+// What stands in the folder beside the clip's file must be leftovers of a killed process, which
+// nobody takes for a clip; answers how many there are.
+std::size_t leftoversIn(const Database& database) {
+  std::size_t count = 0;
+  for (const std::string& name : namesIn(database.folder())) {
+    if (name == fileName) continue;
+    EXPECT_TRUE(isTemporary(name)) << name;
+    ++count;
+  }
+  return count;
+}
+
+void removeLeftovers(const Database& database) {
+  for (const std::string& name : namesIn(database.folder())) {
+    if (isTemporary(name)) fs::remove(database.folder() / name);
+  }
+}
+
+class ClipFaults : public testing::TestWithParam<bool> {
+ protected:
+  // Whether there is a clip that is replaced, or none.
+  static bool hasOld() { return GetParam(); }
+
+  void putOld() const {
+    fs::remove(database.file());
+    if (hasOld()) putFile(database.file(), oldContent);
+  }
+  bool isOld() const {
+    return hasOld() ? getFile(database.file()) == oldContent : !fs::exists(database.file());
+  }
+  bool isNew() const { return getFile(database.file()) == newContent; }
+
+  Database database;
+};
+
+INSTANTIATE_TEST_SUITE_P(Save, ClipFaults, testing::Bool(), [](const auto& whether) {
+  return whether.param ? "ReplacingAClip" : "OfANewClip";
+});
+
+TEST_P(ClipFaults, KilledAtAnyCallLeavesTheOldFileOrTheNew) {
+  for (const auto kind : {Fault::Kind::killBefore, Fault::Kind::killAfter}) {
+    bool wasNew = false;
+    std::size_t kills = 0;
+    for (std::size_t nth = 1;; ++nth) {
+      ASSERT_LT(nth, 100u);
+      putOld();
+      const Ending ending = saveWithFault(nth, {.kind = kind});
+      if (!ending.wasKilled) {
+        EXPECT_TRUE(ending.hasSaved);
+        break;
+      }
+      ++kills;
+      EXPECT_TRUE(isOld() || isNew()) << nth;
+      EXPECT_FALSE(wasNew && isOld()) << nth;  // there is one moment of change
+      wasNew = isNew();
+      EXPECT_LE(leftoversIn(database), 1u);
+      // Whoever comes later is not disturbed.
+      const auto clip = MetadataDictionary::initFromGUID(guid);
+      EXPECT_EQ(clip.metadata()["REEL"].text(), isNew() ? "B002" : hasOld() ? "A001" : "");
+      EXPECT_TRUE(newClip().writeToGUIDFile());
+      EXPECT_TRUE(isNew());
+      removeLeftovers(database);
+    }
+    EXPECT_GT(kills, 10u);  // there are ten writes alone
+    EXPECT_TRUE(wasNew);
+  }
+}
+
+TEST_P(ClipFaults, FailureOfAnyCallIsToldAndLeavesTheOldFile) {
+  for (const int error : {ENOSPC, EIO, EDQUOT}) {
+    for (const bool isLasting : {false, true}) {
+      std::size_t failures = 0;
+      for (std::size_t nth = 1;; ++nth) {
+        ASSERT_LT(nth, 100u);
+        putOld();
+        const Ending ending =
+            saveWithFault(nth, {.kind = Fault::Kind::fail, .error = error, .isLasting = isLasting});
+        EXPECT_FALSE(ending.wasKilled);
+        EXPECT_EQ(leftoversIn(database), 0u) << ending.function;
+        if (ending.function.empty()) break;
+        if (ending.hasSaved) {
+          EXPECT_TRUE(isNew()) << ending.function;
+        } else {
+          ++failures;
+          // Once the file has its name, all that can fail is to make the name last.
+          EXPECT_TRUE(isOld() || (isNew() && ending.function == "fsync")) << ending.function;
+        }
+      }
+      EXPECT_GT(failures, 10u);
+    }
+  }
+}
+
+TEST_P(ClipFaults, InterruptedCallsAreTakenUpAgain) {
+  std::size_t interrupted = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    putOld();
+    const Ending ending = saveWithFault(nth, {.kind = Fault::Kind::fail, .error = EINTR});
+    if (ending.function.empty()) break;
+    if (ending.function != "write" && ending.function != "read") continue;
+    ++interrupted;
+    EXPECT_TRUE(ending.hasSaved);
+    EXPECT_TRUE(isNew());
+  }
+  EXPECT_GE(interrupted, newContent.size() / 3);
+}
+
+TEST(ClipFault, FailureOfAnyCallWhileLoadingIsRemembered) {
+  const Database database;
+  putFile(database.file(), oldContent);
+  std::size_t failures = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    armFault(nth, {.kind = Fault::Kind::fail, .error = EIO});
+    const auto clip = MetadataDictionary::initFromGUID(guid);
+    disarmFault();
+    if (faultyFunction().empty()) break;
+    if (clip.haveMetadata()) {
+      EXPECT_EQ(faultyFunction(), "close");
+      continue;
+    }
+    ++failures;
+    EXPECT_EQ(clip.loadError(), LoadError::unreadable);
+    EXPECT_EQ(clip.loadErrorCode(), std::errc::io_error);
+  }
+  EXPECT_EQ(failures, 4u);  // open, fstat, and two reads, of which the second finds the end
+}
+
+TEST(ClipFault, RemovalThatFailsIsTold) {
+  const Database database;
+  const fs::path file = database.folder() / (fileName.substr(0, 37) + "col1");
+  putFile(file, oldContent);
+  auto clip = MetadataDictionary::initFromGUIDForSingleEye(guid, 0);
+  clip.setMetadata(std::nullopt);
+  std::error_code error;
+  armFault(1, {.kind = Fault::Kind::fail, .error = EROFS});
+  const bool hasSaved = clip.writeToGUIDFile(&error);
+  disarmFault();
+  EXPECT_EQ(faultyFunction(), "unlink");
+  EXPECT_FALSE(hasSaved);
+  EXPECT_EQ(error, std::errc::read_only_file_system);
+  EXPECT_EQ(getFile(file), oldContent);
+}
+
+// A file system of a few kilobytes, in a process that has it for itself.
+TEST(ClipFault, FullDiskLeavesTheOldFile) {
+  const TempDir dir;
+  const pid_t child = ::fork();
+  constexpr int cannotMount = 77;
+  if (child == 0) {
+    const bool isOwn = ::geteuid() == 0 ? ::unshare(CLONE_NEWNS) == 0
+                                        : ::unshare(CLONE_NEWUSER | CLONE_NEWNS) == 0;
+    if (!isOwn || ::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+        ::mount("tmpfs", dir.path().c_str(), "tmpfs", 0, "size=16k") != 0)
+      ::_exit(cannotMount);
+    const Database database(dir.path());
+    putFile(database.file(), oldContent);
+    const fs::path filler = dir / "filler";
+    putFile(filler, Bytes(64 << 10, 'x'));  // as much of it as there is room for
+    std::error_code error;
+    const bool isFull = fs::file_size(filler) < (64 << 10) && !newClip().writeToGUIDFile(&error) &&
+                        error == std::errc::no_space_on_device;
+    const bool isOld = getFile(database.file()) == oldContent &&
+                       namesIn(database.folder()) == std::set<std::string>{fileName};
+    fs::remove(filler);
+    const bool isGoodAgain = newClip().writeToGUIDFile() && getFile(database.file()) == newContent;
+    ::_exit(isFull && isOld && isGoodAgain ? 0 : 1);
+  }
+  int status = 0;
+  ASSERT_EQ(::waitpid(child, &status, 0), child);
+  ASSERT_TRUE(WIFEXITED(status));
+  if (WEXITSTATUS(status) == cannotMount) GTEST_SKIP() << "this process may not mount";
+  EXPECT_EQ(WEXITSTATUS(status), 0);
+}
+
+// Several processes at once.
+
+template <class Body>
+pid_t inAProcess(Body body) {
+  const pid_t child = ::fork();
+  if (child == 0) ::_exit(body() ? 0 : 1);
+  return child;
+}
+
+bool endsWell(pid_t child) {
+  int status = 1;
+  return ::waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
+}
+
+bool saveOften(const Value& reel, int count) {
+  auto clip = MetadataDictionary::initFromGUID(guid);
+  clip.setMetadata(Dictionary{{"REEL", reel}});
+  for (int i = 0; i < count; ++i) {
+    if (!clip.writeToGUIDFile()) return false;
+  }
+  return true;
+}
+
+TEST(ClipFault, ReadersSeeOneOfTwoWritersWhole) {
+  const Database database;
+  // Of different sizes: a file that is replaced while it is read must not come out as a mixture.
+  const std::string longReel(200, 'L');
+  ASSERT_TRUE(saveOften("short", 1));
+  const pid_t one = inAProcess([&] { return saveOften("short", 300); });
+  const pid_t other = inAProcess([&] { return saveOften(longReel, 300); });
+  int wrong = 0;
+  for (int i = 0; i < 3000; ++i) {
+    const auto clip = MetadataDictionary::initFromGUID(guid);
+    const std::string reel = clip.metadata()["REEL"].text();
+    if (clip.loadError() != LoadError::none || (reel != "short" && reel != longReel)) ++wrong;
+  }
+  EXPECT_EQ(wrong, 0);
+  EXPECT_TRUE(endsWell(one));
+  EXPECT_TRUE(endsWell(other));
+  EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
+}
+
+TEST(ClipFault, FileReplacedWhileItIsReadIsOneOfTheTwoWhole) {
+  const Database database;
+  std::size_t old = 0;
+  std::size_t replaced = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    putFile(database.file(), oldContent);
+    armFault(nth, {.kind = Fault::Kind::meanwhile,
+                   .action = [] { EXPECT_TRUE(newClip().writeToGUIDFile()); }});
+    const auto clip = MetadataDictionary::initFromGUID(guid);
+    disarmFault();
+    if (faultyFunction().empty()) break;
+    EXPECT_TRUE(isOldOrNew(clip.metadata()));
+    ++(clip.metadata()["REEL"].text() == "A001" ? old : replaced);
+    EXPECT_EQ(clip.loadError(), LoadError::none);
+    EXPECT_EQ(getFile(database.file()), newContent);
+  }
+  EXPECT_EQ(replaced, 1u);  // before it was opened
+  EXPECT_EQ(old, 4u);
+}
+
+// Whoever says what the file held when it was read does not overwrite what came since.
+TEST(ClipFault, FileReplacedWhileItIsEditedIsNotOverwritten) {
+  const Database database;
+  const Bytes others = bytesOf("somebody else's");
+  std::size_t refusals = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    putFile(database.file(), oldContent);
+    armFault(nth,
+             {.kind = Fault::Kind::meanwhile, .action = [&] { putFile(database.file(), others); }});
+    std::error_code error;
+    const bool isReplaced = replaceWholeFile(database.file(), oldContent, newContent, error);
+    disarmFault();
+    const std::string function = faultyFunction();
+    if (function.empty()) break;
+    EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
+    if (isReplaced) continue;
+    ++refusals;
+    EXPECT_EQ(error, FileError::changed) << function;
+    EXPECT_EQ(getFile(database.file()), others) << function;
+  }
+  EXPECT_GT(refusals, 10u);
+}
+
+}  // namespace
+}  // namespace oxmv::test

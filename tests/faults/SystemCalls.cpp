@@ -1,0 +1,142 @@
+#include "tests/faults/SystemCalls.h"
+
+#include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstdarg>
+#include <string_view>
+
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace oxmv::test {
+namespace {
+
+// No thread but the one under test makes calls meanwhile.
+bool isArmed = false;
+std::size_t calls = 0;
+std::size_t faultyCall = 0;
+Fault currentFault{};
+std::string_view faulty;
+
+// The function of that name in the C library.
+template <class Function>
+Function* original(const char* name) {
+  return reinterpret_cast<Function*>(::dlsym(RTLD_NEXT, name));
+}
+
+// Makes a call, or what has been armed for it.
+template <class Call>
+auto pass(std::string_view name, Call call) -> decltype(call()) {
+  if (!isArmed) return call();
+  const bool isIt = ++calls == faultyCall;
+  if (isIt) faulty = name;
+  const bool isLater = currentFault.isLasting && faulty == name;
+  if (currentFault.kind == Fault::Kind::fail && (isIt || isLater)) {
+    // Closing fails after the file is closed.
+    if (name == "close") call();
+    errno = currentFault.error;
+    return -1;
+  }
+  if (isIt && currentFault.kind == Fault::Kind::killBefore) ::raise(SIGKILL);
+  if (isIt && currentFault.kind == Fault::Kind::meanwhile) {
+    isArmed = false;
+    currentFault.action();
+    isArmed = true;
+  }
+  const auto result = call();
+  if (isIt && currentFault.kind == Fault::Kind::killAfter) ::raise(SIGKILL);
+  return result;
+}
+
+}  // namespace
+
+void armFault(std::size_t nth, const Fault& fault) {
+  calls = 0;
+  faultyCall = nth;
+  currentFault = fault;
+  faulty = {};
+  isArmed = true;
+}
+
+std::size_t disarmFault() {
+  isArmed = false;
+  return calls;
+}
+
+std::string faultyFunction() { return std::string(faulty); }
+
+}  // namespace oxmv::test
+
+using oxmv::test::original;
+using oxmv::test::pass;
+
+extern "C" {
+
+int open(const char* path, int flags, ...) {
+  static auto* const next = original<int(const char*, int, ...)>("open");
+  mode_t mode = 0;
+  if ((flags & O_CREAT) != 0) {
+    va_list arguments;
+    va_start(arguments, flags);
+    mode = va_arg(arguments, mode_t);
+    va_end(arguments);
+  }
+  return pass("open", [&] { return next(path, flags, mode); });
+}
+
+int close(int file) {
+  static auto* const next = original<int(int)>("close");
+  return pass("close", [&] { return next(file); });
+}
+
+ssize_t read(int file, void* buffer, size_t size) {
+  static auto* const next = original<ssize_t(int, void*, size_t)>("read");
+  return pass("read", [&] { return next(file, buffer, size); });
+}
+
+// In pieces of three bytes at most, so that the kill can come in the middle of a file.
+ssize_t write(int file, const void* buffer, size_t size) {
+  static auto* const next = original<ssize_t(int, const void*, size_t)>("write");
+  const size_t piece = oxmv::test::isArmed && size > 3 ? 3 : size;
+  return pass("write", [&] { return next(file, buffer, piece); });
+}
+
+int fstat(int file, struct stat* status) noexcept {
+  static auto* const next = original<int(int, struct stat*)>("fstat");
+  return pass("fstat", [&] { return next(file, status); });
+}
+
+int lstat(const char* path, struct stat* status) noexcept {
+  static auto* const next = original<int(const char*, struct stat*)>("lstat");
+  return pass("lstat", [&] { return next(path, status); });
+}
+
+int fchown(int file, uid_t owner, gid_t group) noexcept {
+  static auto* const next = original<int(int, uid_t, gid_t)>("fchown");
+  return pass("fchown", [&] { return next(file, owner, group); });
+}
+
+int fchmod(int file, mode_t mode) noexcept {
+  static auto* const next = original<int(int, mode_t)>("fchmod");
+  return pass("fchmod", [&] { return next(file, mode); });
+}
+
+int fsync(int file) {
+  static auto* const next = original<int(int)>("fsync");
+  return pass("fsync", [&] { return next(file); });
+}
+
+int rename(const char* from, const char* to) noexcept {
+  static auto* const next = original<int(const char*, const char*)>("rename");
+  return pass("rename", [&] { return next(from, to); });
+}
+
+int unlink(const char* path) noexcept {
+  static auto* const next = original<int(const char*)>("unlink");
+  return pass("unlink", [&] { return next(path); });
+}
+
+}  // extern "C"
