@@ -6,6 +6,9 @@ target_compile_options(oxmv_flags INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow
   $<$<BOOL:${OXMV_WERROR}>:-Werror>)
 
+# Files of 2 GiB and more have sizes also where a word has 32 bits.
+target_compile_definitions(oxmv_flags INTERFACE _FILE_OFFSET_BITS=64)
+
 # An index out of bounds in a standard container ends a debug build at once.
 target_compile_definitions(oxmv_flags INTERFACE $<$<CONFIG:Debug>:_GLIBCXX_ASSERTIONS>)
 

@@ -90,7 +90,7 @@ class Encoder {
         if (!value.text().empty()) putText(row.tag, value.text(), 1);
         break;
       case Write::float32:
-        putWord(row.tag, recordType::floats, std::bit_cast<std::uint32_t>(value.floatValue()));
+        putWord(row.tag, recordType::floats, value.floatBits());
         break;
       case Write::integerH:
       case Write::integerL:
@@ -177,7 +177,7 @@ class Encoder {
         array.size() == row.count || (row.write == Write::floatPair && array.size() == 3);
     if (!fits) return;
     putHeader(row.tag, recordType::floats, static_cast<std::uint32_t>(array.size() * 4));
-    for (const Value& element : array) putLe32(std::bit_cast<std::uint32_t>(element.floatValue()));
+    for (const Value& element : array) putLe32(element.floatBits());
   }
 
   // Kept on purpose: the elements all go into the first word, so the last one stays there and the

@@ -1,7 +1,6 @@
 #include "oxmv/values/Array.h"
 
 #include <algorithm>
-#include <bit>
 #include <utility>
 
 #include "oxmv/values/LittleEndian.h"
@@ -50,8 +49,8 @@ Value Array::operator[](std::size_t index) const {
   const detail::Block& block = value_.block();
   if (slot.form() == Form::list) return Value::in(block, block.items(slot.body)[index]);
   const std::uint32_t word = loadLe32(block.bytes(slot).data() + index * wordSize);
-  return slot.form() == Form::floats ? Value(std::bit_cast<float>(word))
-                                     : Value(std::bit_cast<std::int32_t>(word));
+  const Form form = slot.form() == Form::floats ? Form::float32 : Form::integer;
+  return Value::in(block, detail::Slot::scalar(form, word));
 }
 
 bool operator==(const Array& a, const Array& b) { return Value(a) == Value(b); }

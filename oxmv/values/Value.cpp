@@ -151,6 +151,10 @@ float Value::floatValue() const noexcept {
   return 0;
 }
 
+std::uint32_t Value::floatBits() const noexcept {
+  return kind() == Kind::float32 ? slot_.body : std::bit_cast<std::uint32_t>(floatValue());
+}
+
 double Value::doubleValue() const noexcept {
   switch (kind()) {
     case Kind::integer: return static_cast<double>(content_.integer);

@@ -93,6 +93,9 @@ class Value {
   std::int64_t int64Value() const noexcept;
   float floatValue() const noexcept;
   double doubleValue() const noexcept;
+  // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a signalling
+  // not-a-number would arrive as a quiet one.
+  std::uint32_t floatBits() const noexcept;
 
   // The characters of a text; empty for every other kind. The view holds as long as this value.
   std::string_view text() const& noexcept;

@@ -336,7 +336,7 @@ TEST(TagStreamDecoderHostile, FloatsThatAreNotFinite) {
   ASSERT_EQ(mask.size(), bits.size());
   for (std::size_t i = 0; i < bits.size(); ++i) {
     EXPECT_EQ(mask[i].kind(), Value::Kind::float32);
-    EXPECT_EQ(std::bit_cast<std::uint32_t>(mask[i].floatValue()), bits[i]);
+    EXPECT_EQ(mask[i].floatBits(), bits[i]);
   }
 }
 

@@ -12,6 +12,7 @@
 #include "tests/support/Decoding.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
@@ -214,13 +215,14 @@ TEST(TagStreamDecoderLenience, TextThatIsNotUtf8IsReadAsLatin1) {
 // The identity.
 
 TEST(TagStreamDecoderLenience, GuidTakesAsManyBytesAsItsStructureWhateverTheSize) {
-  if (sizeof(myGUID) != 24) GTEST_SKIP();
+  if (!is64Bit) GTEST_SKIP();
   Bytes stream = {'G', 'U', 'I', 'D', 16, 0,  0,  'G', 1,   2,   3,   4,   5, 6, 7, 8,
                   9,   10,  11,  12,  13, 14, 15, 16,  'R', 'E', 'E', 'L', 0, 0, 0, 'c'};
   myGUID guid;
   EXPECT_EQ(keys(decoded(stream, std::nullopt, &guid)), (Names{"GUID", "REEL"}));
-  EXPECT_EQ(guid,
-            (myGUID{0x0807060504030201u, 0x0A09, 0x0C0B, {13, 14, 15, 16, 'R', 'E', 'E', 'L'}}));
+  EXPECT_EQ(
+      guid,
+      (myGUID{wide(0x0807060504030201u), 0x0A09, 0x0C0B, {13, 14, 15, 16, 'R', 'E', 'E', 'L'}}));
 
   stream[4] = 0;  // size 0: no data, and the same identity
   myGUID other;
@@ -229,24 +231,25 @@ TEST(TagStreamDecoderLenience, GuidTakesAsManyBytesAsItsStructureWhateverTheSize
 }
 
 TEST(TagStreamDecoderLenience, GuidTakesTheBytesThatAreThere) {
-  if (sizeof(myGUID) != 24) GTEST_SKIP();
+  if (!is64Bit) GTEST_SKIP();
   const myGUID before{
-      0xAAAAAAAAAAAAAAAAu, 0xAAAA, 0xAAAA, {0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA}};
+      wide(0xAAAAAAAAAAAAAAAAu), 0xAAAA, 0xAAAA, {0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA, 0xAA}};
   myGUID guid = before;
   decoded(
       {'G', 'U', 'I', 'D', 16, 0, 0, 'G', 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16},
       std::nullopt, &guid);
   EXPECT_EQ(
       guid,
-      (myGUID{0x0807060504030201u, 0x0A09, 0x0C0B, {13, 14, 15, 16, 0xAA, 0xAA, 0xAA, 0xAA}}));
+      (myGUID{
+          wide(0x0807060504030201u), 0x0A09, 0x0C0B, {13, 14, 15, 16, 0xAA, 0xAA, 0xAA, 0xAA}}));
 
   guid = before;
   decoded({'G', 'U', 'I', 'D', 2, 0, 0, 'G', 1, 2}, std::nullopt, &guid);
-  EXPECT_EQ(guid.Data1, 0xAAAAAAAAAAAA0201u);
+  EXPECT_EQ(guid.Data1, wide(0xAAAAAAAAAAAA0201u));
 }
 
 TEST(TagStreamDecoderLenience, GuidInANestedStreamTakesThatStreamsBytes) {
-  if (sizeof(myGUID) != 24) GTEST_SKIP();
+  if (!is64Bit) GTEST_SKIP();
   StreamBuilder stream;
   stream.header("COL1", 24, 0).header("GUID", 16, 'G').raw(Bytes(16, 0x11));
   stream.record("FREE", 'c', Bytes(16, 0x22));

@@ -10,6 +10,7 @@
 #include "tests/support/Decoding.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
@@ -260,14 +261,15 @@ TEST(TagStreamDecoder, NothingThatANestedStreamHoldsLeaksOut) {
 // The identity.
 
 TEST(TagStreamDecoder, GuidRecordIsDataAndTheIdentity) {
-  if (sizeof(myGUID) != 24) GTEST_SKIP();
+  if (!is64Bit) GTEST_SKIP();
   const Bytes image = {1,  2,  3,  4,  5,  6,  7,  8,  9,  10, 11, 12,
                        13, 14, 15, 16, 17, 18, 19, 20, 21, 22, 23, 24};
   StreamBuilder stream;
   stream.record("GUID", 'G', image);
   myGUID guid;
   EXPECT_EQ(decoded(stream.bytes(), std::nullopt, &guid), (Dictionary{{"GUID", dataOf(image)}}));
-  EXPECT_EQ(guid, (myGUID{0x0807060504030201u, 0x0A09, 0x0C0B, {13, 14, 15, 16, 17, 18, 19, 20}}));
+  EXPECT_EQ(guid,
+            (myGUID{wide(0x0807060504030201u), 0x0A09, 0x0C0B, {13, 14, 15, 16, 17, 18, 19, 20}}));
 }
 
 TEST(TagStreamDecoder, GuidRecordInANestedStreamIsTheIdentityToo) {

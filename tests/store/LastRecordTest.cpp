@@ -6,19 +6,19 @@
 #include "oxmv/store/LastRecord.h"
 #include "tests/support/Files.h"
 #include "tests/support/TempDir.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
 
 // The GUID in both builds: Data1 takes 8 bytes or 4, and only the longer form has padding.
-constexpr bool isWide = sizeof(unsigned long) == 8;
-const Bytes record = isWide ? Bytes{0x33, 0x22, 0x11, 0x00, 0x00, 0x00, 0x00, 0x00,  // Data1
-                                    0x55, 0x44, 0x77, 0x66,                          // Data2, Data3
-                                    0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF,  // Data4
-                                    0xDE, 0xAD, 0xBE, 0xEF}                          // padding
-                            : Bytes{0x33, 0x22, 0x11, 0x00,                          // Data1
-                                    0x55, 0x44, 0x77, 0x66,                          // Data2, Data3
-                                    0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF};  // Data4
+const Bytes record = is64Bit ? Bytes{0x33, 0x22, 0x11, 0x00, 0x00, 0x00, 0x00, 0x00,  // Data1
+                                     0x55, 0x44, 0x77, 0x66,  // Data2, Data3
+                                     0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF,  // Data4
+                                     0xDE, 0xAD, 0xBE, 0xEF}                          // padding
+                             : Bytes{0x33, 0x22, 0x11, 0x00,                          // Data1
+                                     0x55, 0x44, 0x77, 0x66,  // Data2, Data3
+                                     0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF};  // Data4
 constexpr myGUID guid = {
     0x00112233, 0x4455, 0x6677, {0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF}};
 const Bytes stream = {'T', 'A', 'K', 'E', 4, 0, 0, 'B', 3, 0, 0, 0};
@@ -46,7 +46,7 @@ TEST(LastRecord, IsAGuidAndAStream) {
 }
 
 TEST(LastRecord, KeepsTheWidthOfTheBuild) {
-  static_assert(sizeof(myGUID) == (isWide ? 24 : 16));
+  static_assert(sizeof(myGUID) == (is64Bit ? 24 : 16));
   EXPECT_EQ(record.size(), sizeof(myGUID));
 }
 

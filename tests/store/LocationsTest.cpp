@@ -7,6 +7,7 @@
 #include "oxmv/values/Array.h"
 #include "tests/support/FakeHost.h"
 #include "tests/support/Printing.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
@@ -60,10 +61,10 @@ TEST_F(Locations, ZeroGuidIsAName) {
 }
 
 TEST_F(Locations, FirstFieldIsNamedByItsLow32Bits) {
-  if (sizeof(unsigned long) == 4) GTEST_SKIP() << "there are no others";
-  myGUID wide = guid;
-  wide.Data1 = static_cast<unsigned long>(0xFFFFFFFF00112233ull);
-  EXPECT_EQ(clipFilePath(wide, appID), clipFilePath(guid, appID));
+  if (!is64Bit) GTEST_SKIP();
+  myGUID wider = guid;
+  wider.Data1 = wide(0xFFFFFFFF00112233u);
+  EXPECT_EQ(clipFilePath(wider, appID), clipFilePath(guid, appID));
 }
 
 TEST_F(Locations, PreferencesPlaceTheDatabase) {

@@ -9,7 +9,7 @@
 namespace oxmv::test {
 
 // Different names of 16 ASCII characters, the last no NUL, that all have one and the same std::hash
-// in GNU's standard library, where that is not seeded. In another standard library they are just
+// in GNU's standard library of a 64-bit build, where that is not seeded. Elsewhere they are just
 // names.
 std::vector<std::string> collidingNames(std::size_t count);
 

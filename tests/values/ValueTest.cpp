@@ -13,6 +13,7 @@
 #include "oxmv/values/Dictionary.h"
 #include "oxmv/values/Value.h"
 #include "tests/support/Printing.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
@@ -166,9 +167,23 @@ TEST(Value, NotANumberIsTheInteger0) {
 }
 
 TEST(Value, FloatKeepsItsBits) {
-  for (const std::uint32_t bits : {0x7FC00000u, 0xFFC00001u, 0x7F800001u, 0x80000000u, 1u}) {
-    EXPECT_EQ(std::bit_cast<std::uint32_t>(Value(std::bit_cast<float>(bits)).floatValue()), bits);
+  for (const std::uint32_t bits : {0x7FC00000u, 0xFFC00001u, 0x80000000u, 1u}) {
+    const Value number = std::bit_cast<float>(bits);
+    EXPECT_EQ(number.floatBits(), bits);
+    EXPECT_EQ(std::bit_cast<std::uint32_t>(number.floatValue()), bits);
   }
+}
+
+TEST(Value, SignallingNotANumberKeepsItsBits) {
+  if (!is64Bit) GTEST_SKIP() << "x87 registers may be how floats are handed over";
+  EXPECT_EQ(Value(std::bit_cast<float>(0x7F800001u)).floatBits(), 0x7F800001u);
+}
+
+TEST(Value, FloatBitsAreThoseOfTheFloatValue) {
+  EXPECT_EQ(Value(1).floatBits(), 0x3F800000u);
+  EXPECT_EQ(Value(0.5).floatBits(), 0x3F000000u);
+  EXPECT_EQ(Value("-1").floatBits(), 0xBF800000u);
+  EXPECT_EQ(Value().floatBits(), 0u);
 }
 
 TEST(Value, DoubleAsFloatIsTheNearest) {

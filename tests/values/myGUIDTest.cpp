@@ -6,15 +6,13 @@
 
 #include "oxmv/values/myGUID.h"
 #include "tests/support/Printing.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::test {
 namespace {
 
 static_assert(sizeof(myGUID) == sizeof(unsigned long) * 2 + 8,
               "24 bytes where unsigned long has 8, 16 where it has 4");
-
-// These tests write down the image of a 64-bit build.
-constexpr bool is64Bit = sizeof(unsigned long) == 8;
 
 // 0x01, 0x02, ... so that every byte tells its place.
 std::vector<std::uint8_t> image(std::size_t size) {
@@ -35,16 +33,29 @@ TEST(myGUID, TakesItsFieldsFromALittleEndianImage) {
   if (!is64Bit) GTEST_SKIP();
   myGUID guid;
   copyOverImage(guid, image(24));
-  EXPECT_EQ(
-      guid,
-      (myGUID{
-          0x0807060504030201u, 0x0A09, 0x0C0B, {0x0D, 0x0E, 0x0F, 0x10, 0x11, 0x12, 0x13, 0x14}}));
+  EXPECT_EQ(guid, (myGUID{wide(0x0807060504030201u),
+                          0x0A09,
+                          0x0C0B,
+                          {0x0D, 0x0E, 0x0F, 0x10, 0x11, 0x12, 0x13, 0x14}}));
+}
+
+TEST(myGUID, ImageOfA32BitBuildIsShorter) {
+  if (is64Bit) GTEST_SKIP();
+  const myGUID whole{0x04030201, 0x0605, 0x0807, {0x09, 0x0A, 0x0B, 0x0C, 0x0D, 0x0E, 0x0F, 0x10}};
+  for (const std::size_t size : {16u, 17u, 24u}) {
+    myGUID guid;
+    copyOverImage(guid, image(size));
+    EXPECT_EQ(guid, whole) << size;
+  }
+  myGUID guid;
+  copyOverImage(guid, image(5));
+  EXPECT_EQ(guid, (myGUID{0x04030201, 0x0005, 0, {}}));
 }
 
 TEST(myGUID, ShortImageLeavesTheRest) {
   if (!is64Bit) GTEST_SKIP();
   const myGUID before{
-      0xAAAAAAAAAAAAAAAAu, 0xBBBB, 0xCCCC, {0xD0, 0xD1, 0xD2, 0xD3, 0xD4, 0xD5, 0xD6, 0xD7}};
+      wide(0xAAAAAAAAAAAAAAAAu), 0xBBBB, 0xCCCC, {0xD0, 0xD1, 0xD2, 0xD3, 0xD4, 0xD5, 0xD6, 0xD7}};
   const auto after = [&](std::size_t size) {
     myGUID guid = before;
     copyOverImage(guid, image(size));
@@ -53,11 +64,11 @@ TEST(myGUID, ShortImageLeavesTheRest) {
   EXPECT_EQ(after(0), before);
 
   myGUID expected = before;
-  expected.Data1 = 0xAAAAAAAAAAAAAA01u;
+  expected.Data1 = wide(0xAAAAAAAAAAAAAA01u);
   EXPECT_EQ(after(1), expected);
-  expected.Data1 = 0xAA07060504030201u;
+  expected.Data1 = wide(0xAA07060504030201u);
   EXPECT_EQ(after(7), expected);
-  expected.Data1 = 0x0807060504030201u;
+  expected.Data1 = wide(0x0807060504030201u);
   EXPECT_EQ(after(8), expected);
   expected.Data2 = 0xBB09;
   EXPECT_EQ(after(9), expected);
@@ -99,7 +110,8 @@ TEST(myGUID, TextIsUpperCaseIn8And4And4And4And12Digits) {
 
 TEST(myGUID, TextShowsTheLow32BitsOfData1) {
   if (!is64Bit) GTEST_SKIP();
-  EXPECT_EQ(guidText({0xFFFFFFFF12345678u, 0, 0, {}}), "12345678-0000-0000-0000-000000000000");
+  EXPECT_EQ(guidText({wide(0xFFFFFFFF12345678u), 0, 0, {}}),
+            "12345678-0000-0000-0000-000000000000");
 }
 
 }  // namespace
