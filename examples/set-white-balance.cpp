@@ -1,10 +1,11 @@
 // Opens a clip of the database by its GUID, changes its white balance and saves it.
 #include <iostream>
+
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/values/Array.h"
 
 int main() {
-  const oxmv::myGUID guid = {0x00112233, 0x4455, 0x6677, {0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF}};
+  const oxmv::myGUID guid = {0x00112233, 0x4455, 0x6677, {0x88, 0x99, 0xAA, 0xBB, 0xCC}};
   auto clip = oxmv::MetadataDictionary::initFromGUID(guid);
   if (clip.loadError() != oxmv::LoadError::none) {  // saving would lose what could not be read
     std::cerr << clip.fileURL().string() << ": not loaded\n";

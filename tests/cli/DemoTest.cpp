@@ -21,7 +21,7 @@ std::set<std::string> namesIn(const fs::path& folder) {
   return names;
 }
 
-bool isClip(const fs::path& file) { return file.extension() != ".json"; }
+bool isClip(const fs::path& file) { return file.extension().string().starts_with(".col"); }
 
 TEST(Demo, WritesTheExamplesAndADamagedClip) {
   const TempDir folder;
