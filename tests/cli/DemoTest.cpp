@@ -30,6 +30,7 @@ TEST(Demo, WritesTheExamplesAndADamagedClip) {
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_EQ(outcome.err, "");
   std::set<std::string> expected = namesIn(examples);
+  expected.erase("set-white-balance.cpp");  // is for programmers, and no file to try the command on
   for (const std::string& name : expected)
     EXPECT_EQ(readFile(demo / name), readFile(examples / name)) << name;
   expected.insert("damaged.colr");
