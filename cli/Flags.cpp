@@ -31,6 +31,8 @@ constexpr auto rows = std::to_array<FlagRow>({
     {Flag::backup, "", "--backup", "", "keep the old file beside it: CLIP~, or CLIP~2 and so on"},
     {Flag::create, "", "--create", "", "make a clip that does not exist"},
     {Flag::raw, "", "--raw", "", "values as they are: nothing escaped, data as bytes"},
+    {Flag::reel, "", "--reel", "NAME", "the name of the reel"},
+    {Flag::cameras, "", "--cameras", "FILE", "recognise the cameras in FILE, not those built in"},
     {Flag::color, "", "--color", "WHEN", "auto (default), always or never"},
 });
 

@@ -32,6 +32,8 @@ enum class Flag : std::uint8_t {
   backup,
   create,
   raw,
+  reel,
+  cameras,
   color,
 };
 
