@@ -36,7 +36,7 @@ class BitWriter {
  public:
   void write(std::uint32_t bits, int count) {
     for (int i = count - 1; i >= 0; --i) {
-      byte_ = static_cast<std::uint8_t>(byte_ << 1 | (bits >> i & 1));
+      byte_ = static_cast<std::uint8_t>(std::uint32_t{byte_} << 1 | (bits >> i & 1));
       if (++filled_ == 8) put();
     }
   }
@@ -174,8 +174,8 @@ Bytes StillBuilder::bytes() const {
   if (fitsBefore) append(bytes, segments_);
   const std::size_t start = bytes.size() + 4;
   Bytes comment(modelOffset - start + modelText_.size() + 1);
-  std::copy(maker_.begin(), maker_.end(), comment.begin() + (makerOffset - start));
-  std::copy(modelText_.begin(), modelText_.end(), comment.begin() + (modelOffset - start));
+  std::copy(maker_.begin(), maker_.end(), comment.data() + (makerOffset - start));
+  std::copy(modelText_.begin(), modelText_.end(), comment.data() + (modelOffset - start));
   append(bytes, segmentOf(0xFE, comment));
   if (!fitsBefore) append(bytes, segments_);
   const Bytes image = picture();
