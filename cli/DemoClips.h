@@ -1,7 +1,8 @@
-// The example clips, which the build makes part of the command.
+// The examples, which the build makes part of the command.
 
 #pragma once
 
+#include <cstdint>
 #include <span>
 #include <string_view>
 
@@ -14,5 +15,8 @@ struct DemoClip {
 
 // The clips in examples/, in the order of their names. Generated; see CMakeLists.txt.
 std::span<const DemoClip> demoClips() noexcept;
+
+// The still in examples/. Generated, too.
+std::span<const std::uint8_t> demoStill() noexcept;
 
 }  // namespace oxmv::cli

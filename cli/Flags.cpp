@@ -35,6 +35,8 @@ constexpr auto rows = std::to_array<FlagRow>({
     {Flag::noProgress, "", "--no-progress", "", "show no progress, also on a terminal"},
     {Flag::db, "", "--db", "DIR", "the clip database is in DIR (or in $OXMV_DB)"},
     {Flag::looks, "", "--looks", "DIR", "the look tables are in DIR (or in $OXMV_LOOKS)"},
+    {Flag::reel, "", "--reel", "NAME", "the name of the reel"},
+    {Flag::cameras, "", "--cameras", "FILE", "recognise the cameras in FILE, not those built in"},
     {Flag::color, "", "--color", "WHEN", "auto (default), always or never"},
 });
 

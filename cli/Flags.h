@@ -36,6 +36,8 @@ enum class Flag : std::uint8_t {
   noProgress,
   db,
   looks,
+  reel,
+  cameras,
   color,
 };
 

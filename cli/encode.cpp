@@ -1,8 +1,6 @@
 #include <array>
-#include <filesystem>
 #include <optional>
 #include <string>
-#include <system_error>
 #include <utility>
 #include <variant>
 #include <vector>
@@ -10,26 +8,15 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
+#include "cli/ClipOutput.h"
 #include "cli/Inputs.h"
 #include "cli/TagJson.h"
-#include "cli/ValueText.h"
 #include "cli/Verb.h"
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
-#include "oxmv/platform/WholeFile.h"
 
 namespace oxmv::cli {
 namespace {
-
-constexpr std::string_view standardOutput = "-";
-
-void checkOutput(const Call& call, const std::string& input) {
-  if (!call.arguments.has(Flag::output))
-    throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
-  std::error_code ignored;  // what is not there is not the same
-  if (std::filesystem::equivalent(input, call.arguments.value(Flag::output), ignored))
-    throw UsageError("same-file", "the output would take the place of the input");
-}
 
 std::optional<Dictionary> readTags(Call& call, const std::string& name) {
   const auto content = readInput(name);
@@ -47,32 +34,21 @@ std::optional<Dictionary> readTags(Call& call, const std::string& name) {
   return std::get<Dictionary>(std::move(tags));
 }
 
-void write(Call& call, const std::string& output, const Bytes& stream) {
-  if (call.arguments.has(Flag::dryRun))
-    return call.messages.note(output, fmt::format("would get {}", counted(stream.size(), "byte")));
-  if (output == standardOutput) return call.output.write(asText(stream));
-  std::error_code error;
-  if (!writeWholeFile(output, stream, error))
-    return call.messages.error(output, error.message(), "write-failed");
-  call.messages.note(output, fmt::format("got {}", counted(stream.size(), "byte")));
-}
-
 void run(Call& call) {
   const std::string& input = call.words.front();
   const Layout layout = layoutOf(call.arguments);
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
-  checkOutput(call, input);
-  const std::string output = call.arguments.value(Flag::output);
-  if (output == standardOutput && StandardOutput::isTerminal())
-    return call.messages.refused("standard output", "a clip is binary, and this is a terminal",
-                                 "binary-to-terminal");
+  if (!call.arguments.has(Flag::output))
+    throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
+  const std::string output = clipOutput(call, input);
+  if (!mayGetClip(call, output)) return;
 
   const auto tags = readTags(call, input);
   if (!tags) return;
   if (!passes(call, input, findLosses(*tags, layout), allowed)) return;
   const auto stream = encodeStream(*tags, layout);
   if (!stream) return call.messages.error(input, "not enough memory", "no-memory");
-  write(call, output, *stream);
+  writeClip(call, output, *stream);
 }
 
 constexpr auto flags = std::to_array({Flag::output, Flag::layout, Flag::allow, Flag::dryRun});

@@ -21,6 +21,8 @@
 
 namespace oxmv {
 
+class CameraTables;
+
 // The identifier under which the library's preferences are kept.
 constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
@@ -166,6 +168,18 @@ class MetadataDictionary {
   // metaDataData() as hexadecimal digits, two lower-case ones a byte; empty when there are no
   // bytes.
   std::string metadataString() const;
+
+  // The tags that a still from a camera tells of its clip: when it was taken, the camera's model and
+  // firmware, how wide it looks, and the reel name unless that is empty. Which tags there are, and
+  // where they come from: see tagsOfStill(). They are nobody's until setMetadata() is called with
+  // them. `tables`: the cameras that are recognised; null: those built in.
+  //
+  // Answers nothing when there is no path, no such file (of at most 256 MiB) or no JPEG image in it.
+  // Throws std::out_of_range when the still has a firmware text of fewer than 3 characters, or of
+  // fewer than 6 that does not begin with one of the short prefixes.
+  static std::optional<Dictionary> metadataFromJPEGFile(
+      const std::optional<std::filesystem::path>& path, std::string_view reelName,
+      const CameraTables* tables = nullptr);
 
   // What people call a tag; null if it has no label. See tagLabel().
   static std::shared_ptr<const std::string> translateTag(std::string_view tag) {

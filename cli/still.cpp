@@ -1,0 +1,214 @@
+#include <algorithm>
+#include <array>
+#include <memory>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <system_error>
+#include <utility>
+#include <variant>
+#include <vector>
+
+#include <fmt/format.h>
+
+#include "cli/AllowedLosses.h"
+#include "cli/Characters.h"
+#include "cli/ClipOutput.h"
+#include "cli/Inputs.h"
+#include "cli/JsonResults.h"
+#include "cli/TagJson.h"
+#include "cli/TagsAsTable.h"
+#include "cli/Verb.h"
+#include "oxmv/host/Host.h"
+#include "oxmv/import/CameraStill.h"
+#include "oxmv/metadata/Losses.h"
+#include "oxmv/metadata/TagStreamEncoder.h"
+#include "oxmv/platform/CreationTime.h"
+
+namespace oxmv::cli {
+namespace {
+
+// What the library tells its host's log becomes a note like others. All else goes on to the host
+// before it.
+class LogAsNotes final : public Host {
+ public:
+  LogAsNotes(std::shared_ptr<Host> before, Messages& messages, std::string file)
+      : before_(std::move(before)), messages_(messages), file_(std::move(file)) {}
+
+  Value copyPreference(std::string_view key, std::string_view appID) override {
+    return before_->copyPreference(key, appID);
+  }
+  void setPreference(std::string_view key, const Value& value, std::string_view appID) override {
+    before_->setPreference(key, value, appID);
+  }
+  bool synchronizePreferences(std::string_view appID, std::error_code* error) override {
+    return before_->synchronizePreferences(appID, error);
+  }
+  std::string localizedString(std::string_view key, std::string_view builtIn) override {
+    return before_->localizedString(key, builtIn);
+  }
+  void alert(std::string_view message) override { before_->alert(message); }
+  void log(std::string_view line) override { messages_.note(file_, line); }
+
+ private:
+  std::shared_ptr<Host> before_;
+  Messages& messages_;
+  std::string file_;
+};
+
+// Puts a host in use while it lives.
+class HostInUse {
+ public:
+  explicit HostInUse(std::shared_ptr<Host> host) : before_(installHost(std::move(host))) {}
+  ~HostInUse() { installHost(before_); }
+  HostInUse(const HostInUse&) = delete;
+  HostInUse& operator=(const HostInUse&) = delete;
+
+ private:
+  std::shared_ptr<Host> before_;
+};
+
+using Harvest = std::variant<Dictionary, FileProblem>;
+
+// Says the problem, and gives it back.
+FileProblem said(Call& call, const std::string& file, FileProblem problem) {
+  call.messages.error(file, visible(problem.message), problem.code);
+  return problem;
+}
+
+std::variant<CameraTables, FileProblem> cameraTables(const Call& call) {
+  if (!call.arguments.has(Flag::cameras)) return CameraTables::builtIn();
+  const auto text = readInput(call.arguments.value(Flag::cameras));
+  if (const auto* problem = std::get_if<FileProblem>(&text)) return *problem;
+  auto tables = CameraTables::fromText(asText(std::get<Bytes>(text)));
+  if (const auto* problem = std::get_if<CameraTablesProblem>(&tables))
+    return FileProblem{"bad-cameras", problem->message};
+  return std::get<CameraTables>(std::move(tables));
+}
+
+Harvest tagsOf(Call& call, const std::string& name, const CameraTables& tables) {
+  const auto file = readInput(name);
+  if (const auto* problem = std::get_if<FileProblem>(&file)) return said(call, name, *problem);
+  // What comes through standard input was created nowhere.
+  const auto created = name == "-" ? std::nullopt : creationTime(name);
+  const HostInUse notes(std::make_shared<LogAsNotes>(host(), call.messages, name));
+  std::optional<Dictionary> tags;
+  try {
+    tags = tagsOfStill(std::get<Bytes>(file), created, call.arguments.value(Flag::reel), tables);
+  } catch (const std::out_of_range& error) {
+    return said(call, name, {"software-too-short", error.what()});
+  }
+  if (!tags) return said(call, name, {"not-an-image", "is no JPEG image that can be decoded"});
+  if (!created)
+    call.messages.warning(name, "it is not known when it was created; without STIM, SDAT and TIMC",
+                          "no-creation-date");
+  return *std::move(tags);
+}
+
+Harvest harvest(Call& call, const std::string& name) {
+  const auto tables = cameraTables(call);
+  if (const auto* problem = std::get_if<FileProblem>(&tables))
+    return said(call, call.arguments.value(Flag::cameras), *problem);
+  return tagsOf(call, name, std::get<CameraTables>(tables));
+}
+
+void showAsJson(Call& call, const std::string& name, const Harvest& harvest) {
+  const auto* tags = std::get_if<Dictionary>(&harvest);
+  JsonResults results(call);
+  results.add([&](JsonWriter& json) {
+    beginResult(json, "oxmv.still/1", name);
+    json.key("tags");
+    if (tags == nullptr) {
+      json.null();
+    } else {
+      writeTagJson(json, *tags);
+    }
+    endResult(json, std::get_if<FileProblem>(&harvest));
+  });
+  results.finish();
+}
+
+// The field of view is in every still of use, and in no stream: that is told, not refused.
+std::vector<Loss> lossesBesideFieldOfView(Call& call, const std::string& name,
+                                          const Dictionary& tags, Layout layout) {
+  std::vector<Loss> losses = findLosses(tags, layout);
+  const auto isFieldOfView = [](const Loss& loss) { return loss.path == fieldOfViewKey; };
+  for (const Loss& loss : losses) {
+    if (isFieldOfView(loss))
+      call.messages.warning(name,
+                            "the field of view (FOV) is not stored: streams have no tag for it",
+                            codeOf(loss.code));
+  }
+  losses.erase(std::remove_if(losses.begin(), losses.end(), isFieldOfView), losses.end());
+  return losses;
+}
+
+void store(Call& call, const std::string& name, const Dictionary& tags, Layout layout,
+           const std::vector<LossCode>& allowed, const std::string& output) {
+  if (!passes(call, name, lossesBesideFieldOfView(call, name, tags, layout), allowed)) return;
+  const auto stream = encodeStream(tags, layout);
+  if (!stream) return call.messages.error(name, "not enough memory", "no-memory");
+  writeClip(call, output, *stream);
+}
+
+void checkFlags(const Call& call, const std::string& name) {
+  const Arguments& arguments = call.arguments;
+  for (const Flag flag : {Flag::layout, Flag::allow, Flag::dryRun}) {
+    if (arguments.has(flag) && !arguments.has(Flag::output))
+      throw UsageError("bad-flags", fmt::format("{} goes with --output", rowOf(flag).name));
+  }
+  if (wantsJson(call) && arguments.value(Flag::output) == "-")
+    throw UsageError("bad-flags", "JSON and the clip cannot both go to standard output");
+  if (name == "-" && arguments.value(Flag::cameras) == "-")
+    throw UsageError("standard-input-twice", "standard input can be read only once");
+}
+
+void run(Call& call) {
+  const std::string& name = call.words.front();
+  checkFlags(call, name);
+  const Layout layout = layoutOf(call.arguments);
+  const std::vector<LossCode> allowed = allowedLosses(call.arguments);
+  std::optional<std::string> output;
+  if (call.arguments.has(Flag::output)) {
+    output = clipOutput(call, name);
+    if (!mayGetClip(call, *output)) return;
+  }
+
+  const Harvest harvested = harvest(call, name);
+  if (wantsJson(call)) showAsJson(call, name, harvested);
+  const auto* tags = std::get_if<Dictionary>(&harvested);
+  if (tags == nullptr) return;
+  if (output) {
+    store(call, name, *tags, layout, allowed, *output);
+  } else if (!wantsJson(call)) {
+    writeTagsAsTable(call.output, *tags, call.style, Extent::whole);
+  }
+}
+
+constexpr auto flags =
+    std::to_array({Flag::reel, Flag::cameras, Flag::output, Flag::layout, Flag::allow, Flag::dryRun,
+                   Flag::json, Flag::ndjson, Flag::strict});
+
+}  // namespace
+
+const Verb stillVerb = {
+    .name = "still",
+    .words = "FILE.jpg",
+    .summary = "show the tags that a camera still tells of its clip, or make a clip of them",
+    .examples =
+        "oxmv still still.jpg\n"
+        "oxmv still --reel A001 still.jpg -o clip.colr\n"
+        "oxmv still --cameras mine.toml --json still.jpg\n",
+    .details =
+        "Times come from when the file was created, if its file system remembers that; model\n"
+        "and firmware from the texts in the file, by the tables of cameras; the field of view\n"
+        "from the focal length. With --output the tags go into a clip, all but the field of\n"
+        "view, for which streams have no tag. A file that is there is replaced, whole or not at\n"
+        "all. Tags that would not read back are refused; --allow CODE lets them through.\n",
+    .flags = flags,
+    .fewestWords = 1,
+    .mostWords = 1,
+    .run = run,
+};
+
+}  // namespace oxmv::cli
