@@ -28,9 +28,10 @@ class Walk {
  public:
   Walk(XML_Parser parser, XmlVisitor& visitor) : parser_(parser), visitor_(visitor) {
     XML_SetUserData(parser, this);
-    XML_SetXmlDeclHandler(parser, [](void* self, const XML_Char*, const XML_Char* encoding, int) {
-      of(self).tell([&](XmlVisitor& to) { return to.onDeclaration(viewOf(encoding)); });
-    });
+    XML_SetXmlDeclHandler(parser,
+                          [](void* self, const XML_Char* version, const XML_Char* encoding, int) {
+                            of(self).declaration(viewOf(version), viewOf(encoding));
+                          });
     XML_SetStartDoctypeDeclHandler(
         parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, int) {
           of(self).tell([](XmlVisitor& to) { return to.onDoctype(); });
@@ -80,8 +81,8 @@ class Walk {
     if (status == XML_STATUS_OK) return {};
     const XML_Error error = XML_GetErrorCode(parser_);
     if (error == XML_ERROR_NO_MEMORY) throw std::bad_alloc();
-    if (!objection_.empty()) return {XmlEnd::Kind::malformed, offset(), objection_};
-    if (error == XML_ERROR_ABORTED) return {XmlEnd::Kind::stopped, offset(), {}};
+    if (!objection_.empty()) return {XmlEnd::Kind::malformed, stoppedAt_, objection_};
+    if (isStopped_) return {XmlEnd::Kind::stopped, stoppedAt_, {}};
     return {XmlEnd::Kind::malformed, offset(), viewOf(XML_ErrorString(error))};
   }
 
@@ -102,12 +103,21 @@ class Walk {
 
   void stop() {
     isStopped_ = true;
+    stoppedAt_ = offset();
     XML_StopParser(parser_, XML_FALSE);
   }
 
   void object(std::string_view what) {
     objection_ = what;
     stop();
+  }
+
+  // The parser takes any version; XML 1.0 has "1." and digits.
+  void declaration(std::string_view version, std::string_view encoding) {
+    const bool isOne = version.size() > 2 && version.starts_with("1.") &&
+                       version.find_first_not_of("0123456789", 2) == std::string_view::npos;
+    if (!isOne) return object("not a version of XML 1");
+    tell([&](XmlVisitor& to) { return to.onDeclaration(encoding); });
   }
 
   void elementStart(const XML_Char* name) {
@@ -134,6 +144,7 @@ class Walk {
   std::size_t depth_ = 0;
   std::size_t nestedEntities_ = 0;
   bool isStopped_ = false;
+  std::size_t stoppedAt_ = 0;
   std::string_view objection_;
   std::exception_ptr thrown_;
 };
