@@ -223,6 +223,44 @@ TEST(HexTable, RandomTextsAreReadByTheRules) {
   }
 }
 
+TEST(HexTable, RandomSpacedTextsAreReadByTheRules) {
+  std::mt19937 random(7);
+  for (int i = 0; i < 4000; ++i) {
+    const std::string gap(random() % 6, " ,\n;"[random() % 4]);
+    std::string text = std::string(random() % 4, '"');
+    const auto count = random() % 20;
+    for (std::size_t k = 0; k < count; ++k) {
+      for (int digit = 0; digit < 8; ++digit) text += "0123456789abcdefABCDEF"[random() % 22];
+      text += gap;
+    }
+    // One character is another one, or there is one more or less.
+    if (!text.empty() && random() % 2 == 0) {
+      const auto at = random() % text.size();
+      switch (random() % 3) {
+        case 0: text[at] = " 0f,x"[random() % 5]; break;
+        case 1: text.insert(at, 1, " 0f,x"[random() % 5]); break;
+        default: text.erase(at, 1);
+      }
+    }
+    const std::size_t room = random() % 24;
+    const Read expected = plainRead(text, room);
+    const Read got = read(text, room);
+    ASSERT_EQ(got.values, expected.values) << text;
+    ASSERT_EQ(got.table.groups, expected.table.groups) << text;
+    ASSERT_EQ(got.table.malformed, expected.table.malformed) << text;
+  }
+}
+
+TEST(HexTable, CharacterThatIsNotAsciiIsFoundInEveryGap) {
+  for (std::size_t at = 0; at < 20; ++at) {
+    std::string text;
+    for (std::size_t k = 0; k < 20; ++k) text += k == at ? "0000803F\u00E9" : "0000803F ";
+    const Read got = read(text);
+    EXPECT_FALSE(got.table.isAscii) << at;
+    EXPECT_EQ(got.table.groups, 20u) << at;
+  }
+}
+
 TEST(HexTable, EveryCharacterIsADigitOrNot) {
   for (int c = 1; c < 128; ++c) {
     std::string text(64, '0');
