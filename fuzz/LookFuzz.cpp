@@ -72,7 +72,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   require(problems[0].offset == problems[1].offset && problems[0].what == problems[1].what);
   if (!quick) {
     require(!problems[0].what.empty() && problems[0].offset <= file.size());
-    const XmlPosition position = positionOf(file, problems[0].offset);
+    const XmlPosition position = XmlPositions(file).of(problems[0].offset);
     require(position.line >= 1 && position.column >= 1);
     return 0;
   }

@@ -58,7 +58,7 @@ enum class LookImportStop : std::uint8_t {
 struct LookImportEnd {
   LookImportStop reason;
   std::error_code error;   // unreadable
-  std::size_t offset = 0;  // the rest: where in the file, in bytes; see positionOf()
+  std::size_t offset = 0;  // the rest: where in the file, in bytes; see XmlPositions
   std::string_view what;   // notWellFormed: in a few words; valid during the call
   std::int32_t size = 0;   // noSize, tooLarge, tooMuch: the size in force
 };

@@ -149,49 +149,6 @@ class Walk {
   std::exception_ptr thrown_;
 };
 
-// The characters of a document one after the other, as far as lines and columns need them.
-class Characters {
- public:
-  explicit Characters(std::span<const std::uint8_t> document) : document_(document) {
-    const std::uint8_t first = !document.empty() ? document[0] : 0xFF;
-    const std::uint8_t second = document.size() > 1 ? document[1] : 0xFF;
-    // With a byte order mark, or by the '<' that a document without one begins with.
-    isBigEndian_ = first == 0 || (first == 0xFE && second == 0xFF);
-    width_ = isBigEndian_ || second == 0 || (first == 0xFF && second == 0xFE) ? 2 : 1;
-    // UTF-8 unless it cannot be: then each byte is a character.
-    isUtf8_ =
-        width_ == 1 && isUtf8({reinterpret_cast<const char*>(document.data()), document.size()});
-  }
-
-  std::size_t width() const { return width_; }
-
-  std::uint32_t at(std::size_t offset) const {
-    if (width_ == 1) return document_[offset];
-    if (document_.size() - offset < 2) return document_[offset];
-    const std::uint32_t first = document_[offset];
-    const std::uint32_t second = document_[offset + 1];
-    return isBigEndian_ ? first << 8 | second : second << 8 | first;
-  }
-
-  // Whether a character begins there, and not the rest of one, nor a byte order mark.
-  bool begins(std::size_t offset) const {
-    const std::uint32_t unit = at(offset);
-    if (width_ == 2) return unit != 0xFEFF && (unit < 0xDC00 || unit > 0xDFFF);
-    if (!isUtf8_) return true;
-    return (unit & 0xC0) != 0x80 && !(offset == 0 && unit == 0xEF && isByteOrderMark());
-  }
-
- private:
-  bool isByteOrderMark() const {
-    return document_.size() >= 3 && document_[1] == 0xBB && document_[2] == 0xBF;
-  }
-
-  std::span<const std::uint8_t> document_;
-  std::size_t width_;
-  bool isBigEndian_;
-  bool isUtf8_;
-};
-
 }  // namespace
 
 XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor) {
@@ -203,22 +160,53 @@ XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor) {
   return Walk(parser.get(), visitor).run(document);
 }
 
-XmlPosition positionOf(std::span<const std::uint8_t> document, std::size_t offset) {
-  const Characters characters(document);
-  const std::size_t end = std::min(offset, document.size());
-  XmlPosition position;
-  for (std::size_t i = 0; i < end; i += characters.width()) {
-    const std::uint32_t unit = characters.at(i);
-    const std::size_t next = i + characters.width();
-    const bool isFirstOfTwo = unit == '\r' && next < document.size() && characters.at(next) == '\n';
+XmlPositions::XmlPositions(std::span<const std::uint8_t> document) : document_(document) {
+  const std::uint8_t first = !document.empty() ? document[0] : 0xFF;
+  const std::uint8_t second = document.size() > 1 ? document[1] : 0xFF;
+  // UTF-16 has a byte order mark, or shows by the '<' that a document without one begins with.
+  isBigEndian_ = first == 0 || (first == 0xFE && second == 0xFF);
+  width_ = isBigEndian_ || second == 0 || (first == 0xFF && second == 0xFE) ? 2 : 1;
+  // Else UTF-8, unless it cannot be: then each byte is a character.
+  isUtf8_ =
+      width_ == 1 && isUtf8({reinterpret_cast<const char*>(document.data()), document.size()});
+}
+
+XmlPosition XmlPositions::of(std::size_t offset) {
+  const std::size_t end = std::min(offset, document_.size());
+  if (end < next_) {
+    next_ = 0;
+    position_ = {};
+  }
+  for (; next_ < end; next_ += width_) {
+    const std::uint32_t unit = unitAt(next_);
+    const std::size_t following = next_ + width_;
+    const bool isFirstOfTwo =
+        unit == '\r' && following < document_.size() && unitAt(following) == '\n';
     if ((unit == '\n' || unit == '\r') && !isFirstOfTwo) {
-      ++position.line;
-      position.column = 1;
-    } else if (characters.begins(i)) {
-      ++position.column;
+      ++position_.line;
+      position_.column = 1;
+    } else if (isCounted(next_)) {
+      ++position_.column;
     }
   }
-  return position;
+  return position_;
+}
+
+std::uint32_t XmlPositions::unitAt(std::size_t offset) const {
+  const std::uint32_t first = document_[offset];
+  if (width_ == 1 || document_.size() - offset < 2) return first;
+  const std::uint32_t second = document_[offset + 1];
+  return isBigEndian_ ? first << 8 | second : second << 8 | first;
+}
+
+// Whether a character begins there, which is not the byte order mark.
+bool XmlPositions::isCounted(std::size_t offset) const {
+  const std::uint32_t unit = unitAt(offset);
+  if (width_ == 2) return !(unit >= 0xDC00 && unit <= 0xDFFF) && !(offset == 0 && unit == 0xFEFF);
+  if (!isUtf8_) return true;
+  const bool isMark = offset == 0 && document_.size() >= 3 && unit == 0xEF &&
+                      document_[1] == 0xBB && document_[2] == 0xBF;
+  return (unit & 0xC0) != 0x80 && !isMark;
 }
 
 }  // namespace oxmv

@@ -65,12 +65,31 @@ struct XmlEnd {
 // caller.
 XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor);
 
-// Line and column, both from 1, of a place in a document. Columns count characters; a tabulator is
-// one.
+// Line and column, both from 1. Columns count characters; a tabulator is one.
 struct XmlPosition {
   std::size_t line = 1;
   std::size_t column = 1;
 };
-XmlPosition positionOf(std::span<const std::uint8_t> document, std::size_t offset);
+
+// Where the bytes of a document stand for its readers. Quick as long as it is asked in ascending order.
+// The document must outlive it.
+class XmlPositions {
+ public:
+  explicit XmlPositions(std::span<const std::uint8_t> document);
+
+  // The position of the character at an offset; past the end, the end's.
+  XmlPosition of(std::size_t offset);
+
+ private:
+  std::uint32_t unitAt(std::size_t offset) const;
+  bool isCounted(std::size_t offset) const;
+
+  std::span<const std::uint8_t> document_;
+  std::size_t width_;  // bytes of a code unit: 1 or 2
+  bool isBigEndian_;
+  bool isUtf8_;
+  std::size_t next_ = 0;  // the first byte that position_ does not count
+  XmlPosition position_;
+};
 
 }  // namespace oxmv

@@ -204,6 +204,30 @@ TEST_F(LookImport, MalformedGroupIsZeroAndReported) {
             std::string("\0\0\x80\x3F\0\0\0\0\0\0\x80\x3E", 12));
 }
 
+TEST_F(LookImport, TextsThatAreOddAreReadAndReported) {
+  import(
+      "<look><LUT><size>1</size><a>\n    0000803F\u00E9 0000003F</a><b>12345678</b></LUT></look>");
+  EXPECT_EQ(witness.tables.at(0).values.groups, 2u);
+  EXPECT_GT(witness.tables.at(0).values.leading, maxLeading);
+  EXPECT_FALSE(witness.tables.at(0).values.isAscii);
+  EXPECT_EQ(witness.tables.at(1).values.leading, 0u);
+  EXPECT_TRUE(witness.tables.at(1).values.isAscii);
+}
+
+TEST_F(LookImport, EncodingsAreRead) {
+  const auto expected = import(onePoint)->CRC();
+  std::string utf16 = "\xFF\xFE";
+  for (const char c : onePoint) (utf16 += c) += '\0';
+  for (const std::string& file :
+       {"\xEF\xBB\xBF" + onePoint, utf16,
+        "<?xml version='1.0' encoding='ISO-8859-1'?><!--\xE9-->" + onePoint}) {
+    fs::remove_all(looks);
+    fs::create_directory(looks);
+    EXPECT_EQ(import(file)->CRC(), expected);
+    EXPECT_EQ(files().at("Warm.xml"), file);
+  }
+}
+
 TEST_F(LookImport, WhiteSpaceAfterTheSizeIsATableWithoutValues) {
   const auto look = import("<look><LUT><size>1</size> </LUT></look>");
   EXPECT_EQ(look->CRC(), 0u);
@@ -311,6 +335,47 @@ TEST_F(LookImport, EveryShorterFileGivesTheEmptyReference) {
     expectEmpty(import(onePoint.substr(0, size)));
     EXPECT_TRUE(files().empty());
   }
+}
+
+TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
+  const std::string body = "<LUT><size>1</size><a>0000803F</a>";
+  std::string bomb = "<!DOCTYPE look [<!ENTITY e0 '" + std::string(100, 'F') + "'>";
+  for (int i = 1; i <= 12; ++i) {
+    bomb += "<!ENTITY e" + std::to_string(i) + " '";
+    for (int k = 0; k < 10; ++k) bomb += "&e" + std::to_string(i - 1) + ";";
+    bomb += "'>";
+  }
+  std::string deep;
+  for (int i = 0; i < 100000; ++i) deep += "<a>";
+  for (int i = 0; i < 100000; ++i) deep += "</a>";
+  for (const std::string& file : {
+           bomb + "]><look>" + body + "<a>&e12;</a></LUT></look>",
+           "<look>" + body + deep + "</LUT></look>",
+           "<look>" + body + std::string(1, '\0') + "</LUT></look>",
+           "<look>" + body + "</LUT></look>" + std::string(100, '\0'),
+           "<?xml version='1.0' encoding='UTF-16'?><look>" + body + "</LUT></look>",
+           "<?xml version='1.0' encoding='x-unknown'?><look>" + body + "</LUT></look>",
+           "<look>" + body + "\xE9</LUT></look>",
+           "<look>" + body + "</LUT><LUT a='" + std::string(1000000, 'A') + "</look>",
+           std::string("\xFF\xFE<\0l\0", 6),
+           std::string(1000000, '<'),
+           std::string(1000000, '>'),
+           std::string(1000000, '\0'),
+           std::string(1000000, 'A'),
+       }) {
+    expectEmpty(import(file));
+    EXPECT_TRUE(files().empty());
+    EXPECT_EQ(witness.stops.at(0).reason, LookImportStop::notWellFormed);
+  }
+}
+
+TEST_F(LookImport, LoadsNothingFromOutside) {
+  put(folder / "outside", "0000003F");
+  const auto look = import(
+      "<!DOCTYPE look [<!ENTITY e SYSTEM 'outside'>]>"
+      "<look><LUT><size>1</size><a>0000803F&e;</a></LUT></look>");
+  EXPECT_EQ(witness.tables.at(0).values.groups, 1u);
+  EXPECT_EQ(look->CRC(), crcOf(std::string("\0\0\x80\x3F", 4)));
 }
 
 TEST_F(LookImport, FileThatCannotBeReadGivesTheEmptyReference) {

@@ -282,13 +282,13 @@ TEST(Xml, WhatTheVisitorThrowsReachesTheCaller) {
 }
 
 std::pair<std::size_t, std::size_t> lineAndColumn(std::string_view document, std::size_t offset) {
-  const XmlPosition position = positionOf(bytesOf(document), offset);
+  const XmlPosition position = XmlPositions(bytesOf(document)).of(offset);
   return {position.line, position.column};
 }
 
 using Place = std::pair<std::size_t, std::size_t>;
 
-TEST(XmlPosition, CountsLinesAndColumnsFromOne) {
+TEST(XmlPositions, CountsLinesAndColumnsFromOne) {
   const std::string_view text = "ab\ncd\r\ne\rf";
   EXPECT_EQ(lineAndColumn(text, 0), Place(1, 1));
   EXPECT_EQ(lineAndColumn(text, 2), Place(1, 3));
@@ -300,7 +300,16 @@ TEST(XmlPosition, CountsLinesAndColumnsFromOne) {
   EXPECT_EQ(lineAndColumn("", 0), Place(1, 1));
 }
 
-TEST(XmlPosition, CountsCharacters) {
+TEST(XmlPositions, MayBeAskedInAnyOrder) {
+  const std::string_view text = "ab\ncd\r\ne\r\u00E9f";
+  XmlPositions positions(bytesOf(text));
+  for (const std::size_t offset : std::vector<std::size_t>{0, 4, 6, 7, 7, 2, 100, 11, 0, 9}) {
+    const XmlPosition position = positions.of(offset);
+    EXPECT_EQ(Place(position.line, position.column), lineAndColumn(text, offset)) << offset;
+  }
+}
+
+TEST(XmlPositions, CountsCharacters) {
   EXPECT_EQ(lineAndColumn("\u00E9\u20ACx", 5), Place(1, 3));
   EXPECT_EQ(lineAndColumn("\xEF\xBB\xBFx", 3), Place(1, 1));
   EXPECT_EQ(lineAndColumn("\xE9\xE9x", 2), Place(1, 3));  // ISO-8859-1
