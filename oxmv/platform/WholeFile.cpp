@@ -188,9 +188,11 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
 }
 
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
-                                                       std::size_t count, std::error_code& error) {
+                                                       std::size_t count, std::error_code& error,
+                                                       bool* isOpened) {
   struct stat status = {};
   const Descriptor file = openFile(path, status, error);
+  if (isOpened != nullptr) *isOpened = file.isOpen();
   if (!file.isOpen()) return std::nullopt;
   std::vector<std::uint8_t> content(count);
   const auto size = readInto(content, file.number(), error);

@@ -33,8 +33,11 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
                                                        std::error_code& error);
 
 // The first `count` bytes of such a file, or all of them if it has fewer; it may be of any size.
+// `isOpened`, unless null, tells a file that could be opened and not read from one that could not be
+// opened.
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
-                                                       std::size_t count, std::error_code& error);
+                                                       std::size_t count, std::error_code& error,
+                                                       bool* isOpened = nullptr);
 
 // Puts a file with this content at `path`, in place of the regular file that may be there: whoever
 // opens it finds the old content or the new, whole, also after a crash. The content goes to a

@@ -1,10 +1,12 @@
-// What a project that uses the library starts with: bytes in, a tag out.
+// What a project that uses the library starts with: bytes in, a tag out; and a call that needs every
+// library which ours leans on.
 
 #include <cstdint>
 #include <iostream>
 #include <optional>
 
 #include "oxmv/Version.h"
+#include "oxmv/looks/LookFileRef.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 
 int main() {
@@ -16,7 +18,10 @@ int main() {
   const auto timecode = clip.metadata()["TIMC"].text();
   std::cout << "oxmv " << oxmv::version << ": TIMC " << timecode << '\n';
 
-  // From the part of the library that leans on others: they are found, too.
+  // From the parts of the library that lean on others: these are found, too.
   if (oxmv::MetadataDictionary::metadataFromJPEGFile(std::nullopt, "A001")) return 1;
-  return timecode == "1:0" ? 0 : 1;
+  const auto look = oxmv::LookFileRef::initFromLookFile("no such look.xml");
+  const auto none = oxmv::LookFileRef::initNone();
+  const bool isAnyName = look && look->lookNameCompare(none) == 0;
+  return timecode == "1:0" && isAnyName ? 0 : 1;
 }

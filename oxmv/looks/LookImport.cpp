@@ -1,0 +1,135 @@
+#include "oxmv/looks/LookImport.h"
+
+#include <string>
+#include <vector>
+
+#include "oxmv/host/Host.h"
+#include "oxmv/looks/Crc32.h"
+#include "oxmv/looks/LookTableFile.h"
+#include "oxmv/platform/WholeFile.h"
+
+namespace oxmv {
+namespace {
+
+using Bytes = std::vector<std::uint8_t>;
+
+class Import {
+ public:
+  Import(const std::filesystem::path& path, LookImportObserver* observer, std::uint64_t mostBytes)
+      : path_(path),
+        fileName_(lastPathComponent(path.native())),
+        folder_(lookTableFolder()),
+        observer_(observer),
+        bytesLeft_(mostBytes) {}
+
+  std::optional<LookFileRef> run() {
+    std::error_code error;
+    const auto file = readWholeFile(path_, error);
+    if (!file) {
+      stop({LookImportStop::unreadable, error, 0, {}, 0});
+      return look_;
+    }
+    file_ = &*file;
+    // The whole file is judged before anything is written.
+    LookProblem problem;
+    const auto description = LookDescription::parse(*file, &problem);
+    if (!description) {
+      stop({LookImportStop::notWellFormed, {}, problem.offset, problem.what, 0});
+      return look_;
+    }
+    for (std::size_t i = 0; i < description->nodeCount(); ++i) {
+      const LookNode node = description->node(i);
+      const auto reason = take(node);
+      if (!reason) continue;
+      stop({*reason, {}, node.offset, {}, size_});
+      if (*reason == LookImportStop::tooMuch) break;
+      alert(*reason);
+      return std::nullopt;
+    }
+    return look_;
+  }
+
+ private:
+  // Answers why the import ends here; nothing if it does not.
+  std::optional<LookImportStop> take(const LookNode& node) {
+    switch (node.kind) {
+      case LookNode::Kind::lut: size_ = 0; return std::nullopt;
+      case LookNode::Kind::size:
+        size_ = lookSizeFrom(node.text);
+        if (size_ > maxLookSize) return LookImportStop::tooLarge;
+        return std::nullopt;
+      case LookNode::Kind::table: break;
+    }
+    if (size_ < 1) return LookImportStop::noSize;
+    if (lookFileSize(size_) > bytesLeft_) return LookImportStop::tooMuch;
+    table(node);
+    return std::nullopt;
+  }
+
+  void table(const LookNode& node) {
+    LookTableReport report;
+    report.node = node;
+    report.size = size_;
+    record_.reset(size_);
+    report.values = record_.readTable(node.text);
+    report.crc =
+        calccrc(record_.table().data(), static_cast<std::ptrdiff_t>(report.values.stored * 4));
+    report.isNew = look_.generateLUTFile(static_cast<std::int32_t>(report.crc), record_.bytes(),
+                                         size_, fileName_, &report.writeError);
+    if (report.isNew) {
+      bytesLeft_ -= lookFileSize(size_);
+      copyDescription(report);
+    }
+    if (observer_ != nullptr) observer_->onTable(report);
+  }
+
+  void copyDescription(LookTableReport& report) const {
+    const std::filesystem::path target = folder_ + '/' + fileName_;
+    std::error_code ignored;
+    if (std::filesystem::exists(target, ignored)) {
+      report.copy = LookTableReport::Copy::alreadyThere;
+    } else if (replaceWholeFile(target, std::nullopt, *file_, report.copyError)) {
+      report.copy = LookTableReport::Copy::copied;
+    } else {
+      report.copy = LookTableReport::Copy::failed;
+    }
+  }
+
+  void stop(const LookImportEnd& end) const {
+    if (observer_ != nullptr) observer_->onStop(end);
+  }
+
+  void alert(LookImportStop reason) const {
+    const std::string about = "Error : LUT (" + fileName_ + ") ";
+    host()->alert(about + (reason == LookImportStop::tooLarge
+                               ? "is too large, a maximum of 64x64x64 is supported"
+                               : "has no defined table size"));
+  }
+
+  const std::filesystem::path& path_;
+  const std::string fileName_;
+  const std::string folder_;
+  LookImportObserver* observer_;
+  std::uint64_t bytesLeft_;
+
+  const Bytes* file_ = nullptr;
+  std::int32_t size_ = 0;  // N, of the "LUT" element at hand
+  OXLookFileRecord record_;
+  LookFileRef look_;
+};
+
+}  // namespace
+
+std::size_t LookTableReport::missing() const { return lookValueCount(size) - values.stored; }
+
+std::optional<LookFileRef> importLook(const std::filesystem::path& path,
+                                      LookImportObserver* observer, std::uint64_t mostBytes) {
+  return Import(path, observer, mostBytes).run();
+}
+
+std::optional<LookFileRef> LookFileRef::initFromLookFile(const std::filesystem::path& path,
+                                                         LookImportObserver* observer) {
+  return importLook(path, observer);
+}
+
+}  // namespace oxmv

@@ -1,0 +1,212 @@
+#include "oxmv/platform/Xml.h"
+
+#include <algorithm>
+#include <exception>
+#include <limits>
+#include <memory>
+#include <new>
+
+#include <expat.h>
+
+#include "oxmv/platform/WholeFile.h"
+#include "oxmv/values/Text.h"
+
+namespace oxmv {
+namespace {
+
+static_assert(maxFileSize <= std::numeric_limits<int>::max(), "the parser counts in int");
+
+struct ParserFree {
+  void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
+};
+using Parser = std::unique_ptr<XML_ParserStruct, ParserFree>;
+
+std::string_view viewOf(const XML_Char* text) { return text != nullptr ? text : ""; }
+
+// Between the parser's functions, which are C, and a visitor, which may throw.
+class Walk {
+ public:
+  Walk(XML_Parser parser, XmlVisitor& visitor) : parser_(parser), visitor_(visitor) {
+    XML_SetUserData(parser, this);
+    XML_SetXmlDeclHandler(parser,
+                          [](void* self, const XML_Char* version, const XML_Char* encoding, int) {
+                            of(self).declaration(viewOf(version), viewOf(encoding));
+                          });
+    XML_SetStartDoctypeDeclHandler(
+        parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, int) {
+          of(self).tell([](XmlVisitor& to) { return to.onDoctype(); });
+        });
+    XML_SetEntityDeclHandler(
+        parser, [](void* self, const XML_Char*, int, const XML_Char* value, int length,
+                   const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
+          of(self).entity({value, value != nullptr ? static_cast<std::size_t>(length) : 0});
+        });
+    XML_SetElementHandler(
+        parser,
+        [](void* self, const XML_Char* name, const XML_Char**) { of(self).elementStart(name); },
+        [](void* self, const XML_Char*) { of(self).elementEnd(); });
+    XML_SetCharacterDataHandler(parser, [](void* self, const XML_Char* text, int length) {
+      const std::string_view piece(text, static_cast<std::size_t>(length));
+      const std::size_t offset = of(self).offset();
+      of(self).tell([&](XmlVisitor& to) { return to.onText(piece, offset); });
+    });
+    XML_SetCdataSectionHandler(
+        parser,
+        [](void* self) {
+          const std::size_t offset = of(self).offset();
+          of(self).tell([&](XmlVisitor& to) { return to.onCdataStart(offset); });
+        },
+        [](void* self) { of(self).tell([](XmlVisitor& to) { return to.onCdataEnd(); }); });
+    XML_SetCommentHandler(parser, [](void* self, const XML_Char* text) {
+      const std::size_t offset = of(self).offset();
+      of(self).tell([&](XmlVisitor& to) { return to.onComment(viewOf(text), offset); });
+    });
+    XML_SetProcessingInstructionHandler(
+        parser, [](void* self, const XML_Char*, const XML_Char* data) {
+          const std::size_t offset = of(self).offset();
+          of(self).tell(
+              [&](XmlVisitor& to) { return to.onProcessingInstruction(viewOf(data), offset); });
+        });
+    // No handler for external entities: none is loaded. None for unknown encodings: they are errors.
+    XML_SetParamEntityParsing(parser, XML_PARAM_ENTITY_PARSING_NEVER);
+  }
+  Walk(const Walk&) = delete;
+  Walk& operator=(const Walk&) = delete;
+
+  XmlEnd run(std::span<const std::uint8_t> document) {
+    const auto* const text = reinterpret_cast<const char*>(document.data());
+    const XML_Status status = XML_Parse(parser_, document.empty() ? "" : text,
+                                        static_cast<int>(document.size()), XML_TRUE);
+    if (thrown_ != nullptr) std::rethrow_exception(thrown_);
+    if (status == XML_STATUS_OK) return {};
+    const XML_Error error = XML_GetErrorCode(parser_);
+    if (error == XML_ERROR_NO_MEMORY) throw std::bad_alloc();
+    if (!objection_.empty()) return {XmlEnd::Kind::malformed, stoppedAt_, objection_};
+    if (isStopped_) return {XmlEnd::Kind::stopped, stoppedAt_, {}};
+    return {XmlEnd::Kind::malformed, offset(), viewOf(XML_ErrorString(error))};
+  }
+
+ private:
+  static Walk& of(void* self) { return *static_cast<Walk*>(self); }
+
+  // No exception may pass through the parser.
+  template <class Event>
+  void tell(Event event) noexcept {
+    if (isStopped_) return;  // some events still come after the parser was stopped
+    try {
+      if (event(visitor_)) return;
+    } catch (...) {
+      thrown_ = std::current_exception();
+    }
+    stop();
+  }
+
+  void stop() {
+    isStopped_ = true;
+    stoppedAt_ = offset();
+    XML_StopParser(parser_, XML_FALSE);
+  }
+
+  void object(std::string_view what) {
+    objection_ = what;
+    stop();
+  }
+
+  // The parser takes any version; XML 1.0 has "1." and digits.
+  void declaration(std::string_view version, std::string_view encoding) {
+    const bool isOne = version.size() > 2 && version.starts_with("1.") &&
+                       version.find_first_not_of("0123456789", 2) == std::string_view::npos;
+    if (!isOne) return object("not a version of XML 1");
+    tell([&](XmlVisitor& to) { return to.onDeclaration(encoding); });
+  }
+
+  void elementStart(const XML_Char* name) {
+    if (++depth_ > maxXmlDepth) return object("elements nested too deep");
+    tell([&](XmlVisitor& to) { return to.onElementStart(viewOf(name), offset()); });
+  }
+
+  void elementEnd() {
+    --depth_;
+    tell([](XmlVisitor& to) { return to.onElementEnd(); });
+  }
+
+  void entity(std::string_view value) {
+    if (value.find('&') == std::string_view::npos) return;
+    if (++nestedEntities_ > maxXmlNestedEntities) object("too many entities within entities");
+  }
+
+  std::size_t offset() const {
+    return static_cast<std::size_t>(std::max<XML_Index>(XML_GetCurrentByteIndex(parser_), 0));
+  }
+
+  XML_Parser parser_;
+  XmlVisitor& visitor_;
+  std::size_t depth_ = 0;
+  std::size_t nestedEntities_ = 0;
+  bool isStopped_ = false;
+  std::size_t stoppedAt_ = 0;
+  std::string_view objection_;
+  std::exception_ptr thrown_;
+};
+
+}  // namespace
+
+XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor) {
+  if (document.size() > maxFileSize) {
+    return {XmlEnd::Kind::malformed, maxFileSize, "larger than 256 MiB"};
+  }
+  const Parser parser(XML_ParserCreate(nullptr));
+  if (parser == nullptr) throw std::bad_alloc();
+  return Walk(parser.get(), visitor).run(document);
+}
+
+XmlPositions::XmlPositions(std::span<const std::uint8_t> document) : document_(document) {
+  const std::uint8_t first = !document.empty() ? document[0] : 0xFF;
+  const std::uint8_t second = document.size() > 1 ? document[1] : 0xFF;
+  // UTF-16 has a byte order mark, or shows by the '<' that a document without one begins with.
+  isBigEndian_ = first == 0 || (first == 0xFE && second == 0xFF);
+  width_ = isBigEndian_ || second == 0 || (first == 0xFF && second == 0xFE) ? 2 : 1;
+  // Else UTF-8, unless it cannot be: then each byte is a character.
+  isUtf8_ =
+      width_ == 1 && isUtf8({reinterpret_cast<const char*>(document.data()), document.size()});
+}
+
+XmlPosition XmlPositions::of(std::size_t offset) {
+  const std::size_t end = std::min(offset, document_.size());
+  if (end < next_) {
+    next_ = 0;
+    position_ = {};
+  }
+  for (; next_ < end; next_ += width_) {
+    const std::uint32_t unit = unitAt(next_);
+    const std::size_t following = next_ + width_;
+    const bool isFirstOfTwo =
+        unit == '\r' && following < document_.size() && unitAt(following) == '\n';
+    if ((unit == '\n' || unit == '\r') && !isFirstOfTwo) {
+      ++position_.line;
+      position_.column = 1;
+    } else if (isCounted(next_)) {
+      ++position_.column;
+    }
+  }
+  return position_;
+}
+
+std::uint32_t XmlPositions::unitAt(std::size_t offset) const {
+  const std::uint32_t first = document_[offset];
+  if (width_ == 1 || document_.size() - offset < 2) return first;
+  const std::uint32_t second = document_[offset + 1];
+  return isBigEndian_ ? first << 8 | second : second << 8 | first;
+}
+
+// Whether a character begins there, which is not the byte order mark.
+bool XmlPositions::isCounted(std::size_t offset) const {
+  const std::uint32_t unit = unitAt(offset);
+  if (width_ == 2) return !(unit >= 0xDC00 && unit <= 0xDFFF) && !(offset == 0 && unit == 0xFEFF);
+  if (!isUtf8_) return true;
+  const bool isMark = offset == 0 && document_.size() >= 3 && unit == 0xEF &&
+                      document_[1] == 0xBB && document_[2] == 0xBF;
+  return (unit & 0xC0) != 0x80 && !isMark;
+}
+
+}  // namespace oxmv

@@ -1,0 +1,323 @@
+#include <new>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "oxmv/platform/Xml.h"
+#include "support/SmallStack.h"
+
+namespace oxmv {
+namespace {
+
+using Kind = XmlEnd::Kind;
+
+std::span<const std::uint8_t> bytesOf(std::string_view text) {
+  return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+// Writes down everything it hears; pieces of text are put together.
+class Recorder : public XmlVisitor {
+ public:
+  std::string events;
+  std::string texts;
+
+  bool onDeclaration(std::string_view encoding) override {
+    return add("xml " + std::string(encoding));
+  }
+  bool onDoctype() override { return add("doctype"); }
+  bool onElementStart(std::string_view name, std::size_t offset) override {
+    return add("<" + std::string(name) + "@" + std::to_string(offset));
+  }
+  bool onElementEnd() override { return add(">"); }
+  bool onText(std::string_view piece, std::size_t) override {
+    texts += piece;
+    return true;
+  }
+  bool onCdataStart(std::size_t offset) override { return add("[@" + std::to_string(offset)); }
+  bool onCdataEnd() override { return add("]"); }
+  bool onComment(std::string_view text, std::size_t offset) override {
+    return add("!" + std::string(text) + "@" + std::to_string(offset));
+  }
+  bool onProcessingInstruction(std::string_view data, std::size_t offset) override {
+    return add("?" + std::string(data) + "@" + std::to_string(offset));
+  }
+
+ private:
+  bool add(const std::string& event) {
+    events += event + " ";
+    return true;
+  }
+};
+
+XmlEnd walk(std::string_view document, Recorder& recorder) {
+  return walkXml(bytesOf(document), recorder);
+}
+
+std::string textsOf(std::string_view document) {
+  Recorder recorder;
+  EXPECT_EQ(walk(document, recorder).kind, Kind::wellFormed);
+  return recorder.texts;
+}
+
+XmlEnd endOf(std::string_view document) {
+  Recorder recorder;
+  return walk(document, recorder);
+}
+
+TEST(Xml, TellsEverythingInOrder) {
+  Recorder recorder;
+  const XmlEnd end = walk(
+      "<?xml version='1.0' encoding='UTF-8'?><a><p:b x='1'>T</p:b><!--c--><?d e "
+      "f?><![CDATA[g]]></a>",
+      recorder);
+  EXPECT_EQ(end.kind, Kind::wellFormed);
+  EXPECT_EQ(recorder.events, "xml UTF-8 <a@38 <p:b@41 > !c@59 ?e f@67 [@76 ] > ");
+  EXPECT_EQ(recorder.texts, "Tg");
+}
+
+TEST(Xml, ResolvesReferencesAndLineEnds) {
+  EXPECT_EQ(textsOf("<a>&lt;&#48;&#x31;&amp;\r\n2\r3</a>"), "<01&\n2\n3");
+}
+
+TEST(Xml, ReadsEncodings) {
+  EXPECT_EQ(textsOf("\xEF\xBB\xBF<a>\u00E9</a>"), "\u00E9");
+  EXPECT_EQ(textsOf("<?xml version='1.0' encoding='ISO-8859-1'?><a>\xE9</a>"), "\u00E9");
+  EXPECT_EQ(textsOf("<?xml version='1.0' encoding='US-ASCII'?><a>e</a>"), "e");
+  using namespace std::string_view_literals;
+  EXPECT_EQ(textsOf("\xFF\xFE<\0a\0>\0\xE9\0<\0/\0a\0>\0"sv), "\u00E9");
+  EXPECT_EQ(textsOf("\xFE\xFF\0<\0a\0>\0\xE9\0<\0/\0a\0>"sv), "\u00E9");
+}
+
+TEST(Xml, ExpandsTheEntitiesOfTheDocument) {
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY e 'x'><!ENTITY f '&e;&e;'>]><a>&f;</a>"), "xx");
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY e '<b>x</b>'>]><a>&e;</a>"), "x");
+}
+
+TEST(Xml, LoadsNothingFromOutside) {
+  for (const char* document : {
+           "<!DOCTYPE a [<!ENTITY e SYSTEM 'file:///etc/passwd'>]><a>&e;</a>",
+           "<!DOCTYPE a [<!ENTITY e PUBLIC 'p' '/etc/passwd'>]><a>&e;</a>",
+           "<!DOCTYPE a SYSTEM '/etc/passwd'><a>&e;</a>",
+           "<!DOCTYPE a [<!ENTITY % e SYSTEM '/etc/passwd'>%e;]><a></a>",
+       }) {
+    EXPECT_EQ(textsOf(document), "") << document;
+  }
+}
+
+TEST(Xml, MalformedNamesPlaceAndReason) {
+  const XmlEnd end = endOf("<a><b></a>");
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.offset, 8u);
+  EXPECT_EQ(end.what, "mismatched tag");
+}
+
+TEST(Xml, RefusesWhatIsNotWellFormed) {
+  using namespace std::string_view_literals;
+  const std::string_view documents[] = {
+      ""sv,
+      " "sv,
+      "a"sv,
+      "<a>"sv,
+      "</a>"sv,
+      "<a"sv,
+      "<a></b>"sv,
+      "<a></A>"sv,
+      "<a/><b/>"sv,
+      "<a/>x"sv,
+      "x<a/>"sv,
+      "<a b></a>"sv,
+      "<a b=c></a>"sv,
+      "<a b='1' b='2'/>"sv,
+      "<a b='<'/>"sv,
+      "<a b='1'c='2'/>"sv,
+      "<a b='1/>"sv,
+      "<1/>"sv,
+      "< a/>"sv,
+      "<a><</a>"sv,
+      "<a>&</a>"sv,
+      "<a>&b</a>"sv,
+      "<a>&unknown;</a>"sv,
+      "<a>&#0;</a>"sv,
+      "<a>&#xD800;</a>"sv,
+      "<a>&#xFFFFFFFFF;</a>"sv,
+      "<a>]]></a>"sv,
+      "<a><!-- -- --></a>"sv,
+      "<a><!-- </a>"sv,
+      "<a><![CDATA[</a>"sv,
+      "<a><![cdata[]]></a>"sv,
+      "<a><?xml version='1.0'?></a>"sv,
+      "<a><?b </a>"sv,
+      " <?xml version='1.0'?><a/>"sv,
+      "<?xml version='2.0'?><a/>"sv,
+      "<?xml version='1.'?><a/>"sv,
+      "<?xml version='1.x'?><a/>"sv,
+      "<?xml encoding='UTF-8'?><a/>"sv,
+      "<?xml?><a/>"sv,
+      "<?xml version='1.0' encoding='UTF-16'?><a/>"sv,
+      "<?xml version='1.0' encoding='EBCDIC'?><a/>"sv,
+      "<?xml version='1.0' encoding='windows-1252'?><a>\xE9</a>"sv,
+      "<?xml version='1.0' encoding='US-ASCII'?><a>\xE9</a>"sv,
+      "<a>\0</a>"sv,
+      "<a>\x01</a>"sv,
+      "<a>\xE9</a>"sv,
+      "<a>\xC0\x80</a>"sv,
+      "<a>\xED\xA0\x80</a>"sv,
+      "<a>\xEF\xBF\xBE</a>"sv,
+      "<a/>\0"sv,
+      "\xFF\xFE<\0a\0/\0>"sv,
+      "\xFF\xFE<\0a\0>\0\x00\xDC<\0/\0a\0>\0"sv,
+      "<!DOCTYPE a [<!ENTITY e '&e;'>]><a>&e;</a>"sv,
+      "<!DOCTYPE a [<!ENTITY e '&f;'><!ENTITY f '&e;'>]><a>&e;</a>"sv,
+      "<!DOCTYPE a [<!ENTITY e '<b>'>]><a>&e;</b></a>"sv,
+      "<!DOCTYPE a [<!ENTITY e '&f;'><!ENTITY f SYSTEM 'x'>]><a b='&e;'/>"sv,
+      "<!DOCTYPE a"sv,
+      "<!DOCTYPE a [<!ENTITY e>]><a/>"sv,
+      "<a/><!DOCTYPE a>"sv,
+  };
+  for (const std::string_view document : documents) {
+    const XmlEnd end = endOf(document);
+    EXPECT_EQ(end.kind, Kind::malformed) << document;
+    EXPECT_FALSE(end.what.empty()) << document;
+    EXPECT_LE(end.offset, document.size()) << document;
+  }
+}
+
+TEST(Xml, EveryShorterPrefixIsMalformed) {
+  const std::string document =
+      "<?xml version='1.0'?><a b='c'><!--d--><?e f?><![CDATA[g]]>&#48;<h/>i\u00E9</a>";
+  for (std::size_t size = 0; size < document.size(); ++size) {
+    EXPECT_EQ(endOf(document.substr(0, size)).kind, Kind::malformed) << size;
+  }
+  EXPECT_EQ(endOf(document).kind, Kind::wellFormed);
+}
+
+TEST(Xml, EntitiesThatMultiplyAreMalformed) {
+  std::string document = "<!DOCTYPE a [<!ENTITY e0 '" + std::string(1000, 'x') + "'>";
+  for (int i = 1; i <= 9; ++i) {
+    document += "<!ENTITY e" + std::to_string(i) + " '";
+    for (int k = 0; k < 10; ++k) document += "&e" + std::to_string(i - 1) + ";";
+    document += "'>";
+  }
+  EXPECT_EQ(endOf(document + "]><a>&e9;</a>").kind, Kind::malformed);
+  EXPECT_EQ(endOf(document + "]><a b='&e9;'/>").kind, Kind::malformed);
+  EXPECT_EQ(endOf(document + "]><a>&e3;</a>").kind, Kind::wellFormed);
+}
+
+// A chain of entities, each within the next.
+std::string chain(std::size_t nested) {
+  std::string document = "<!DOCTYPE a [<!ENTITY e0 'x'>";
+  for (std::size_t i = 1; i <= nested; ++i) {
+    document += "<!ENTITY e" + std::to_string(i) + " '&e" + std::to_string(i - 1) + ";'>";
+  }
+  return document + "]><a b='&e" + std::to_string(nested) + ";'>&e" + std::to_string(nested) +
+         ";</a>";
+}
+
+TEST(Xml, EntitiesWithinEntitiesAreLimited) {
+  EXPECT_EQ(textsOf(chain(maxXmlNestedEntities)), "x");
+  const XmlEnd end = endOf(chain(maxXmlNestedEntities + 1));
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.what, "too many entities within entities");
+  EXPECT_EQ(endOf(chain(100000)).kind, Kind::malformed);
+}
+
+std::string nested(std::size_t depth) {
+  std::string document;
+  for (std::size_t i = 0; i < depth; ++i) document += "<a>";
+  for (std::size_t i = 0; i < depth; ++i) document += "</a>";
+  return document;
+}
+
+TEST(Xml, DepthIsLimited) {
+  EXPECT_EQ(endOf(nested(maxXmlDepth)).kind, Kind::wellFormed);
+  const XmlEnd end = endOf(nested(maxXmlDepth + 1));
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.what, "elements nested too deep");
+  EXPECT_EQ(endOf(nested(1000000)).kind, Kind::malformed);
+}
+
+TEST(Xml, NeedsLittleStack) {
+  const std::size_t used = test::stackUsedBy(
+      [] {
+        EXPECT_EQ(endOf(nested(maxXmlDepth)).kind, Kind::wellFormed);
+        EXPECT_EQ(endOf(chain(maxXmlNestedEntities)).kind, Kind::wellFormed);
+      },
+      std::size_t{1} << 20);
+  EXPECT_LE(used, std::size_t{64} << 10);
+}
+
+TEST(Xml, TakesHugeAttributesAndNames) {
+  const std::string huge(1 << 20, 'x');
+  EXPECT_EQ(endOf("<a b='" + huge + "'/>").kind, Kind::wellFormed);
+  EXPECT_EQ(endOf("<" + huge + "/>").kind, Kind::wellFormed);
+  EXPECT_EQ(endOf("<!--" + huge + "--><a/>").kind, Kind::wellFormed);
+  std::string many = "<a";
+  for (int i = 0; i < 20000; ++i) many += " a" + std::to_string(i) + "=''";
+  EXPECT_EQ(endOf(many + "/>").kind, Kind::wellFormed);
+}
+
+TEST(Xml, VisitorMayStop) {
+  class Stopper final : public Recorder {
+    bool onElementStart(std::string_view name, std::size_t offset) override {
+      Recorder::onElementStart(name, offset);
+      return name != "b";
+    }
+  };
+  Stopper stopper;
+  const XmlEnd end = walk("<a><b/><c/></a>", stopper);
+  EXPECT_EQ(end.kind, Kind::stopped);
+  EXPECT_EQ(end.offset, 3u);
+  EXPECT_EQ(stopper.events, "<a@0 <b@3 ");
+}
+
+TEST(Xml, WhatTheVisitorThrowsReachesTheCaller) {
+  class Thrower final : public Recorder {
+    bool onComment(std::string_view, std::size_t) override { throw std::bad_alloc(); }
+  };
+  Thrower thrower;
+  EXPECT_THROW(walk("<a><!--b--><c/></a>", thrower), std::bad_alloc);
+  EXPECT_EQ(thrower.events, "<a@0 ");
+}
+
+std::pair<std::size_t, std::size_t> lineAndColumn(std::string_view document, std::size_t offset) {
+  const XmlPosition position = XmlPositions(bytesOf(document)).of(offset);
+  return {position.line, position.column};
+}
+
+using Place = std::pair<std::size_t, std::size_t>;
+
+TEST(XmlPositions, CountsLinesAndColumnsFromOne) {
+  const std::string_view text = "ab\ncd\r\ne\rf";
+  EXPECT_EQ(lineAndColumn(text, 0), Place(1, 1));
+  EXPECT_EQ(lineAndColumn(text, 2), Place(1, 3));
+  EXPECT_EQ(lineAndColumn(text, 3), Place(2, 1));
+  EXPECT_EQ(lineAndColumn(text, 7), Place(3, 1));
+  EXPECT_EQ(lineAndColumn(text, 9), Place(4, 1));
+  EXPECT_EQ(lineAndColumn(text, 10), Place(4, 2));
+  EXPECT_EQ(lineAndColumn(text, 1000), Place(4, 2));
+  EXPECT_EQ(lineAndColumn("", 0), Place(1, 1));
+}
+
+TEST(XmlPositions, MayBeAskedInAnyOrder) {
+  const std::string_view text = "ab\ncd\r\ne\r\u00E9f";
+  XmlPositions positions(bytesOf(text));
+  for (const std::size_t offset : std::vector<std::size_t>{0, 4, 6, 7, 7, 2, 100, 11, 0, 9}) {
+    const XmlPosition position = positions.of(offset);
+    EXPECT_EQ(Place(position.line, position.column), lineAndColumn(text, offset)) << offset;
+  }
+}
+
+TEST(XmlPositions, CountsCharacters) {
+  EXPECT_EQ(lineAndColumn("\u00E9\u20ACx", 5), Place(1, 3));
+  EXPECT_EQ(lineAndColumn("\xEF\xBB\xBFx", 3), Place(1, 1));
+  EXPECT_EQ(lineAndColumn("\xE9\xE9x", 2), Place(1, 3));  // ISO-8859-1
+  using namespace std::string_view_literals;
+  EXPECT_EQ(lineAndColumn("\xFF\xFE<\0\n\0a\0b\0"sv, 8), Place(2, 2));
+  EXPECT_EQ(lineAndColumn("\xFE\xFF\0<\0\n\0a\0b"sv, 8), Place(2, 2));
+  EXPECT_EQ(lineAndColumn("<\0\xD8\x3C\xDF\xA8x\0"sv, 1), Place(1, 2));
+}
+
+}  // namespace
+}  // namespace oxmv
