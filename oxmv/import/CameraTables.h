@@ -43,7 +43,8 @@ class CameraTables {
 
   static const CameraTables& builtIn();
 
-  // Exactly the three tables, each with exactly its rows.
+  // Exactly the three tables, each with exactly its rows. For threads with a stack of at least 512
+  // KiB: a text may nest.
   static std::variant<CameraTables, CameraTablesProblem> fromText(std::string_view toml);
 
   const std::array<FirmwareRow, 2>& shortPrefixes() const { return shortPrefixes_; }

@@ -58,10 +58,10 @@ bool opens(char c) { return c == '.' || c == '[' || c == '{'; }
 }  // namespace
 
 std::variant<Dictionary, TomlProblem> readToml(std::string_view text) {
-  static_assert(maxTomlSize == 64 * 1024 && maxTomlOpenings == 512, "the messages name them");
+  static_assert(maxTomlSize == 64 * 1024 && maxTomlOpenings == 256, "the messages name them");
   if (text.size() > maxTomlSize) return TomlProblem{"larger than 64 KiB", 0, 0};
   if (std::count_if(text.begin(), text.end(), opens) > std::ptrdiff_t{maxTomlOpenings})
-    return TomlProblem{"more than 512 points and opening brackets", 0, 0};
+    return TomlProblem{"more than 256 points and opening brackets", 0, 0};
   const toml::parse_result result = toml::parse(text);
   if (!result) return problemAt(result.error().source(), std::string(result.error().description()));
   TomlProblem problem;

@@ -71,9 +71,9 @@ TEST(TomlReader, NestingIsLimited) {
   std::string keys = "a";
   for (std::size_t i = 0; i < maxTomlOpenings; ++i) keys += ".a";
   EXPECT_EQ(read(keys + "=1").size(), 1U);
-  EXPECT_EQ(problemIn(keys + ".a=1").message, "more than 512 points and opening brackets");
+  EXPECT_EQ(problemIn(keys + ".a=1").message, "more than 256 points and opening brackets");
   EXPECT_EQ(problemIn("a = " + std::string(maxTomlOpenings + 1, '[')).message,
-            "more than 512 points and opening brackets");
+            "more than 256 points and opening brackets");
   EXPECT_NE(problemIn("a = " + std::string(maxTomlOpenings, '[')).message, "none");
 }
 
