@@ -23,7 +23,7 @@ struct CameraTablesProblem {
 // on with each still.
 //
 // All texts are ASCII and can be printed: prefixes are compared without regard to case, letter by
-// letter, and streams of tags carry no other names.
+// letter, and streams of tags carry no other names. So is all else in the file.
 class CameraTables {
  public:
   struct FirmwareRow {

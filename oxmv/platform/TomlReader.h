@@ -26,7 +26,8 @@ constexpr std::size_t maxTomlSize = std::size_t{64} << 10;
 constexpr std::size_t maxTomlOpenings = 256;
 
 // A document: its tables as dictionaries, with their keys in alphabetical order. Booleans, dates and
-// times have no place in a dictionary, and are refused like what is no TOML.
+// times have no place in a dictionary, and are refused like what is no TOML. So is, even in comments,
+// what is not ASCII (texts may have it as \u00E9): the reader behind does not withstand all of it.
 std::variant<Dictionary, TomlProblem> readToml(std::string_view text);
 
 }  // namespace oxmv
