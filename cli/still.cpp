@@ -107,8 +107,12 @@ Harvest tagsOf(Call& call, const std::string& name, const CameraTables& tables) 
 
 Harvest harvest(Call& call, const std::string& name) {
   const auto tables = cameraTables(call);
-  if (const auto* problem = std::get_if<FileProblem>(&tables))
-    return said(call, call.arguments.value(Flag::cameras), *problem);
+  if (const auto* problem = std::get_if<FileProblem>(&tables)) {
+    const std::string cameras = call.arguments.value(Flag::cameras);
+    said(call, cameras, *problem);
+    // Of the still itself nothing is known.
+    return FileProblem{"bad-cameras", fmt::format("{}: {}", cameras, problem->message)};
+  }
   return tagsOf(call, name, std::get<CameraTables>(tables));
 }
 
@@ -170,7 +174,7 @@ void run(Call& call) {
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
   std::optional<std::string> output;
   if (call.arguments.has(Flag::output)) {
-    output = clipOutput(call, name);
+    output = clipOutput(call, {name, call.arguments.value(Flag::cameras)});
     if (!mayGetClip(call, *output)) return;
   }
 
