@@ -16,11 +16,13 @@ constexpr std::string_view standardOutput = "-";
 
 }  // namespace
 
-std::string clipOutput(const Call& call, const std::string& input) {
+std::string clipOutput(const Call& call, std::initializer_list<std::string> inputs) {
   const std::string output = call.arguments.value(Flag::output);
-  std::error_code ignored;  // what is not there is not the same
-  if (std::filesystem::equivalent(input, output, ignored))
-    throw UsageError("same-file", "the output would take the place of the input");
+  for (const std::string& input : inputs) {
+    std::error_code ignored;  // what is not there is not the same
+    if (std::filesystem::equivalent(input, output, ignored))
+      throw UsageError("same-file", "the output would take the place of the input");
+  }
   return output;
 }
 

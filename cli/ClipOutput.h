@@ -2,6 +2,7 @@
 
 #pragma once
 
+#include <initializer_list>
 #include <string>
 
 #include "cli/Inputs.h"
@@ -10,8 +11,8 @@
 namespace oxmv::cli {
 
 // The path that --output names, or "-" for standard output. Throws UsageError when the clip would
-// take the place of the input.
-std::string clipOutput(const Call& call, const std::string& input);
+// take the place of an input.
+std::string clipOutput(const Call& call, std::initializer_list<std::string> inputs);
 
 // Binary is never written to a terminal; that is said then.
 bool mayGetClip(Call& call, const std::string& output);

@@ -40,7 +40,7 @@ void run(Call& call) {
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
   if (!call.arguments.has(Flag::output))
     throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
-  const std::string output = clipOutput(call, input);
+  const std::string output = clipOutput(call, {input});
   if (!mayGetClip(call, output)) return;
 
   const auto tags = readTags(call, input);

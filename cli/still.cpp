@@ -1,6 +1,5 @@
 #include <algorithm>
 #include <array>
-#include <memory>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -19,7 +18,6 @@
 #include "cli/TagJson.h"
 #include "cli/TagsAsTable.h"
 #include "cli/Verb.h"
-#include "oxmv/host/Host.h"
 #include "oxmv/import/CameraStill.h"
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
@@ -27,46 +25,6 @@
 
 namespace oxmv::cli {
 namespace {
-
-// What the library tells its host's log becomes a note like others. All else goes on to the host
-// before it.
-class LogAsNotes final : public Host {
- public:
-  LogAsNotes(std::shared_ptr<Host> before, Messages& messages, std::string file)
-      : before_(std::move(before)), messages_(messages), file_(std::move(file)) {}
-
-  Value copyPreference(std::string_view key, std::string_view appID) override {
-    return before_->copyPreference(key, appID);
-  }
-  void setPreference(std::string_view key, const Value& value, std::string_view appID) override {
-    before_->setPreference(key, value, appID);
-  }
-  bool synchronizePreferences(std::string_view appID, std::error_code* error) override {
-    return before_->synchronizePreferences(appID, error);
-  }
-  std::string localizedString(std::string_view key, std::string_view builtIn) override {
-    return before_->localizedString(key, builtIn);
-  }
-  void alert(std::string_view message) override { before_->alert(message); }
-  void log(std::string_view line) override { messages_.note(file_, line); }
-
- private:
-  std::shared_ptr<Host> before_;
-  Messages& messages_;
-  std::string file_;
-};
-
-// Puts a host in use while it lives.
-class HostInUse {
- public:
-  explicit HostInUse(std::shared_ptr<Host> host) : before_(installHost(std::move(host))) {}
-  ~HostInUse() { installHost(before_); }
-  HostInUse(const HostInUse&) = delete;
-  HostInUse& operator=(const HostInUse&) = delete;
-
- private:
-  std::shared_ptr<Host> before_;
-};
 
 using Harvest = std::variant<Dictionary, FileProblem>;
 
@@ -91,7 +49,6 @@ Harvest tagsOf(Call& call, const std::string& name, const CameraTables& tables) 
   if (const auto* problem = std::get_if<FileProblem>(&file)) return said(call, name, *problem);
   // What comes through standard input was created nowhere.
   const auto created = name == "-" ? std::nullopt : creationTime(name);
-  const HostInUse notes(std::make_shared<LogAsNotes>(host(), call.messages, name));
   std::optional<Dictionary> tags;
   try {
     tags = tagsOfStill(std::get<Bytes>(file), created, call.arguments.value(Flag::reel), tables);
@@ -107,8 +64,12 @@ Harvest tagsOf(Call& call, const std::string& name, const CameraTables& tables) 
 
 Harvest harvest(Call& call, const std::string& name) {
   const auto tables = cameraTables(call);
-  if (const auto* problem = std::get_if<FileProblem>(&tables))
-    return said(call, call.arguments.value(Flag::cameras), *problem);
+  if (const auto* problem = std::get_if<FileProblem>(&tables)) {
+    const std::string cameras = call.arguments.value(Flag::cameras);
+    said(call, cameras, *problem);
+    // Of the still itself nothing is known.
+    return FileProblem{"bad-cameras", fmt::format("{}: {}", cameras, problem->message)};
+  }
   return tagsOf(call, name, std::get<CameraTables>(tables));
 }
 
@@ -170,7 +131,7 @@ void run(Call& call) {
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
   std::optional<std::string> output;
   if (call.arguments.has(Flag::output)) {
-    output = clipOutput(call, name);
+    output = clipOutput(call, {name, call.arguments.value(Flag::cameras)});
     if (!mayGetClip(call, *output)) return;
   }
 

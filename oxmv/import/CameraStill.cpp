@@ -19,8 +19,8 @@
 namespace oxmv {
 namespace {
 
-// Where the maker's cameras put two texts, each ended by a NUL. Not read from EXIF, on purpose: what
-// other programs make of a still keeps or writes the EXIF maker, but not these.
+// Where the maker's cameras put two texts, each ended by a NUL. The maker that EXIF names is not
+// asked, on purpose.
 constexpr std::size_t makerTextOffset = 1038;
 constexpr std::size_t modelTextOffset = 1062;
 constexpr auto makerSpellings = std::to_array<std::string_view>({"KiVex", "Kivex"});

@@ -23,7 +23,7 @@ struct CameraTablesProblem {
 // on with each still.
 //
 // All texts are ASCII and can be printed: prefixes are compared without regard to case, letter by
-// letter, and streams of tags carry no other names.
+// letter, and streams of tags carry no other names. So is all else in the file.
 class CameraTables {
  public:
   struct FirmwareRow {
@@ -43,7 +43,8 @@ class CameraTables {
 
   static const CameraTables& builtIn();
 
-  // Exactly the three tables, each with exactly its rows.
+  // Exactly the three tables, each with exactly its rows. For threads with a stack of at least 512
+  // KiB: a text may nest.
   static std::variant<CameraTables, CameraTablesProblem> fromText(std::string_view toml);
 
   const std::array<FirmwareRow, 2>& shortPrefixes() const { return shortPrefixes_; }

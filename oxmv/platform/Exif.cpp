@@ -8,6 +8,7 @@
 
 #include <libexif/exif-data.h>
 
+#include "oxmv/platform/ExifDirectories.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv {
@@ -35,9 +36,8 @@ double asDouble(const unsigned char* bytes, ExifByteOrder order) {
 }
 
 // Null if there is none.
-const ExifEntry* find(const ExifData& data, ExifIfd directory, ExifTag tag) {
-  ExifContent* content = data.ifd[directory];
-  const ExifEntry* entry = ::exif_content_get_entry(content, tag);
+const ExifEntry* find(const ExifData& data, ExifIfd directory, ExifTagNumber tag) {
+  const ExifEntry* entry = ::exif_content_get_entry(data.ifd[directory], static_cast<ExifTag>(tag));
   return entry == nullptr || entry->data == nullptr ? nullptr : entry;
 }
 
@@ -72,21 +72,22 @@ std::optional<std::string> textOf(const ExifEntry* entry) {
 }  // namespace
 
 ExifProperties readExif(std::span<const std::uint8_t> segment) {
+  const auto reduced = reducedExif(segment);
+  if (!reduced) return {};
   const std::unique_ptr<ExifData, Unref> data(::exif_data_new());
   if (data == nullptr) throw std::bad_alloc();
   // Would give entries of a wrong type the right one, and add those that a picture must have.
   ::exif_data_unset_option(data.get(), EXIF_DATA_OPTION_FOLLOW_SPECIFICATION);
   // A segment is shorter than 64 KiB; of more bytes the library would not look at the rest either.
   constexpr std::size_t most = 0xFFFF;
-  ::exif_data_load_data(data.get(), segment.data(),
-                        static_cast<unsigned>(std::min(segment.size(), most)));
+  ::exif_data_load_data(data.get(), reduced->data(),
+                        static_cast<unsigned>(std::min(reduced->size(), most)));
 
   const ExifByteOrder order = ::exif_data_get_byte_order(data.get());
   return {
-      .focalLength =
-          numberOf(find(*data, EXIF_IFD_EXIF, EXIF_TAG_FOCAL_LENGTH_IN_35MM_FILM), order),
-      .software = textOf(find(*data, EXIF_IFD_0, EXIF_TAG_SOFTWARE)),
-      .model = textOf(find(*data, EXIF_IFD_0, EXIF_TAG_MODEL)),
+      .focalLength = numberOf(find(*data, EXIF_IFD_EXIF, ExifTagNumber::focalLength), order),
+      .software = textOf(find(*data, EXIF_IFD_0, ExifTagNumber::software)),
+      .model = textOf(find(*data, EXIF_IFD_0, ExifTagNumber::model)),
   };
 }
 

@@ -16,8 +16,8 @@ namespace oxmv {
 // file) follows.
 constexpr std::array<std::uint8_t, 6> exifMark = {'E', 'x', 'i', 'f', 0, 0};
 
-// Each property is there if the picture has it, once, and it is of the kind named here; what is of
-// another kind, cut off or broken counts as not there.
+// Each property is there if the picture has it, of the kind named here; of several the first counts.
+// What is of another kind, cut off or broken is not there.
 struct ExifProperties {
   // FocalLengthIn35mmFilm, in millimetres; one number of whatever type. Not a fraction over 0, but
   // perhaps 0, negative or not finite.

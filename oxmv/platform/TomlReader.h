@@ -22,11 +22,12 @@ struct TomlProblem {
 // The larger text is refused before anything looks at it: tables that people write are far smaller.
 constexpr std::size_t maxTomlSize = std::size_t{64} << 10;
 // Points and opening brackets in a text. Every level of nesting needs one of them, so this also
-// limits the depth, which the recursion of any reader of TOML pays for in stack.
-constexpr std::size_t maxTomlOpenings = 512;
+// limits the depth, and with it the stack that the recursion takes: 300 KiB for the worst of texts.
+constexpr std::size_t maxTomlOpenings = 256;
 
 // A document: its tables as dictionaries, with their keys in alphabetical order. Booleans, dates and
-// times have no place in a dictionary, and are refused like what is no TOML.
+// times have no place in a dictionary, and are refused like what is no TOML. So is, even in comments,
+// what is not ASCII (texts may have it as \u00E9): the reader behind does not withstand all of it.
 std::variant<Dictionary, TomlProblem> readToml(std::string_view text);
 
 }  // namespace oxmv

@@ -121,7 +121,7 @@ TEST(Still, WarningsCountWhenStrict) { EXPECT_EQ(still(exampleStill(), {"--stric
 
 TEST(Still, NotesTheLineOfTheLogWhenVerbose) {
   const Outcome outcome = still(exampleStill(), {"-v"});
-  EXPECT_EQ(outcome.err, "oxmv: note: standard input: FOV SET, BABY!!!!!\n" + undated);
+  EXPECT_EQ(outcome.err, "oxmv: note: FOV SET, BABY!!!!!\n" + undated);
   EXPECT_EQ(outcome.out.find("BABY"), std::string::npos);
 }
 
@@ -178,9 +178,14 @@ TEST(Still, NamesTheRowOfCamerasThatIsWrong) {
   EXPECT_EQ(outcome.err, "oxmv: error: " + mine +
                              ": long-prefixes, row 1: prefix \"QX-301\" is not like QX3.01"
                              " (bad-cameras)\n");
-  EXPECT_EQ(still(exampleStill(), {"--cameras", folder / "missing.toml"}).err,
-            "oxmv: error: " + (folder / "missing.toml").string() +
-                ": No such file or directory (missing)\n");
+  const std::string missing = (folder / "missing.toml").string();
+  const Outcome unread = still(exampleStill(), {"--json", "--cameras", missing});
+  EXPECT_EQ(unread.err, "oxmv: error: " + missing + ": No such file or directory (missing)\n");
+  EXPECT_EQ(unread.out,
+            "[\n"
+            R"({"schema":"oxmv.still/1","file":"-","tags":null,"error":{"code":"bad-cameras",)"
+            R"("message":")" +
+                missing + ": No such file or directory\"}}\n]\n");
 }
 
 TEST(Still, NeverWritesAClipToATerminal) {
@@ -207,8 +212,13 @@ TEST(Still, RefusesWrongUse) {
             "oxmv: error: standard input can be read only once (standard-input-twice)\n");
 }
 
-TEST(Still, NeverTakesThePlaceOfItself) {
+TEST(Still, NeverTakesThePlaceOfItsInputs) {
   const TempDir folder;
+  writeFile(folder / "mine.toml", readFile(cameras));
+  EXPECT_EQ(still(exampleStill(), {"--cameras", folder / "mine.toml", "-o", folder / "mine.toml"})
+                .exitCode,
+            2);
+  EXPECT_EQ(readFile(folder / "mine.toml"), readFile(cameras));
   std::filesystem::copy_file(example, folder / "still.jpg");
   std::filesystem::create_symlink("still.jpg", folder / "link.jpg");
   const Outcome outcome = run({"still", folder / "still.jpg", "-o", folder / "link.jpg"});

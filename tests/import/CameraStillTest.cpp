@@ -13,6 +13,7 @@
 #include "tests/support/Decoding.h"
 #include "tests/support/FakeHost.h"
 #include "tests/support/Printing.h"
+#include "tests/support/SmallStack.h"
 #include "tests/support/StillBuilder.h"
 #include "tests/support/TempDir.h"
 
@@ -388,6 +389,13 @@ TEST_F(CameraStill, EveryByteMayBeAnother) {
       }
     }
   }
+}
+
+TEST_F(CameraStill, TakesLittleStack) {
+  const Bytes file = exampleStill();
+  const CameraTables& tables = CameraTables::builtIn();
+  const auto used = stackUsedBy([&] { tagsOfStill(file, leapDay, "A001", tables); }, 256 * 1024);
+  EXPECT_LE(used, 64 * 1024U);
 }
 
 // Files.

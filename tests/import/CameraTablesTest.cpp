@@ -121,11 +121,11 @@ TEST(CameraTables, APrefixOfTheWrongFormIsNamed) {
 }
 
 TEST(CameraTables, TextsOtherThanPrintableAsciiAreNamed) {
-  EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX B\xC3\xAAta\"")),
+  EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX B\\u00EAta\"")),
             "short-prefixes, row 2: name has other characters than printable ASCII");
   EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX\\u0000Beta\"")),
             "short-prefixes, row 2: name has other characters than printable ASCII");
-  EXPECT_EQ(problemOf(with("\"QX2\"", "\"QX\xC2\xB2\"")),
+  EXPECT_EQ(problemOf(with("\"QX2\"", "\"QX\\u00B2\"")),
             "short-prefixes, row 2: prefix has other characters than printable ASCII");
 }
 

@@ -44,8 +44,25 @@ TEST(TomlReader, WhatIsNoTomlIsRefusedWithItsPlace) {
   EXPECT_EQ(problem.line, 2U);
   EXPECT_NE(problem.message, "");
   EXPECT_NE(problemIn("a = 1\na = 2").message, "none");
-  EXPECT_NE(problemIn("a = \"\xFF\"").message, "none");
   EXPECT_NE(problemIn(std::string_view("a = 1\0", 6)).message, "none");
+}
+
+TEST(TomlReader, OtherCharactersThanAsciiAreRefusedWithTheirPlace) {
+  for (const char* text : {"a = 1\nb\xC3\xA9 = 2", "a = 1\n#\xC3\xA9", "a = 1\n1\xFF", "\n \x80"}) {
+    const auto problem = problemIn(text);
+    EXPECT_EQ(problem.message, "only ASCII has a place here") << text;
+    EXPECT_EQ(problem.line, 2U) << text;
+    EXPECT_EQ(problem.column, 2U) << text;
+  }
+  EXPECT_EQ(problemIn("\xFF").column, 1U);
+  EXPECT_EQ(read("a = \"\\u00E9\""), (Dictionary{{"a", "\xC3\xA9"}}));
+}
+
+// Where the reader behind asserts what no text has promised.
+TEST(TomlReader, BracketsWithoutAKeyAreRefused) {
+  for (const char* text : {"[(", "[[(", "[(a]", "[ =", "a.= 1", "= 1", "[.a]"}) {
+    EXPECT_NE(problemIn(text).message, "none") << text;
+  }
 }
 
 TEST(TomlReader, BooleansAndDatesAreRefusedWithTheirPlace) {
@@ -71,9 +88,9 @@ TEST(TomlReader, NestingIsLimited) {
   std::string keys = "a";
   for (std::size_t i = 0; i < maxTomlOpenings; ++i) keys += ".a";
   EXPECT_EQ(read(keys + "=1").size(), 1U);
-  EXPECT_EQ(problemIn(keys + ".a=1").message, "more than 512 points and opening brackets");
+  EXPECT_EQ(problemIn(keys + ".a=1").message, "more than 256 points and opening brackets");
   EXPECT_EQ(problemIn("a = " + std::string(maxTomlOpenings + 1, '[')).message,
-            "more than 512 points and opening brackets");
+            "more than 256 points and opening brackets");
   EXPECT_NE(problemIn("a = " + std::string(maxTomlOpenings, '[')).message, "none");
 }
 

@@ -152,6 +152,23 @@ Bytes ExifBuilder::bytes() const {
   return bytes;
 }
 
+Bytes exifThatNamesDirectories(std::uint32_t count, ByteOrder order) {
+  constexpr std::uint32_t header = 6 + 8;
+  const std::uint32_t size = 2 + count * 12 + 4;
+  Bytes bytes = ExifBuilder(order).bytes();
+  bytes.resize(header);
+  for (std::uint32_t level = 1; level <= 3; ++level) {
+    ExifBuilder directory(order);
+    for (std::uint32_t i = 0; i < count; ++i)
+      directory.entry(level % 2 == 1 ? 0x8769 : 0x8825, ExifBuilder::longType, 1,
+                      directory.words({8 + level * size}, 4));
+    const Bytes whole = directory.bytes();
+    bytes.insert(bytes.end(), whole.begin() + header, whole.end());
+  }
+  append(bytes, Bytes(100, 1));  // where the last ones lead
+  return bytes;
+}
+
 StillBuilder& StillBuilder::maker(std::string_view text) {
   maker_ = text;
   return *this;
@@ -244,6 +261,8 @@ std::vector<std::pair<std::string, Bytes>> namedStills() {
                                       .segment(0xE1, bytesOf("http://example.org/"))
                                       .exif(ExifBuilder().software("other 1.0"))
                                       .bytes()},
+      {"directories-name-each-other.jpg",
+       StillBuilder().segment(0xE1, exifThatNamesDirectories(500, ByteOrder::little)).bytes()},
       {"picture-alone.jpg", picture()},
   };
 }

@@ -65,6 +65,10 @@ class ExifBuilder {
   std::vector<Entry> exif_;
 };
 
+// A segment in which each of three directories names the next one so many times: taken one by one,
+// count to the power of three ways down.
+Bytes exifThatNamesDirectories(std::uint32_t count, ByteOrder order);
+
 // A whole file: segments, a comment that holds the two texts, and a picture of 64 x 48 grey pixels.
 class StillBuilder {
  public:
