@@ -9,16 +9,16 @@
 #include <gtest/gtest.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include "oxmv/platform/WholeFile.h"
-#include "support/TempDir.h"
+#include "tests/support/ChildProcess.h"
+#include "tests/support/TempDir.h"
 
 namespace oxmv {
 namespace {
 
 namespace fs = std::filesystem;
+using test::asOrdinaryUser;
 using test::TempDir;
 using Bytes = std::vector<std::uint8_t>;
 
@@ -44,20 +44,6 @@ mode_t modeOf(const fs::path& path) {
   struct stat status = {};
   EXPECT_EQ(::lstat(path.c_str(), &status), 0);
   return status.st_mode & 07777;
-}
-
-// Runs `body` in a process of its own, as a user who may not do everything; answers whether it
-// returned true.
-template <class Body>
-bool asOrdinaryUser(Body body) {
-  const pid_t child = ::fork();
-  if (child == 0) {
-    const bool isOrdinary = ::geteuid() != 0 || (::setegid(65534) == 0 && ::seteuid(65534) == 0);
-    ::_exit(isOrdinary && body() ? 0 : 1);
-  }
-  int status = 1;
-  EXPECT_EQ(::waitpid(child, &status, 0), child);
-  return WIFEXITED(status) && WEXITSTATUS(status) == 0;
 }
 
 TEST(ReadWholeFile, GivesTheContent) {
