@@ -1,6 +1,10 @@
 #include "oxmv/host/TomlOutline.h"
 
 #include <algorithm>
+#include <string>
+#include <utility>
+
+#include "oxmv/values/Text.h"
 
 namespace oxmv {
 namespace {
@@ -38,8 +42,16 @@ class Scanner {
     at_ = std::min(text_.find('\n', at_), text_.size());
     if (at_ < text_.size()) ++at_;
   }
+  bool isAtAscii() const { return isAscii(text_.substr(at_, 1)); }
+  void note(std::string why) {
+    if (!outline_.obstacle) outline_.obstacle = {at_, std::move(why)};
+  }
   void noteDepth(std::size_t depth) {
-    if (depth > maxTomlNesting && !outline_.tooDeepAt) outline_.tooDeepAt = at_;
+    if (depth > maxTomlNesting)
+      note("nested deeper than " + std::to_string(maxTomlNesting) + " levels");
+  }
+  void noteCharacter() {
+    if (!isAtAscii()) note("a character that is not ASCII stands outside of text and comments");
   }
 
   void statement(std::size_t begin) {
@@ -48,13 +60,17 @@ class Scanner {
     found.isHeader = isAt("[");
     if (found.isHeader) at_ += isAt("[[") ? 2 : 1;
     key(found);
-    if (!found.isHeader && isAt("=")) {
+    if (found.isHeader) {
+      skip("]");
+    } else if (isAt("=")) {
       ++at_;
       skip(blanks);
       found.valueBegin = at_;
       value();
       found.valueEnd = at_;
     }
+    skip(blanks);
+    noteCharacter();
     outline_.statements.push_back(found);
   }
 
@@ -93,6 +109,7 @@ class Scanner {
         skipLine();
         continue;
       }
+      noteCharacter();
       ++at_;
       if (contains("{,=\n", c)) parts = 1;
       if (c == '.') noteDepth(++parts);
@@ -129,8 +146,25 @@ class Scanner {
       const char c = text_[at_];
       if (quotes >= 3 && (c != quote || quotes == 5)) return;
       quotes = c == quote ? quotes + 1 : 0;
-      if (c == '\\' && quote == '"' && at_ + 1 < text_.size()) ++at_;
+      if (c == '\\' && quote == '"') escape();
     }
+  }
+
+  // A backslash in a long string: goes to the last character that belongs to it, which may be the
+  // last blank before a line that continues this one.
+  void escape() {
+    const std::size_t next = at_ + 1;
+    const std::size_t end = std::min(text_.find_first_not_of(" \t\r\n", next), text_.size());
+    const bool endsLine = end > next;
+    at_ = end;
+    if (!isAtAscii()) {
+      if (endsLine) {
+        outline_.continuations.push_back(at_);
+      } else {
+        note("a character that is not ASCII stands behind a backslash");
+      }
+    }
+    if (endsLine || at_ == text_.size()) --at_;
   }
 
   std::string_view text_;

@@ -5,6 +5,7 @@
 
 #include <cstddef>
 #include <optional>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -30,10 +31,20 @@ struct TomlStatement {
   std::size_t valueEnd;
 };
 
+// What a text has that no parser must be given.
+struct TomlObstacle {
+  std::size_t at;
+  std::string why;
+};
+
 struct TomlOutline {
   std::vector<TomlStatement> statements;
-  // Where the text first nests deeper than maxTomlNesting.
-  std::optional<std::size_t> tooDeepAt;
+  // The first place where the text nests deeper than maxTomlNesting, or has a character that is not
+  // ASCII where TOML allows none: outside of strings and comments, or behind a backslash.
+  std::optional<TomlObstacle> obstacle;
+  // The characters that are not ASCII and stand first in a line that continues another, behind a
+  // backslash at its end. They are no blanks, whatever they look like.
+  std::vector<std::size_t> continuations;
 };
 
 // The outline of any text; it means something up to the first mistake of a text that is not TOML.

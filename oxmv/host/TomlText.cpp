@@ -18,6 +18,7 @@
 
 #include "oxmv/host/TomlOutline.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv {
@@ -70,13 +71,30 @@ std::size_t lineAt(std::string_view text, std::size_t offset) {
   return static_cast<std::size_t>(std::count(before.begin(), before.end(), '\n')) + 1;
 }
 
+// The same text with some characters of its strings written as escapes.
+std::string escaped(std::string text, const std::vector<std::size_t>& places) {
+  for (auto place = places.rbegin(); place != places.rend(); ++place) {
+    const Character next = firstCharacter(std::string_view(text).substr(*place));
+    if (next.isByte) continue;  // not UTF-8, which is an error anyway
+    std::string escape = "\\U00000000";
+    std::size_t digit = escape.size();
+    for (char32_t code = next.code; code != 0; code >>= 4)
+      escape[--digit] = "0123456789ABCDEF"[code & 0xF];
+    text.replace(*place, next.size, escape);
+  }
+  return text;
+}
+
 std::optional<Dictionary> parsed(std::string_view text, TomlProblem& problem) {
-  if (const auto tooDeepAt = outlineToml(text).tooDeepAt) {
-    problem = {lineAt(text, *tooDeepAt),
-               "nested deeper than " + std::to_string(maxTomlNesting) + " levels"};
+  const TomlOutline outline = outlineToml(text);
+  if (outline.obstacle) {
+    problem = {lineAt(text, outline.obstacle->at), outline.obstacle->why};
     return std::nullopt;
   }
   try {
+    // toml++ 3.3 asks whether such a character is a blank, and its answer is undefined for most.
+    if (!outline.continuations.empty())
+      return dictionaryOf(toml::parse(escaped(std::string(text), outline.continuations)));
     return dictionaryOf(toml::parse(text));
   } catch (const toml::parse_error& error) {
     problem = {error.source().begin.line, std::string(error.description())};

@@ -1,3 +1,4 @@
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -88,7 +89,10 @@ std::string nested(std::size_t depth, std::string_view open, std::string_view cl
 }
 
 TEST(TomlOutline, SaysWhereATextNestsTooDeep) {
-  const auto tooDeep = [](const std::string& text) { return outlineToml(text).tooDeepAt; };
+  const auto tooDeep = [](const std::string& text) -> std::optional<std::size_t> {
+    const auto obstacle = outlineToml(text).obstacle;
+    return obstacle ? std::optional(obstacle->at) : std::nullopt;
+  };
   EXPECT_FALSE(tooDeep(nested(maxTomlNesting, "[", "]")));
   EXPECT_EQ(tooDeep(nested(maxTomlNesting + 1, "[", "]")), 4 + maxTomlNesting + 1);
   EXPECT_FALSE(tooDeep(nested(maxTomlNesting, "{a=", "}")));
@@ -103,6 +107,29 @@ TEST(TomlOutline, SaysWhereATextNestsTooDeep) {
   EXPECT_TRUE(tooDeep(key + ".k = 1"));
   EXPECT_TRUE(tooDeep("[[" + key + ".k]]"));
   EXPECT_TRUE(tooDeep("a = { " + key + ".k = 1 }"));
+}
+
+TEST(TomlOutline, SaysWhereACharacterIsNotAsciiAndMustBe) {
+  for (const std::string text : {"é = 1", "a é = 1", "a.é = 1", "a = é", "a = 1é", "a = 1 é",
+                                 "a = 'x'é", "a = [é]", "a = [] é", "a = { é = 1 }", "[é]", "[aé]",
+                                 "[a]é", "[[a]] é", "'a'é = 1", "a = \"\"\"\\é\"\"\""}) {
+    const auto obstacle = outlineToml(text).obstacle;
+    ASSERT_TRUE(obstacle) << text;
+    EXPECT_EQ(obstacle->at, text.find('\xC3')) << text;
+  }
+  EXPECT_TRUE(outlineToml("\xEF\xBB\xBF\xEF\xBB\xBF").obstacle);
+  for (const char* text : {"# é", "'é' = 'é' # é", "\"é\".'é' = \"é\"", "[ 'é' ] # é",
+                           "a = [ # é\n'é' ]", "a = '''\né\\é'''", "a = \"\"\"\né\"\"\""}) {
+    EXPECT_FALSE(outlineToml(text).obstacle) << text;
+  }
+}
+
+TEST(TomlOutline, FindsWhatIsNotAsciiWhereALineIsContinued) {
+  const auto continuations = [](std::string_view text) { return outlineToml(text).continuations; };
+  using Places = std::vector<std::size_t>;
+  EXPECT_EQ(continuations("a = \"\"\"\\ \r\n\t\n é\"\"\""), Places{14});
+  EXPECT_EQ(continuations("a = \"\"\"x\\\né\\\ny\\\\\né\"\"\""), Places{10});
+  EXPECT_EQ(continuations("a = '''\\\né'''"), Places());
 }
 
 TEST(TomlOutline, ComesToAnEndWhereverATextIsCut) {

@@ -72,6 +72,12 @@ TEST(TomlText, LooksPastAByteOrderMark) {
             (Dictionary{{"a", 1}}));
 }
 
+TEST(TomlText, KeepsWhatALineBeginsWithThatContinuesAnother) {
+  EXPECT_EQ(
+      valuesOf("a = \"\"\"x\\\n  é\\\n\xC2\xA0\\\n\xEF\xB9\xBF\\\n\xF0\x9F\x8E\xA5\"\"\"")["a"],
+      Value("xé\xC2\xA0\xEF\xB9\xBF\xF0\x9F\x8E\xA5"));
+}
+
 TEST(TomlText, SaysWhereATextIsNotToml) {
   EXPECT_EQ(problemOf("a = 1\n\nb == 2").line, 3u);
   EXPECT_NE(problemOf("a = 1\n\nb == 2").message, "");
@@ -79,6 +85,8 @@ TEST(TomlText, SaysWhereATextIsNotToml) {
   EXPECT_EQ(problemOf("a = \"x").line, 1u);            // without end
   EXPECT_EQ(problemOf("a = 1\nb = '\xFF'").line, 2u);  // not UTF-8
   EXPECT_EQ(problemOf("a = '\xED\xA0\x80'").line, 1u);
+  EXPECT_EQ(problemOf("a = 1\né = 2").line, 2u);
+  EXPECT_NE(problemOf("a = \"\"\"\\\n\xFF\"\"\"").line, 0u);
   EXPECT_EQ(problemOf("a = \"\\uD800\"").line, 1u);
   EXPECT_EQ(problemOf(std::string("a = 1\n\0", 7)).line, 2u);
   EXPECT_EQ(problemOf("a = 1\rb = 2").line, 1u);
