@@ -9,6 +9,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include "oxmv/host/LinuxHost.h"
 #include "oxmv/host/StandardError.h"
 #include "tests/support/ChildProcess.h"
 
@@ -57,6 +58,15 @@ std::string standardErrorOf(Work work) {
 TEST(StandardError, GetsALine) {
   EXPECT_EQ(standardErrorOf([] { writeToStandardError("Error : é"); }), "Error : é\n");
   EXPECT_EQ(standardErrorOf([] { writeToStandardError(""); }), "\n");
+}
+
+TEST(StandardError, GetsAlertsAndLogLinesOfTheDefaultHost) {
+  LinuxHost host;
+  EXPECT_EQ(standardErrorOf([&] {
+              host.alert("Error : LUT (a\n.xml) has no defined table size");
+              host.log("a line");
+            }),
+            "Error : LUT (a\\x0A.xml) has no defined table size\na line\n");
 }
 
 TEST(StandardError, GetsNoControlCharacters) {
