@@ -84,6 +84,7 @@ class Scanner {
       } else {
         skip(bareKeyCharacters);
       }
+      if (at_ == begin) note("a key is missing");
       if (parts == 1) found.firstKey = text_.substr(begin, at_ - begin);
       noteDepth(parts);
       skip(blanks);

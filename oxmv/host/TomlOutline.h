@@ -39,8 +39,9 @@ struct TomlObstacle {
 
 struct TomlOutline {
   std::vector<TomlStatement> statements;
-  // The first place where the text nests deeper than maxTomlNesting, or has a character that is not
-  // ASCII where TOML allows none: outside of strings and comments, or behind a backslash.
+  // The first place where the text nests deeper than maxTomlNesting, lacks a key (toml++ 3.3 relies
+  // on one behind "["), or has a character that is not ASCII where TOML allows none: outside of
+  // strings and comments, or behind a backslash.
   std::optional<TomlObstacle> obstacle;
   // The characters that are not ASCII and stand first in a line that continues another, behind a
   // backslash at its end. They are no blanks, whatever they look like.

@@ -124,6 +124,14 @@ TEST(TomlOutline, SaysWhereACharacterIsNotAsciiAndMustBe) {
   }
 }
 
+TEST(TomlOutline, SaysWhereAKeyIsMissing) {
+  for (const char* text : {"= 1", "[=]", "[]", "[[]]", "[", "[.a]", "[a.]", "a. = 1", ".a = 1"}) {
+    const auto obstacle = outlineToml(text).obstacle;
+    ASSERT_TRUE(obstacle) << text;
+    EXPECT_EQ(obstacle->why, "a key is missing") << text;
+  }
+}
+
 TEST(TomlOutline, FindsWhatIsNotAsciiWhereALineIsContinued) {
   const auto continuations = [](std::string_view text) { return outlineToml(text).continuations; };
   using Places = std::vector<std::size_t>;
