@@ -1,6 +1,7 @@
 #include "oxmv/host/LinuxHost.h"
 
 #include <optional>
+#include <utility>
 
 #include <libintl.h>
 

@@ -31,24 +31,24 @@ struct TomlStatement {
   std::size_t valueEnd;
 };
 
-// What a text has that no parser must be given.
-struct TomlObstacle {
+// Why a text is not TOML.
+struct TomlMistake {
   std::size_t at;
   std::string why;
 };
 
 struct TomlOutline {
   std::vector<TomlStatement> statements;
-  // The first place where the text nests deeper than maxTomlNesting, lacks a key (toml++ 3.3 relies
-  // on one behind "["), or has a character that is not ASCII where TOML allows none: outside of
-  // strings and comments, or behind a backslash.
-  std::optional<TomlObstacle> obstacle;
+  // The first place where the text nests deeper than maxTomlNesting or breaks TOML's grammar, as far
+  // as that is about keys, brackets, commas, quotes and lines; not: what a number or a date looks
+  // like, or whether a key stands there twice. The outline ends there.
+  std::optional<TomlMistake> mistake;
   // The characters that are not ASCII and stand first in a line that continues another, behind a
   // backslash at its end. They are no blanks, whatever they look like.
   std::vector<std::size_t> continuations;
 };
 
-// The outline of any text; it means something up to the first mistake of a text that is not TOML.
+// The outline of any text. No other parser need be trusted with one in which this finds a mistake.
 TomlOutline outlineToml(std::string_view text);
 
 // The size of the byte order mark at the start of a text: 3, or 0 when there is none.

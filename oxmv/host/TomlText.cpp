@@ -11,9 +11,11 @@
 #include <utility>
 #include <vector>
 
-// As it comes, so that a host that uses it, too, has one and the same. Compiled in here: those who
-// link with us need not know of it.
+// Compiled in here, so that those who link with us need not know of it. Without exceptions, because
+// its own ends the process when there is no memory for its message; otherwise as it comes, so that a
+// host that uses it, too, has one and the same.
 #define TOML_HEADER_ONLY 1
+#define TOML_EXCEPTIONS 0
 #include <toml++/toml.h>
 
 #include "oxmv/host/TomlOutline.h"
@@ -87,19 +89,19 @@ std::string escaped(std::string text, const std::vector<std::size_t>& places) {
 
 std::optional<Dictionary> parsed(std::string_view text, TomlProblem& problem) {
   const TomlOutline outline = outlineToml(text);
-  if (outline.obstacle) {
-    problem = {lineAt(text, outline.obstacle->at), outline.obstacle->why};
+  if (outline.mistake) {
+    problem = {lineAt(text, outline.mistake->at), outline.mistake->why};
     return std::nullopt;
   }
-  try {
-    // toml++ 3.3 asks whether such a character is a blank, and its answer is undefined for most.
-    if (!outline.continuations.empty())
-      return dictionaryOf(toml::parse(escaped(std::string(text), outline.continuations)));
-    return dictionaryOf(toml::parse(text));
-  } catch (const toml::parse_error& error) {
-    problem = {error.source().begin.line, std::string(error.description())};
-    return std::nullopt;
-  }
+  // toml++ 3.3 asks whether such a character is a blank, and its answer is undefined for most.
+  const toml::parse_result result =
+      outline.continuations.empty()
+          ? toml::parse(text)
+          : toml::parse(escaped(std::string(text), outline.continuations));
+  if (result) return dictionaryOf(result.table());
+  const toml::parse_error& error = result.error();
+  problem = {error.source().begin.line, std::string(error.description())};
+  return std::nullopt;
 }
 
 // From values to TOML.
@@ -199,7 +201,7 @@ std::string keyOf(std::string_view written) {
   if (!isQuoted) return std::string(written);
   if (written[0] == '\'' || written.find('\\') == std::string_view::npos)
     return std::string(written.substr(1, written.size() - 2));
-  return std::string(toml::parse(std::string(written) + "=0").begin()->first.str());
+  return std::string(toml::parse(std::string(written) + "=0").table().begin()->first.str());
 }
 
 std::string_view lineEndOf(std::string_view text) {

@@ -90,11 +90,11 @@ std::string nested(std::size_t depth, std::string_view open, std::string_view cl
 
 TEST(TomlOutline, SaysWhereATextNestsTooDeep) {
   const auto tooDeep = [](const std::string& text) -> std::optional<std::size_t> {
-    const auto obstacle = outlineToml(text).obstacle;
-    return obstacle ? std::optional(obstacle->at) : std::nullopt;
+    const auto mistake = outlineToml(text).mistake;
+    return mistake ? std::optional(mistake->at) : std::nullopt;
   };
   EXPECT_FALSE(tooDeep(nested(maxTomlNesting, "[", "]")));
-  EXPECT_EQ(tooDeep(nested(maxTomlNesting + 1, "[", "]")), 4 + maxTomlNesting + 1);
+  EXPECT_EQ(tooDeep(nested(maxTomlNesting + 1, "[", "]")), 4 + maxTomlNesting);
   EXPECT_FALSE(tooDeep(nested(maxTomlNesting, "{a=", "}")));
   EXPECT_TRUE(tooDeep(nested(maxTomlNesting + 1, "{a=", "}")));
 
@@ -110,25 +110,58 @@ TEST(TomlOutline, SaysWhereATextNestsTooDeep) {
 }
 
 TEST(TomlOutline, SaysWhereACharacterIsNotAsciiAndMustBe) {
-  for (const std::string text : {"é = 1", "a é = 1", "a.é = 1", "a = é", "a = 1é", "a = 1 é",
-                                 "a = 'x'é", "a = [é]", "a = [] é", "a = { é = 1 }", "[é]", "[aé]",
-                                 "[a]é", "[[a]] é", "'a'é = 1", "a = \"\"\"\\é\"\"\""}) {
-    const auto obstacle = outlineToml(text).obstacle;
-    ASSERT_TRUE(obstacle) << text;
-    EXPECT_EQ(obstacle->at, text.find('\xC3')) << text;
+  for (const std::string text :
+       {"é = 1", "a é = 1", "a.é = 1", "a = é", "a = 1é", "a = 1 é", "a = 'x'é", "a = [é]",
+        "a = [] é", "a = { é = 1 }", "[é]", "[aé]", "[a]é", "[[a]] é", "'a'é = 1"}) {
+    const auto mistake = outlineToml(text).mistake;
+    ASSERT_TRUE(mistake) << text;
+    EXPECT_EQ(mistake->at, text.find('\xC3')) << text;
   }
-  EXPECT_TRUE(outlineToml("\xEF\xBB\xBF\xEF\xBB\xBF").obstacle);
+  EXPECT_TRUE(outlineToml("\xEF\xBB\xBF\xEF\xBB\xBF").mistake);
   for (const char* text : {"# é", "'é' = 'é' # é", "\"é\".'é' = \"é\"", "[ 'é' ] # é",
                            "a = [ # é\n'é' ]", "a = '''\né\\é'''", "a = \"\"\"\né\"\"\""}) {
-    EXPECT_FALSE(outlineToml(text).obstacle) << text;
+    EXPECT_FALSE(outlineToml(text).mistake) << text;
   }
 }
 
-TEST(TomlOutline, SaysWhereAKeyIsMissing) {
-  for (const char* text : {"= 1", "[=]", "[]", "[[]]", "[", "[.a]", "[a.]", "a. = 1", ".a = 1"}) {
-    const auto obstacle = outlineToml(text).obstacle;
-    ASSERT_TRUE(obstacle) << text;
-    EXPECT_EQ(obstacle->why, "a key is missing") << text;
+std::string mistakeIn(std::string_view text) {
+  const auto mistake = outlineToml(text).mistake;
+  return mistake ? mistake->why + ", at " + std::to_string(mistake->at) : "none";
+}
+
+TEST(TomlOutline, SaysWhatBreaksTheGrammar) {
+  EXPECT_EQ(mistakeIn("= 1"), "expected a key, at 0");
+  EXPECT_EQ(mistakeIn("[]"), "expected a key, at 1");
+  EXPECT_EQ(mistakeIn("[.a]"), "expected a key, at 1");
+  EXPECT_EQ(mistakeIn("a. = 1"), "expected a key, at 3");
+  EXPECT_EQ(mistakeIn("a = { b = 1, }"), "expected a key, at 13");
+  EXPECT_EQ(mistakeIn("a"), "expected '=', at 1");
+  EXPECT_EQ(mistakeIn("a b = 1"), "expected '=', at 2");
+  EXPECT_EQ(mistakeIn("[a"), "expected ']', at 2");
+  EXPECT_EQ(mistakeIn("[[a]"), "expected ']]', at 3");
+  EXPECT_EQ(mistakeIn("[ [a]]"), "expected a key, at 2");
+  EXPECT_EQ(mistakeIn("a ="), "expected a value, at 3");
+  EXPECT_EQ(mistakeIn("a = # 1"), "expected a value, at 4");
+  EXPECT_EQ(mistakeIn("a = [,]"), "expected a value, at 5");
+  EXPECT_EQ(mistakeIn("a = [1,,]"), "expected a value, at 7");
+  EXPECT_EQ(mistakeIn("a = [1 2]"), "expected ',' or ']', at 7");
+  EXPECT_EQ(mistakeIn("a = [ # 1 ]"), "expected ',' or ']', at 11");
+  EXPECT_EQ(mistakeIn("a = { b = 1\n}"), "expected ',' or '}', at 11");
+  EXPECT_EQ(mistakeIn("a = 1 b = 2"), "expected the end of the line, at 6");
+  EXPECT_EQ(mistakeIn("[a] b = 2"), "expected the end of the line, at 4");
+  EXPECT_EQ(mistakeIn("a = 1\rb = 2"), "expected the end of the line, at 5");
+  EXPECT_EQ(mistakeIn("a = 'x\n'"), "a string without an end, at 6");
+  EXPECT_EQ(mistakeIn("a = \"x\\\"\n"), "a string without an end, at 8");
+  EXPECT_EQ(mistakeIn("a = \"\"\"x\"\""), "a string without an end, at 10");
+  EXPECT_EQ(mistakeIn("a = '''x\n"), "a string without an end, at 9");
+  EXPECT_EQ(mistakeIn("a = \"\"\"\\é\"\"\""), "no escape begins like this, at 7");
+}
+
+TEST(TomlOutline, FindsNoMistakeInWhatIsAllowed) {
+  for (const char* text : {"a = [1, 2,]", "a = [\n# 1\r\n\r\n1 # 2\n,\n]", "a = {}", "a = { }",
+                           "a={b=1,c.d=[{}]}", "[ a . 'b' ]", "[[a]]#", "\t\r\n", "a = '''\n'''",
+                           "a = \"\"\"\\\"\"\"\"", "a = 1979-05-27 07:32:00Z", "a = +1_0.5e-3"}) {
+    EXPECT_EQ(mistakeIn(text), "none") << text;
   }
 }
 

@@ -1,5 +1,6 @@
 #include <cstdint>
 #include <limits>
+#include <new>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -9,6 +10,7 @@
 #include "oxmv/host/TomlOutline.h"
 #include "oxmv/host/TomlText.h"
 #include "oxmv/values/Array.h"
+#include "tests/support/Memory.h"
 #include "tests/support/Printing.h"
 #include "tests/support/SmallStack.h"
 #include "tests/support/StreamBuilder.h"
@@ -288,6 +290,26 @@ TEST(TomlText, RefusesValuesThatHaveNoForm) {
   for (std::size_t i = 0; i < maxTomlNesting; ++i) deep = Array::of(deep);
   EXPECT_NE(with("", "a", deep), "refused");
   EXPECT_EQ(with("", "a", Array::of(deep)), "refused");
+}
+
+TEST(TomlText, ThrowsOnlyWhenThereIsNoMemory) {
+  const std::string text =
+      "a = \"\"\"a text that is too long to be kept in place\\\n "
+      "é\"\"\"\n[a-long-key-that-takes-memory.b]\n"
+      "c = [1979-05-27, { d = 1 }]\n";
+  const std::string wrong = text + "[[a-long-key-that-takes-memory]]\n";
+  for (const std::string& each : {text, wrong}) {
+    bool wasFelt = true;
+    for (std::size_t granted = 0; wasFelt; ++granted) {
+      const test::MemoryShortage shortage(granted);
+      try {
+        const auto parsed = TomlText::parse(each);
+        if (parsed) (void)parsed->with("another long key that takes memory", "a value");
+      } catch (const std::bad_alloc&) {
+      }
+      wasFelt = shortage.wasFelt();
+    }
+  }
 }
 
 TEST(TomlText, ReadsOrRefusesATextWhereverItIsCut) {
