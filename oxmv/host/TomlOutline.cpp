@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "oxmv/host/TomlScalar.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv {
@@ -165,6 +166,10 @@ class Scanner {
     if (isDate && next.size() == 2 && next[0] == ' ' && '0' <= next[1] && next[1] <= '9') {
       ++at_;
       skip(scalarCharacters);
+    }
+    if (!isTomlScalar(text_.substr(begin, at_ - begin))) {
+      at_ = begin;
+      fail("neither a text, a boolean, a number nor a date");
     }
   }
 

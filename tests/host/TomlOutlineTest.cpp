@@ -142,6 +142,8 @@ TEST(TomlOutline, SaysWhatBreaksTheGrammar) {
   EXPECT_EQ(mistakeIn("[ [a]]"), "expected a key, at 2");
   EXPECT_EQ(mistakeIn("a ="), "expected a value, at 3");
   EXPECT_EQ(mistakeIn("a = # 1"), "expected a value, at 4");
+  EXPECT_EQ(mistakeIn("a = 1.2.3"), "neither a text, a boolean, a number nor a date, at 4");
+  EXPECT_EQ(mistakeIn("a = 1979-05-27 0#"), "neither a text, a boolean, a number nor a date, at 4");
   EXPECT_EQ(mistakeIn("a = [,]"), "expected a value, at 5");
   EXPECT_EQ(mistakeIn("a = [1,,]"), "expected a value, at 7");
   EXPECT_EQ(mistakeIn("a = [1 2]"), "expected ',' or ']', at 7");
