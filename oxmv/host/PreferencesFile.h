@@ -8,8 +8,8 @@
 //   LUTsPath = "/mnt/looks"
 //   OverridePath = "/Library/Application Support/Ombrix"
 //
-// The environment is read at every call (XDG Base Directory Specification: unset and empty are the
-// same, folders that are not absolute are ignored).
+// The environment is read at every call, by the rules of the XDG base directories: unset and empty
+// are the same, folders that are not absolute are ignored.
 
 #pragma once
 
