@@ -4,10 +4,10 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Flags.h"
 #include "cli/TagNames.h"
 #include "cli/ValueText.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -11,7 +11,6 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
-#include "cli/Characters.h"
 #include "cli/ClipOutput.h"
 #include "cli/Inputs.h"
 #include "cli/JsonResults.h"
@@ -22,6 +21,7 @@
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/platform/CreationTime.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -4,7 +4,7 @@
 #include <optional>
 #include <utility>
 
-#include "oxmv/platform/TomlReader.h"
+#include "oxmv/platform/TomlText.h"
 #include "oxmv/values/Array.h"
 #include "oxmv/values/Dictionary.h"
 
@@ -16,6 +16,8 @@ extern const std::string_view builtInCameras;
 namespace {
 
 using Problem = CameraTablesProblem;
+
+constexpr std::size_t maxSize = std::size_t{64} << 10;
 
 bool isLetter(char c) { return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z'); }
 bool isDigit(char c) { return c >= '0' && c <= '9'; }
@@ -113,12 +115,6 @@ std::optional<Problem> readTable(const Dictionary& document, const std::string& 
   return std::nullopt;
 }
 
-std::string inWords(const TomlProblem& problem) {
-  if (problem.line == 0) return problem.message;
-  return "line " + std::to_string(problem.line) + ", column " + std::to_string(problem.column) +
-         ": " + problem.message;
-}
-
 }  // namespace
 
 const CameraTables& CameraTables::builtIn() {
@@ -130,9 +126,11 @@ const CameraTables& CameraTables::builtIn() {
 }
 
 std::variant<CameraTables, CameraTablesProblem> CameraTables::fromText(std::string_view toml) {
-  const auto read = readToml(toml);
-  if (const auto* problem = std::get_if<TomlProblem>(&read)) return Problem{inWords(*problem)};
-  const auto& document = std::get<Dictionary>(read);
+  if (toml.size() > maxSize) return Problem{"larger than 64 KiB"};
+  TomlProblem mistake;
+  const auto text = TomlText::parse(std::string(toml), &mistake);
+  if (!text) return Problem{"line " + std::to_string(mistake.line) + ": " + mistake.message};
+  const Dictionary& document = text->values();
 
   CameraTables tables;
   auto problem = readTable(document, "short-prefixes", tables.shortPrefixes_, shortRow);

@@ -43,8 +43,8 @@ class CameraTables {
 
   static const CameraTables& builtIn();
 
-  // Exactly the three tables, each with exactly its rows. For threads with a stack of at least 512
-  // KiB: a text may nest.
+  // Exactly the three tables, each with exactly its rows, in a text of at most 64 KiB: tables that
+  // people write are far smaller.
   static std::variant<CameraTables, CameraTablesProblem> fromText(std::string_view toml);
 
   const std::array<FirmwareRow, 2>& shortPrefixes() const { return shortPrefixes_; }

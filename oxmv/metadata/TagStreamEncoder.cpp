@@ -89,9 +89,7 @@ class Encoder {
       case Write::text:
         if (!value.text().empty()) putText(row.tag, value.text(), 1);
         break;
-      case Write::float32:
-        putWord(row.tag, recordType::floats, value.floatBits());
-        break;
+      case Write::float32: putWord(row.tag, recordType::floats, value.floatBits()); break;
       case Write::integerH:
       case Write::integerL:
       case Write::integerR:

@@ -74,8 +74,17 @@ TEST(CameraTables, AnotherFileOfTheSameShapeIsTaken) {
 }
 
 TEST(CameraTables, WhatIsNoTomlIsRefusedWithItsPlace) {
-  EXPECT_TRUE(problemOf("short-prefixes = [\n  {prefix = }\n]").starts_with("line 2, column "))
+  EXPECT_TRUE(problemOf("short-prefixes = [\n  {prefix = }\n]").starts_with("line 2: "))
       << problemOf("short-prefixes = [\n  {prefix = }\n]");
+}
+
+TEST(CameraTables, AHugeTextIsRefused) {
+  EXPECT_EQ(problemOf(std::string(64 * 1024 + 1, '\n')), "larger than 64 KiB");
+  EXPECT_EQ(problemOf(std::string(64 * 1024, '\n')), "short-prefixes has 0 rows, not 2");
+}
+
+TEST(CameraTables, ATextThatNestsIsRefused) {
+  EXPECT_TRUE(problemOf("a = " + std::string(60'000, '[')).starts_with("line 1: nested deeper"));
 }
 
 TEST(CameraTables, ATableWithOtherRowsIsRefused) {
