@@ -10,25 +10,26 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
+#include "cli/ClipNames.h"
+#include "cli/Clips.h"
 #include "cli/Inputs.h"
 #include "cli/TagJson.h"
 #include "cli/ValueText.h"
 #include "cli/Verb.h"
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
-#include "oxmv/platform/WholeFile.h"
 
 namespace oxmv::cli {
 namespace {
 
-constexpr std::string_view standardOutput = "-";
-
-void checkOutput(const Call& call, const std::string& input) {
+ClipName outputOf(const Call& call, const std::string& input) {
   if (!call.arguments.has(Flag::output))
     throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
+  ClipName output = writableClipNameFrom(call.arguments.value(Flag::output));
   std::error_code ignored;  // what is not there is not the same
-  if (std::filesystem::equivalent(input, call.arguments.value(Flag::output), ignored))
+  if (std::filesystem::equivalent(input, output.path, ignored))
     throw UsageError("same-file", "the output would take the place of the input");
+  return output;
 }
 
 std::optional<Dictionary> readTags(Call& call, const std::string& name) {
@@ -47,23 +48,25 @@ std::optional<Dictionary> readTags(Call& call, const std::string& name) {
   return std::get<Dictionary>(std::move(tags));
 }
 
-void write(Call& call, const std::string& output, const Bytes& stream) {
+void write(Call& call, const ClipName& output, const Bytes& stream) {
   if (call.arguments.has(Flag::dryRun))
-    return call.messages.note(output, fmt::format("would get {}", counted(stream.size(), "byte")));
-  if (output == standardOutput) return call.output.write(asText(stream));
+    return call.messages.note(output.word,
+                              fmt::format("would get {}", counted(stream.size(), "byte")));
+  if (output.kind == ClipName::Kind::standardStream) return call.output.write(asText(stream));
   std::error_code error;
-  if (!writeWholeFile(output, stream, error))
-    return call.messages.error(output, error.message(), "write-failed");
-  call.messages.note(output, fmt::format("got {}", counted(stream.size(), "byte")));
+  if (writeClip(output, stream, error)) {
+    call.messages.note(output.word, fmt::format("got {}", counted(stream.size(), "byte")));
+  } else {
+    sayWriteFailed(call, output, error);
+  }
 }
 
 void run(Call& call) {
   const std::string& input = call.words.front();
   const Layout layout = layoutOf(call.arguments);
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
-  checkOutput(call, input);
-  const std::string output = call.arguments.value(Flag::output);
-  if (output == standardOutput && StandardOutput::isTerminal())
+  const ClipName output = outputOf(call, input);
+  if (output.kind == ClipName::Kind::standardStream && StandardOutput::isTerminal())
     return call.messages.refused("standard output", "a clip is binary, and this is a terminal",
                                  "binary-to-terminal");
 
@@ -85,13 +88,15 @@ const Verb encodeVerb = {
     .summary = "make a clip of tags in JSON",
     .examples =
         "oxmv encode tags.json -o clip.colr\n"
-        "oxmv encode tags.json -o clip.colr --layout readable\n",
+        "oxmv encode tags.json -o clip.colr --layout readable\n"
+        "oxmv encode tags.json -o 0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F\n",
     .details =
-        "Tags that would not read back as they are in FILE.json are refused, each with a code,\n"
-        "and nothing is written; --allow CODE lets losses of that code through. The layout\n"
-        "\"exact\" is what writers of clips have always made; \"readable\" pads all records, so\n"
-        "that data of any size read back. A file that is there is replaced, whole or not at\n"
-        "all. What is wrong with FILE.json is said with its line and column.\n",
+        "OUT names a clip as in oxmv help show, but for @last. Tags that would not read back as\n"
+        "they are in FILE.json are refused, each with a code, and nothing is written; --allow\n"
+        "CODE lets losses of that code through. The layout \"exact\" is what writers of clips\n"
+        "have always made; \"readable\" pads all records, so that data of any size read back. A\n"
+        "file that is there is replaced, whole or not at all; the file of an eye without tags is\n"
+        "removed. What is wrong with FILE.json is said with its line and column.\n",
     .flags = flags,
     .fewestWords = 1,
     .mostWords = 1,
