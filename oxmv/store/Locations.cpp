@@ -55,6 +55,12 @@ std::string lastFilePath(std::string_view appID) {
   return overrideFolder(*host(), appID) + "/last";
 }
 
+std::string databaseFolderPath(std::string_view appID) {
+  const auto current = host();
+  const std::string luts = lookUp(lutsFolderSetting, *current, appID).value;
+  return luts + '/' + lookUp(databaseFolderSetting, *current, appID).value;
+}
+
 std::string clipFilePath(const myGUID& guid, std::string_view appID) {
   return guidPath(clipTemplateSetting, guid, nullptr, appID);
 }

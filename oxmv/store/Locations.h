@@ -63,6 +63,9 @@ std::string overrideFilePath(std::string_view appID);
 // The "last" file. Stores the default of the folder likewise.
 std::string lastFilePath(std::string_view appID);
 
+// The folder of the clip database, in which the clips below are unless a template says otherwise.
+std::string databaseFolderPath(std::string_view appID);
+
 // A clip's combined file.
 std::string clipFilePath(const myGUID& guid, std::string_view appID);
 
