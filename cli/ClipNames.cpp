@@ -12,6 +12,7 @@
 #include "cli/Characters.h"
 #include "cli/Inputs.h"
 #include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/store/ClipFileName.h"
 #include "oxmv/store/Locations.h"
 
 namespace oxmv::cli {
@@ -20,9 +21,6 @@ namespace {
 using Kind = ClipName::Kind;
 
 constexpr std::size_t guidSize = 36;
-
-// Names count eyes from 1, as signed numbers of 32 bits.
-constexpr std::size_t lastEye = 0x7FFFFFFE;
 
 std::optional<std::size_t> numberFrom(std::string_view text) {
   std::size_t number = 0;
@@ -40,7 +38,8 @@ std::string eyeText(std::size_t eye) {
 std::size_t eyeFrom(std::string_view text, std::string_view what) {
   if (text == "left") return 0;
   if (text == "right") return 1;
-  if (const auto number = numberFrom(text); number && *number <= lastEye) return *number;
+  if (const auto number = numberFrom(text); number && *number <= ClipFileName::lastEye)
+    return *number;
   throw UsageError("bad-eye",
                    fmt::format("{} takes left, right, or the index of an eye (0 left, 1 right), "
                                "not \"{}\"",

@@ -8,6 +8,7 @@
 #include <fmt/format.h>
 
 #include "cli/Clips.h"
+#include "cli/Columns.h"
 #include "cli/Csv.h"
 #include "cli/Findings.h"
 #include "cli/Inputs.h"
@@ -111,8 +112,9 @@ class AsJson final : public Presentation {
 
 class AsCsv final : public Presentation {
  public:
-  explicit AsCsv(Call& call) : csv_(call.output, call.arguments.value(Flag::columns)) {}
-  void add(const ClipName& name, const Clip& clip) override { csv_.add(name.word, clip.tags); }
+  explicit AsCsv(Call& call)
+      : csv_(call.output, {"file"}, columnsFrom(call.arguments.value(Flag::columns))) {}
+  void add(const ClipName& name, const Clip& clip) override { csv_.add({name.word}, clip.tags); }
 
  private:
   CsvWriter csv_;

@@ -11,9 +11,10 @@
 namespace oxmv::cli {
 namespace {
 
-constexpr auto all = std::to_array<const Verb*>({&showVerb, &getVerb, &setVerb, &unsetVerb,
-                                                 &diffVerb, &dumpVerb, &checkVerb, &encodeVerb,
-                                                 &tagsVerb, &demoVerb, &helpVerb, &versionVerb});
+constexpr auto all = std::to_array<const Verb*>(
+    {&showVerb, &getVerb, &setVerb, &unsetVerb, &diffVerb, &dumpVerb, &checkVerb, &encodeVerb,
+     &tagsVerb, &dbListVerb, &dbShowVerb, &dbCheckVerb, &dbPathVerb, &dbInitVerb, &demoVerb,
+     &helpVerb, &versionVerb});
 
 std::string_view firstWord(std::string_view name) { return name.substr(0, name.find(' ')); }
 
