@@ -6,7 +6,7 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -8,11 +8,11 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
-#include "cli/Characters.h"
 #include "cli/Differences.h"
 #include "cli/ValueText.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/platform/WholeFile.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -9,11 +9,11 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Inputs.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/store/ClipFileName.h"
 #include "oxmv/store/Locations.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -3,8 +3,8 @@
 #include <string>
 #include <utility>
 
-#include "cli/Characters.h"
 #include "cli/ValueText.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

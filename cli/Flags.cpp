@@ -6,8 +6,8 @@
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Nearest.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

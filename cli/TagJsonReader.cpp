@@ -11,10 +11,10 @@
 #include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
-#include "cli/Characters.h"
 #include "cli/TagJson.h"
 #include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

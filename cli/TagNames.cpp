@@ -6,9 +6,9 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Flags.h"
 #include "cli/Nearest.h"
+#include "oxmv/values/Characters.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::cli {

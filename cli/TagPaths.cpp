@@ -2,10 +2,10 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Flags.h"
 #include "cli/TagNames.h"
 #include "oxmv/metadata/Tag.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -8,10 +8,10 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/TagPaths.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

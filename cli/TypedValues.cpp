@@ -11,10 +11,10 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/TagJson.h"
 #include "cli/ValueText.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::cli {

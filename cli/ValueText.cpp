@@ -6,9 +6,9 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/TagJson.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 #include "oxmv/values/Dictionary.h"
 
 namespace oxmv::cli {

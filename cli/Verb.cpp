@@ -5,8 +5,8 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Nearest.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

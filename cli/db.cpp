@@ -7,7 +7,6 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/ClipNames.h"
 #include "cli/CommandHost.h"
 #include "cli/Database.h"
@@ -15,6 +14,7 @@
 #include "cli/Verb.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/store/Locations.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -11,7 +11,6 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Columns.h"
 #include "cli/Csv.h"
 #include "cli/Database.h"
@@ -22,6 +21,7 @@
 #include "cli/Verb.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamFormat.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {
@@ -91,7 +91,7 @@ class Table final : public Listing {
     for (const Column& column : columns_) {
       const Value value = (*tags)[column.key];
       const std::string text = value.isNothing() ? "-" : inLine(value, Extent::abbreviated);
-      const std::size_t width = cli::columns(text);
+      const std::size_t width = oxmv::columns(text);
       line += "  " + text;
       line.append(widthOf(column) - std::min(widthOf(column), width), ' ');
     }

@@ -9,7 +9,6 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/DemoClips.h"
 #include "cli/Inputs.h"
 #include "cli/TagJson.h"
@@ -17,6 +16,7 @@
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/platform/WholeFile.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -9,7 +9,6 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/Clips.h"
 #include "cli/JsonResults.h"
 #include "cli/TagJson.h"
@@ -17,6 +16,7 @@
 #include "cli/ValueText.h"
 #include "cli/Verb.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

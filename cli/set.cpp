@@ -11,7 +11,6 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
-#include "cli/Characters.h"
 #include "cli/ClipEdit.h"
 #include "cli/TagPaths.h"
 #include "cli/TypedValues.h"
@@ -20,6 +19,7 @@
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/values/Array.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

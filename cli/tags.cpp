@@ -6,11 +6,11 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/JsonResults.h"
 #include "cli/TagNames.h"
 #include "cli/Verb.h"
 #include "oxmv/metadata/TagTable.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -4,10 +4,10 @@
 
 #include <fmt/format.h>
 
-#include "cli/Characters.h"
 #include "cli/ClipEdit.h"
 #include "cli/TagPaths.h"
 #include "cli/Verb.h"
+#include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
 namespace {

@@ -8,6 +8,7 @@
 
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/platform/WholeFile.h"
+#include "tests/support/ChildProcess.h"
 #include "tests/support/FakeHost.h"
 #include "tests/support/Files.h"
 #include "tests/support/Memory.h"

@@ -17,14 +17,6 @@
 namespace oxmv::test {
 namespace {
 
-#if defined(__SANITIZE_ADDRESS__)
-#define OXMV_ADDRESS_SANITIZER
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer)
-#define OXMV_ADDRESS_SANITIZER
-#endif
-#endif
-
 #ifdef OXMV_ADDRESS_SANITIZER
 // The sanitizer surrounds every variable with bytes that nobody may touch, which makes each of the
 // 64 frames of a deep stream several times larger.

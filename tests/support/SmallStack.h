@@ -5,6 +5,15 @@
 #include <cstddef>
 #include <functional>
 
+// Whether the address sanitizer is at work, which needs several times as much of a stack.
+#if defined(__SANITIZE_ADDRESS__)
+#define OXMV_ADDRESS_SANITIZER
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define OXMV_ADDRESS_SANITIZER
+#endif
+#endif
+
 namespace oxmv::test {
 
 // Runs `work` on a thread of its own with a stack of `size` bytes, and answers how many of them

@@ -1,4 +1,4 @@
-// The characters of a text, and which of them a terminal must not get: a value comes from somebody
+// The characters of a text, and which of them a terminal must not get: a text comes from somebody
 // else's file, and must neither move the cursor nor turn a line around.
 
 #pragma once
@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-namespace oxmv::cli {
+namespace oxmv {
 
 // One character of a UTF-8 text, or one byte that belongs to none.
 struct Character {
@@ -32,4 +32,4 @@ std::string visible(std::string_view text);
 // How many columns a visible text takes, where each character takes one.
 std::size_t columns(std::string_view text) noexcept;
 
-}  // namespace oxmv::cli
+}  // namespace oxmv

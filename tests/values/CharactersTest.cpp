@@ -2,9 +2,9 @@
 
 #include <gtest/gtest.h>
 
-#include "cli/Characters.h"
+#include "oxmv/values/Characters.h"
 
-namespace oxmv::cli::test {
+namespace oxmv {
 namespace {
 
 TEST(Characters, KeepWhatCanBeSeen) {
@@ -46,4 +46,4 @@ TEST(Characters, TakeAColumnEach) {
 }
 
 }  // namespace
-}  // namespace oxmv::cli::test
+}  // namespace oxmv

@@ -1,14 +1,20 @@
-#include "cli/Characters.h"
+#include "oxmv/values/Characters.h"
 
 #include <algorithm>
 #include <cstdint>
 
-#include <fmt/format.h>
-
 #include "oxmv/values/Text.h"
 
-namespace oxmv::cli {
+namespace oxmv {
 namespace {
+
+// As many hexadecimal digits as the number has, but at least `width`.
+std::string hexadecimal(char32_t number, std::size_t width) {
+  std::string digits;
+  for (; number != 0 || digits.size() < width; number >>= 4)
+    digits.insert(digits.begin(), "0123456789ABCDEF"[number & 0xF]);
+  return digits;
+}
 
 std::size_t lengthOfSequence(std::uint8_t lead) {
   if (lead < 0x80) return 1;
@@ -49,9 +55,9 @@ std::string visible(std::string_view text) {
   while (!text.empty()) {
     const Character next = firstCharacter(text);
     if (next.isByte || (isHidden(next.code) && next.code < 0x80)) {
-      shown += fmt::format("\\x{:02X}", static_cast<std::uint32_t>(next.code));
+      shown += "\\x" + hexadecimal(next.code, 2);
     } else if (isHidden(next.code)) {
-      shown += fmt::format("\\u{{{:04X}}}", static_cast<std::uint32_t>(next.code));
+      shown += "\\u{" + hexadecimal(next.code, 4) + "}";
     } else {
       shown += text.substr(0, next.size);
     }
@@ -66,4 +72,4 @@ std::size_t columns(std::string_view text) noexcept {
   }));
 }
 
-}  // namespace oxmv::cli
+}  // namespace oxmv
