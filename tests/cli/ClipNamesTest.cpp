@@ -5,6 +5,7 @@
 
 #include "tests/cli/CommandRunner.h"
 #include "tests/cli/TemporaryDatabase.h"
+#include "tests/cli/UserFolders.h"
 #include "tests/support/StreamBuilder.h"
 
 namespace oxmv::cli::test {
@@ -210,6 +211,106 @@ TEST(ClipNames, EncodeKeepsNoFileOfAnEyeWithoutTags) {
               0);
     EXPECT_FALSE(std::filesystem::exists(database.folder() / (guid + ".col1")));
   }
+}
+
+// A user whose override folder is the folders' root.
+class OverrideFolder : public testing::Test {
+ protected:
+  OverrideFolder() { user.setPreferences("OverridePath = \"" + user.root().string() + "\"\n"); }
+
+  // The "last" file of a build with a long of 64 bits.
+  void putLast(const std::string& stream) {
+    const std::string head =
+        std::string("\x3D\x2C\x1B\x0A\0\0\0\0\x5F\x4E\x07\x06\x08\x09\xAA\xBB\xCC\xDD\xEE\x0F",
+                    20) +
+        std::string(4, '\0');
+    writeFile(user.root() / "last", head + stream);
+  }
+
+  const UserFolders user;
+};
+
+TEST_F(OverrideFolder, HasTheOverrideFile) {
+  writeFile(user.root() / "override.colr", reel("A001"));
+  EXPECT_EQ(user.run({"get", "@override", "REEL"}).out, "A001\n");
+  EXPECT_EQ(user.run({"set", "@override", "REEL=A002"}).exitCode, 0);
+  EXPECT_EQ(user.run({"show", "@override"}).out, "REEL  Reel name  A002\n");
+  EXPECT_EQ(user.run({"unset", "@override", "REEL"}).exitCode, 0);
+  EXPECT_EQ(readFile(user.root() / "override.colr"), "");
+  EXPECT_TRUE(std::filesystem::exists(user.root() / "override.colr"));
+}
+
+TEST_F(OverrideFolder, GetsANewOverrideFile) {
+  EXPECT_EQ(user.run({"encode", "-", "-o", "@override"}, "{\"REEL\":\"A001\"}").exitCode, 0);
+  EXPECT_EQ(user.run({"get", "@override", "REEL"}).out, "A001\n");
+}
+
+TEST_F(OverrideFolder, IsSaidHowToMake) {
+  user.setPreferences("OverridePath = \"" + (user.root() / "missing").string() + "\"\n");
+  const Outcome outcome = user.run({"set", "--create", "@override", "REEL=A001"});
+  EXPECT_EQ(outcome.exitCode, 3);
+  EXPECT_EQ(outcome.err,
+            "oxmv: error: @override: No such file or directory; its folder is not there: oxmv db "
+            "init makes it (write-failed)\n");
+  const std::string clips = (user.root() / "clips").string();
+  EXPECT_EQ(user.run({"prefs", "set", "LUTsPath", clips}).exitCode, 0);
+  EXPECT_EQ(user.run({"db", "init"}).out, clips + "/db  clip database\n" +
+                                              (user.root() / "missing").string() +
+                                              "  folder of the override file\n");
+  EXPECT_EQ(user.run({"set", "--create", "@override", "REEL=A001"}).exitCode, 0);
+}
+
+TEST_F(OverrideFolder, IsKeptAsAPreferenceWhenItIsFirstAskedFor) {
+  user.setPreferences("");
+  EXPECT_EQ(user.run({"set", "--dry-run", "--create", "@override", "REEL=A001"}).exitCode, 0);
+  EXPECT_EQ(readFile(user.preferences()), "");
+  EXPECT_EQ(user.run({"show", "@override"}).exitCode, 3);
+  EXPECT_EQ(readFile(user.preferences()),
+            "OverridePath = \"/Library/Application Support/Ombrix\"\n");
+}
+
+TEST_F(OverrideFolder, HasTheLastFile) {
+  putLast(readFile(OXMV_SOURCE_DIR "/examples/eye-left.col1"));
+  EXPECT_EQ(user.run({"show", "@last"}).out,
+            "clip GUID " + guid +
+                "\nTIMC  Timecode   01:02:03:04\nREEL  Reel name  A001_C003L\nHOFF             "
+                "0.01\n");
+  EXPECT_EQ(user.run({"check", "@last"}).exitCode, 0);
+  const std::string dump = user.run({"dump", "@last"}).out;
+  const std::string head = "24 bytes before the stream: clip GUID " + guid + "\n";
+  EXPECT_EQ(dump, head + run({"dump", OXMV_SOURCE_DIR "/examples/eye-left.col1"}).out);
+  const std::string json = user.run({"dump", "--json", "@last"}).out;
+  EXPECT_NE(json.find(",\"head\":24,\"guid\":\"" + guid + "\",\"records\":["), std::string::npos)
+      << json;
+}
+
+TEST_F(OverrideFolder, KeepsTheGuidRecordOfTheLastStream) {
+  const Bytes stream = withGuidRecord();
+  putLast(std::string(stream.begin(), stream.end()));
+  EXPECT_TRUE(user.run({"show", "@last"}).out.starts_with("clip GUID " + recordGuid));
+}
+
+TEST_F(OverrideFolder, LastStreamMayBeShort) {
+  putLast("");
+  const Outcome empty = user.run({"show", "@last"});
+  EXPECT_EQ(empty.exitCode, 0);
+  EXPECT_EQ(empty.err, "");
+  EXPECT_EQ(empty.out, "clip GUID " + guid + "\nno tags\n");
+  EXPECT_EQ(user.run({"check", "@last"}).out, "");
+  putLast(std::string("TAKE\1\0\0B\7\0\0", 11));  // no stream elsewhere
+  EXPECT_EQ(user.run({"get", "@last", "TAKE"}).out, "7\n");
+}
+
+TEST_F(OverrideFolder, LastFileNeedsItsGuid) {
+  writeFile(user.root() / "last", std::string(23, 'x'));
+  const Outcome outcome = user.run({"show", "@last"});
+  EXPECT_EQ(outcome.exitCode, 3);
+  EXPECT_EQ(outcome.err,
+            "oxmv: error: @last: 23 bytes are too few for the GUID that it begins with "
+            "(too-short)\n");
+  std::filesystem::remove(user.root() / "last");
+  EXPECT_EQ(user.run({"show", "@last"}).err,
+            "oxmv: error: @last: No such file or directory (missing)\n");
 }
 
 TEST(ClipNames, LastIsForReadingOnly) {
