@@ -13,8 +13,8 @@ namespace {
 
 constexpr auto all = std::to_array<const Verb*>(
     {&showVerb, &getVerb, &setVerb, &unsetVerb, &diffVerb, &dumpVerb, &checkVerb, &encodeVerb,
-     &tagsVerb, &dbListVerb, &dbShowVerb, &dbCheckVerb, &dbPathVerb, &dbInitVerb, &demoVerb,
-     &helpVerb, &versionVerb});
+     &tagsVerb, &dbListVerb, &dbShowVerb, &dbCheckVerb, &dbPathVerb, &dbInitVerb, &prefsVerb,
+     &pathsVerb, &demoVerb, &helpVerb, &versionVerb});
 
 std::string_view firstWord(std::string_view name) { return name.substr(0, name.find(' ')); }
 
