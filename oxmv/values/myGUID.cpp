@@ -72,7 +72,7 @@ std::optional<myGUID> guidFromText(std::string_view text) noexcept {
     const unsigned digit = digitOf(text[i]);
     if (form[i] == '-' ? text[i] != '-' : digit == 16) return std::nullopt;
     if (form[i] == '-') continue;
-    bytes[digits / 2] = static_cast<std::uint8_t>(bytes[digits / 2] << 4 | digit);
+    bytes[digits / 2] = static_cast<std::uint8_t>(bytes[digits / 2] * 16u + digit);
     ++digits;
   }
   const auto word = [&](std::size_t at) {
