@@ -28,4 +28,10 @@ std::vector<Column> columnsFrom(std::string_view list) {
   return columns;
 }
 
+std::vector<Value> valuesOf(const std::vector<Column>& columns, const Dictionary& tags) {
+  std::vector<Value> values;
+  for (const Column& column : columns) values.push_back(tags[column.key]);
+  return values;
+}
+
 }  // namespace oxmv::cli

@@ -22,4 +22,7 @@ struct Column {
 // when one is neither.
 std::vector<Column> columnsFrom(std::string_view list);
 
+// Their values, one a column; nothing for a tag that is not there.
+std::vector<Value> valuesOf(const std::vector<Column>& columns, const Dictionary& tags);
+
 }  // namespace oxmv::cli

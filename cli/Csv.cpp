@@ -44,9 +44,10 @@ CsvWriter::CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading
   sink_.write(line);
 }
 
-void CsvWriter::add(std::initializer_list<std::string_view> leading, const Dictionary& tags) {
+void CsvWriter::add(std::initializer_list<std::string_view> leading,
+                    std::span<const Value> values) {
   std::string line = fields(leading);
-  for (const Column& column : columns_) line += field(bare(tags[column.key])) + ',';
+  for (const Value& value : values) line += field(bare(value)) + ',';
   endLine(line);
   sink_.write(line);
 }

@@ -3,12 +3,13 @@
 #pragma once
 
 #include <initializer_list>
+#include <span>
 #include <string_view>
 #include <vector>
 
 #include "cli/Columns.h"
 #include "cli/Sink.h"
-#include "oxmv/values/Dictionary.h"
+#include "oxmv/values/Value.h"
 
 namespace oxmv::cli {
 
@@ -19,9 +20,12 @@ class CsvWriter {
   CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
             std::vector<Column> columns);
 
-  // `leading` are the fields before the tags. A tag that is not there leaves its field empty. Numbers
-  // and texts stand bare, lists of numbers with blanks between them, everything else as tag JSON.
-  void add(std::initializer_list<std::string_view> leading, const Dictionary& tags);
+  // `leading` are the fields before the tags, `values` those of the columns. Nothing leaves its field
+  // empty. Numbers and texts stand bare, lists of numbers with blanks between them, everything else
+  // as tag JSON.
+  void add(std::initializer_list<std::string_view> leading, std::span<const Value> values);
+
+  const std::vector<Column>& columns() const { return columns_; }
 
  private:
   Sink& sink_;

@@ -114,7 +114,9 @@ class AsCsv final : public Presentation {
  public:
   explicit AsCsv(Call& call)
       : csv_(call.output, {"file"}, columnsFrom(call.arguments.value(Flag::columns))) {}
-  void add(const ClipName& name, const Clip& clip) override { csv_.add({name.word}, clip.tags); }
+  void add(const ClipName& name, const Clip& clip) override {
+    csv_.add({name.word}, valuesOf(csv_.columns(), clip.tags));
+  }
 
  private:
   CsvWriter csv_;

@@ -1,11 +1,9 @@
 #include <algorithm>
 #include <array>
 #include <cstdint>
-#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
-#include <utility>
 #include <variant>
 #include <vector>
 
@@ -19,7 +17,7 @@
 #include "cli/TagJson.h"
 #include "cli/ValueText.h"
 #include "cli/Verb.h"
-#include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagPicker.h"
 #include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Characters.h"
 
@@ -32,18 +30,33 @@ std::vector<Column> columnsOf(const Call& call) {
   return columnsFrom(call.arguments.value(Flag::columns, defaultColumns));
 }
 
-// The tags of a file. What keeps it from being read is said already.
-std::variant<Dictionary, FileProblem> readTags(Call& call, Database& database,
-                                               const DatabaseFile& file) {
-  const auto read = database.read(file);
-  if (const auto* problem = std::get_if<FileProblem>(&read)) {
-    call.messages.error(database.pathOf(file.name.text()), problem->message, problem->code);
-    return *problem;
+// Reads what the columns need of each file, one after the other.
+class ColumnReader {
+ public:
+  ColumnReader(Call& call, Database& database, const std::vector<Column>& columns)
+      : call_(call), database_(database) {
+    for (const Column& column : columns) tags_.push_back(column.row->tag);
   }
-  const auto stream = std::get<std::span<const std::uint8_t>>(read);
-  if (stream.size() < shortestData) return Dictionary();
-  return decodeStream(stream, static_cast<std::int32_t>(stream.size()));
-}
+
+  // The values of a file's columns; they hold until the next file. What keeps it from being read is
+  // said already.
+  std::variant<std::span<const Value>, FileProblem> read(const DatabaseFile& file) {
+    const auto content = database_.read(file);
+    if (const auto* problem = std::get_if<FileProblem>(&content)) {
+      call_.messages.error(database_.pathOf(file.name.text()), problem->message, problem->code);
+      return *problem;
+    }
+    const auto stream = std::get<std::span<const std::uint8_t>>(content);
+    pickTags(stream.size() < shortestData ? stream.first(0) : stream, tags_, values_);
+    return values_;
+  }
+
+ private:
+  Call& call_;
+  Database& database_;
+  std::vector<Tag> tags_;
+  std::vector<Value> values_;
+};
 
 // "combined+left+right"
 std::string eyesOf(std::span<const DatabaseFile> clip) {
@@ -55,12 +68,13 @@ std::string eyesOf(std::span<const DatabaseFile> clip) {
   return eyes;
 }
 
-// What is made of the clips, one after the other. A clip whose file cannot be read has no tags.
+// What is made of the clips, one after the other. `values` are those of the columns; null for a clip
+// whose file cannot be read.
 class Listing {
  public:
   virtual ~Listing() = default;
   virtual void add(const std::string& guid, const std::string& eyes,
-                   const std::optional<Dictionary>& tags) = 0;
+                   const std::span<const Value>* values) = 0;
 
  protected:
   Listing() = default;
@@ -85,15 +99,15 @@ class Table final : public Listing {
   }
 
   void add(const std::string& guid, const std::string& eyes,
-           const std::optional<Dictionary>& tags) override {
+           const std::span<const Value>* values) override {
     std::string line = fmt::format("{}  {:<{}}", guid, eyes, eyesWidth_);
-    if (!tags) return writeLine(line + "  (not read)", false);
-    for (const Column& column : columns_) {
-      const Value value = (*tags)[column.key];
+    if (values == nullptr) return writeLine(line + "  (not read)", false);
+    for (std::size_t i = 0; i < columns_.size(); ++i) {
+      const Value& value = (*values)[i];
       const std::string text = value.isNothing() ? "-" : inLine(value, Extent::abbreviated);
-      const std::size_t width = oxmv::columns(text);
-      line += "  " + text;
-      line.append(widthOf(column) - std::min(widthOf(column), width), ' ');
+      const std::size_t missing =
+          widthOf(columns_[i]) - std::min(widthOf(columns_[i]), columns(text));
+      line.append("  ").append(text).append(missing, ' ');
     }
     writeLine(line, false);
   }
@@ -120,8 +134,9 @@ class Csv final : public Listing {
   explicit Csv(Call& call) : csv_(call.output, {"guid", "eyes"}, columnsOf(call)) {}
 
   void add(const std::string& guid, const std::string& eyes,
-           const std::optional<Dictionary>& tags) override {
-    csv_.add({guid, eyes}, tags.value_or(Dictionary()));
+           const std::span<const Value>* values) override {
+    const std::vector<Value> none(csv_.columns().size());
+    csv_.add({guid, eyes}, values != nullptr ? *values : none);
   }
 
  private:
@@ -130,15 +145,15 @@ class Csv final : public Listing {
 
 // One line a clip: what its combined file holds, or else that of its first eye.
 void listClips(Call& call, Database& database, Listing& listing) {
+  ColumnReader reader(call, database, columnsOf(call));
   Progress progress(call, database.files().size(), "files");
   std::size_t count = 0;
   for (auto files = database.files(); !files.empty(); ++count) {
     const auto clip = Database::firstClip(files);
     for (std::size_t i = 0; i < clip.size(); ++i) progress.advance();
-    auto tags = readTags(call, database, clip.front());
-    auto* good = std::get_if<Dictionary>(&tags);
+    const auto read = reader.read(clip.front());
     listing.add(guidText(clip.front().name.guid), eyesOf(clip),
-                good != nullptr ? std::optional(std::move(*good)) : std::nullopt);
+                std::get_if<std::span<const Value>>(&read));
     files = files.subspan(clip.size());
   }
   call.messages.note(database.path(), fmt::format("{}, {}", counted(count, "clip"),
@@ -147,7 +162,7 @@ void listClips(Call& call, Database& database, Listing& listing) {
 
 void writeResult(JsonResults& results, const Database& database, const DatabaseFile& file,
                  const std::vector<Column>& columns,
-                 const std::variant<Dictionary, FileProblem>& read) {
+                 const std::variant<std::span<const Value>, FileProblem>& read) {
   results.add([&](JsonWriter& json) {
     json.beginObject();
     json.member("schema", "oxmv.clip/1");
@@ -155,16 +170,15 @@ void writeResult(JsonResults& results, const Database& database, const DatabaseF
     json.member("eye", eyeText(file.name));
     json.member("file", database.pathOf(file.name.text()));
     json.key("tags");
-    const auto* tags = std::get_if<Dictionary>(&read);
-    if (tags == nullptr) {
+    const auto* values = std::get_if<std::span<const Value>>(&read);
+    if (values == nullptr) {
       json.null();
     } else {
       json.beginObject();
-      for (const Column& column : columns) {
-        const Value value = (*tags)[column.key];
-        if (value.isNothing()) continue;
-        json.key(column.key);
-        writeTagJson(json, value);
+      for (std::size_t i = 0; i < columns.size(); ++i) {
+        if ((*values)[i].isNothing()) continue;
+        json.key(columns[i].key);
+        writeTagJson(json, (*values)[i]);
       }
       json.endObject();
     }
@@ -175,11 +189,12 @@ void writeResult(JsonResults& results, const Database& database, const DatabaseF
 // One object a file.
 void listFiles(Call& call, Database& database) {
   const std::vector<Column> columns = columnsOf(call);
+  ColumnReader reader(call, database, columns);
   JsonResults results(call);
   Progress progress(call, database.files().size(), "files");
   for (const DatabaseFile& file : database.files()) {
     progress.advance();
-    writeResult(results, database, file, columns, readTags(call, database, file));
+    writeResult(results, database, file, columns, reader.read(file));
   }
   results.finish();
 }
