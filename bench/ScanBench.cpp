@@ -15,7 +15,9 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <string>
 #include <thread>
 #include <vector>
@@ -27,7 +29,6 @@
 
 #include "cli/Run.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
-#include "oxmv/platform/WholeFile.h"
 #include "oxmv/store/ClipFileName.h"
 #include "oxmv/values/Array.h"
 
@@ -65,8 +66,10 @@ class Clips {
     path_ = ::mkdtemp(pattern.data());
     for (std::uint32_t i = 0; i < clipCount; ++i) {
       const ClipFileName name{{i * 2654435761u, 1, 2, {3, 4, 5, 6, 7, 8, 9, 10}}, std::nullopt};
-      std::error_code error;
-      if (!writeWholeFile(path_ + '/' + name.text(), clip(i), error)) std::abort();
+      const std::vector<std::uint8_t> stream = clip(i);
+      std::ofstream(path_ + '/' + name.text(), std::ios::binary)
+          .write(reinterpret_cast<const char*>(stream.data()),
+                 static_cast<std::streamsize>(stream.size()));
     }
   }
   Clips(const Clips&) = delete;
