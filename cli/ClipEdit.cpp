@@ -8,7 +8,6 @@
 #include <fmt/format.h>
 
 #include "cli/AllowedLosses.h"
-#include "cli/Clips.h"
 #include "cli/Differences.h"
 #include "cli/ValueText.h"
 #include "oxmv/metadata/MetadataDictionary.h"
@@ -17,8 +16,6 @@
 
 namespace oxmv::cli {
 namespace {
-
-constexpr std::string_view standardStreams = "-";
 
 Dictionary tagsOf(const Bytes& stream) {
   return MetadataDictionary().initWithData(stream).metadata();
@@ -59,15 +56,15 @@ std::filesystem::path backupPath(const std::string& name) {
 
 }  // namespace
 
-ClipEdit::ClipEdit(Call& call, std::optional<Bytes> original, Layout layout)
+ClipEdit::ClipEdit(Call& call, ClipName name, std::optional<Bytes> original, Layout layout)
     : call_(&call),
-      name_(call.words.front()),
+      name_(std::move(name)),
       original_(std::move(original)),
       editor_(original_.value_or(Bytes()), layout) {}
 
 std::optional<ClipEdit> ClipEdit::begin(Call& call, std::string_view ifMissing) {
-  const std::string& name = call.words.front();
-  const bool isStandard = name == standardStreams;
+  const ClipName name = writableClipNameFrom(call.words.front());
+  const bool isStandard = name.kind == ClipName::Kind::standardStream;
   const Layout layout = layoutOf(call.arguments);
   checkFlags(call, isStandard);
   if (isStandard && !call.arguments.has(Flag::dryRun) && StandardOutput::isTerminal()) {
@@ -75,19 +72,20 @@ std::optional<ClipEdit> ClipEdit::begin(Call& call, std::string_view ifMissing) 
                           "binary-to-terminal");
     return std::nullopt;
   }
-  auto content = readInput(name);
-  if (auto* bytes = std::get_if<Bytes>(&content)) {
-    const Clip clip = decodeClip(*bytes);
-    if (!bytes->empty() && !clip.metadata.haveMetadata()) return refuseNoClip(call), std::nullopt;
+  auto read = readStream(name);
+  if (auto* stream = std::get_if<ClipStream>(&read)) {
+    const Clip clip = decodeClip(name, *stream);
+    if (!stream->bytes.empty() && clip.tags.empty()) return refuseNoClip(call), std::nullopt;
     warnOfLosses(call, name, clip);
-    return ClipEdit(call, std::move(*bytes), layout);
+    return ClipEdit(call, name, std::move(stream->bytes), layout);
   }
-  const FileProblem& problem = std::get<FileProblem>(content);
+  const FileProblem& problem = std::get<FileProblem>(read);
   const bool isMissing = problem.code == "missing";
-  if (isMissing && call.arguments.has(Flag::create)) return ClipEdit(call, std::nullopt, layout);
+  if (isMissing && call.arguments.has(Flag::create))
+    return ClipEdit(call, name, std::nullopt, layout);
   const bool isHelped = isMissing && !ifMissing.empty();
   call.messages.error(
-      name, isHelped ? fmt::format("{}; {}", problem.message, ifMissing) : problem.message,
+      name.word, isHelped ? fmt::format("{}; {}", problem.message, ifMissing) : problem.message,
       problem.code);
   return std::nullopt;
 }
@@ -98,16 +96,18 @@ void ClipEdit::sayRefused(const std::string& path, const EditError& error) {
   const bool isDamaged = error.refusal == EditRefusal::damagedStream;
   const std::string where = isDamaged ? fmt::format(" at byte {}", error.offset) : "";
   call_->messages.refused(
-      name_, fmt::format("{}{}: {}", visible(path), where, error.message), codeOf(error.refusal),
+      name_.word, fmt::format("{}{}: {}", visible(path), where, error.message),
+      codeOf(error.refusal),
       nothingWritten(isDamaged ? "oxmv check says what is wrong with the clip" : ""));
 }
 
 void ClipEdit::finish() {
   const bool isChanged = editor_.stream() != original_;
-  if (!isChanged) call_->messages.note(name_, "nothing to change");
+  if (!isChanged) call_->messages.note(name_.word, "nothing to change");
   if (isChanged) showChanges();
   if (call_->arguments.has(Flag::dryRun)) return;
-  if (name_ == standardStreams) return call_->output.write(asText(editor_.stream()));
+  if (name_.kind == ClipName::Kind::standardStream)
+    return call_->output.write(asText(editor_.stream()));
   if (isChanged) save();
 }
 
@@ -117,8 +117,24 @@ void ClipEdit::showChanges() {
        differencesBetween(tagsOf(original_.value_or(Bytes())), tags())) {
     const std::string line = inWords(difference);
     call_->arguments.has(Flag::dryRun) ? call_->output.write(line + '\n')
-                                       : call_->messages.note(name_, line);
+                                       : call_->messages.note(name_.word, line);
   }
+}
+
+// Kept on purpose: an eye without tags has no file.
+bool ClipEdit::replace(std::error_code& error) const {
+  if (name_.kind != ClipName::Kind::eye || !editor_.stream().empty())
+    return replaceWholeFile(name_.path, original_, editor_.stream(), error);
+  if (!original_) return true;
+  const auto now = readWholeFile(name_.path, error);
+  if (now != original_) return error = FileError::changed, false;
+  return removeFile(name_.path, error);
+}
+
+// Whether the file is what it should be, though replacing it has failed.
+bool ClipEdit::hasArrived() const {
+  std::error_code ignored;
+  return readWholeFile(name_.path, ignored) == editor_.stream();
 }
 
 void ClipEdit::save() {
@@ -126,30 +142,32 @@ void ClipEdit::save() {
   std::optional<std::string> backup;
   if (original_ && call_->arguments.has(Flag::backup) && !(backup = backUp())) return;
   std::error_code error;
-  if (replaceWholeFile(name_, original_, editor_.stream(), error)) {
-    if (backup) messages.note(name_, fmt::format("the old file is {}", visible(*backup)));
-    return messages.note(name_, fmt::format("got {}", counted(editor_.stream().size(), "byte")));
+  if (replace(error)) {
+    if (backup) messages.note(name_.word, fmt::format("the old file is {}", visible(*backup)));
+    return messages.note(name_.word,
+                         fmt::format("got {}", counted(editor_.stream().size(), "byte")));
   }
   // Unless the new content got there all the same, nothing was replaced that needs a copy.
-  std::error_code ignored;
-  if (backup && readWholeFile(name_, ignored) != editor_.stream())
+  if (backup && !hasArrived()) {
+    std::error_code ignored;
     std::filesystem::remove(*backup, ignored);
+  }
   if (error == FileError::changed) {
-    messages.refused(name_, "another program has changed it meanwhile", "file-changed",
+    messages.refused(name_.word, "another program has changed it meanwhile", "file-changed",
                      nothingWritten("try again"));
   } else {
-    messages.error(name_, error.message(), "write-failed");
+    sayWriteFailed(*call_, name_, error);
   }
 }
 
 // What was read, so that the copy is of what is replaced. Answers nothing when there is no copy,
 // which is said then.
 std::optional<std::string> ClipEdit::backUp() {
-  const std::filesystem::path path = backupPath(name_);
+  const std::filesystem::path path = backupPath(name_.path);
   std::error_code error;
   if (replaceWholeFile(path, std::nullopt, *original_, error)) {
     std::error_code ignored;  // on a file system without permissions there are none to keep
-    const auto permissions = std::filesystem::status(name_, ignored).permissions();
+    const auto permissions = std::filesystem::status(name_.path, ignored).permissions();
     std::filesystem::permissions(path, permissions, ignored);
     return path.string();
   }

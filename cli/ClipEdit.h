@@ -5,8 +5,9 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <system_error>
 
-#include "cli/Inputs.h"
+#include "cli/Clips.h"
 #include "cli/Verb.h"
 #include "oxmv/metadata/TagStreamEditor.h"
 #include "oxmv/values/Dictionary.h"
@@ -20,7 +21,8 @@ class ClipEdit {
   // together.
   static std::optional<ClipEdit> begin(Call& call, std::string_view ifMissing = {});
 
-  const std::string& name() const { return name_; }
+  // As the user named it.
+  const std::string& name() const { return name_.word; }
   TagStreamEditor& editor() { return editor_; }
   // As edited so far.
   Dictionary tags() const;
@@ -33,14 +35,16 @@ class ClipEdit {
   void finish();
 
  private:
-  ClipEdit(Call& call, std::optional<Bytes> original, Layout layout);
+  ClipEdit(Call& call, ClipName name, std::optional<Bytes> original, Layout layout);
 
   void save();
+  bool replace(std::error_code& error) const;
+  bool hasArrived() const;
   void showChanges();
   std::optional<std::string> backUp();
 
   Call* call_;
-  std::string name_;
+  ClipName name_;
   std::optional<Bytes> original_;  // none: there was no file
   TagStreamEditor editor_;
 };

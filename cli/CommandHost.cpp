@@ -54,11 +54,11 @@ Value CommandHost::copyPreference(std::string_view key, std::string_view appID) 
 }
 
 void CommandHost::setPreference(std::string_view key, const Value& value, std::string_view appID) {
-  system_.setPreference(key, value, appID);
+  if (!isDryRun_) system_.setPreference(key, value, appID);
 }
 
 bool CommandHost::synchronizePreferences(std::string_view appID, std::error_code* error) {
-  return system_.synchronizePreferences(appID, error);
+  return isDryRun_ || system_.synchronizePreferences(appID, error);
 }
 
 std::string CommandHost::localizedString(std::string_view key, std::string_view builtIn) {

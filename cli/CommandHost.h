@@ -26,11 +26,14 @@ std::optional<NamedFolder> namedLooks(const Arguments& arguments);
 
 // Like every host on this system, but for the folders that were named for this run, a string table
 // that lets looks and clips meet in one place, log lines as notes, and alerts, which wait for the
-// verb that caused them.
+// verb that caused them. On a dry run preferences are not set.
 class CommandHost final : public Host {
  public:
   CommandHost(const Arguments& arguments, Messages& messages)
-      : database_(namedDatabase(arguments)), looks_(namedLooks(arguments)), messages_(messages) {}
+      : database_(namedDatabase(arguments)),
+        looks_(namedLooks(arguments)),
+        isDryRun_(arguments.has(Flag::dryRun)),
+        messages_(messages) {}
 
   Value copyPreference(std::string_view key, std::string_view appID) override;
   void setPreference(std::string_view key, const Value& value, std::string_view appID) override;
@@ -46,6 +49,7 @@ class CommandHost final : public Host {
   LinuxHost system_;
   std::optional<NamedFolder> database_;
   std::optional<NamedFolder> looks_;
+  bool isDryRun_;
   Messages& messages_;
   std::vector<std::string> alerts_;
 };

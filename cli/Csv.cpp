@@ -1,11 +1,8 @@
 #include "cli/Csv.h"
 
-#include <algorithm>
+#include <string>
+#include <utility>
 
-#include <fmt/format.h>
-
-#include "cli/Flags.h"
-#include "cli/TagNames.h"
 #include "cli/ValueText.h"
 #include "oxmv/values/Characters.h"
 
@@ -25,34 +22,34 @@ std::string field(std::string_view text) {
   return quoted + '"';
 }
 
-// A blank in front of a name is the user's way to write a list.
-std::string_view withoutLeadingBlanks(std::string_view text) {
-  return text.substr(std::min(text.find_first_not_of(' '), text.size()));
+// Each with a comma behind it.
+std::string fields(std::initializer_list<std::string_view> texts) {
+  std::string line;
+  for (const std::string_view text : texts) line += field(visible(text)) + ',';
+  return line;
+}
+
+void endLine(std::string& line) {
+  line.back() = '\n';  // in place of the last comma
 }
 
 }  // namespace
 
-CsvWriter::CsvWriter(Sink& sink, std::string_view columns) : sink_(sink) {
-  std::string line = "file";
-  for (bool isLast = false; !isLast;) {
-    const std::size_t comma = columns.find(',');
-    isLast = comma == std::string_view::npos;
-    const std::string_view name = withoutLeadingBlanks(columns.substr(0, comma));
-    columns_.push_back(&tagNamed(name));
-    line += fmt::format(",{}", field(name));
-    columns.remove_prefix(isLast ? columns.size() : comma + 1);
-  }
-  sink_.write(line + '\n');
+CsvWriter::CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
+                     std::vector<Column> columns)
+    : sink_(sink), columns_(std::move(columns)) {
+  std::string line = fields(leading);
+  for (const Column& column : columns_) line += field(column.name) + ',';
+  endLine(line);
+  sink_.write(line);
 }
 
-void CsvWriter::add(std::string_view file, const Dictionary& tags) {
-  std::string line = field(visible(file));
-  for (const TagRow* column : columns_) {
-    const auto characters = charactersOf(column->tag);
-    const std::string_view key(characters.data(), characters.size());
-    line += fmt::format(",{}", field(bare(tags[key])));
-  }
-  sink_.write(line + '\n');
+void CsvWriter::add(std::initializer_list<std::string_view> leading,
+                    std::span<const Value> values) {
+  std::string line = fields(leading);
+  for (const Value& value : values) line += field(bare(value)) + ',';
+  endLine(line);
+  sink_.write(line);
 }
 
 }  // namespace oxmv::cli

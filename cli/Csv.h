@@ -2,29 +2,34 @@
 
 #pragma once
 
-#include <string>
+#include <initializer_list>
+#include <span>
 #include <string_view>
 #include <vector>
 
+#include "cli/Columns.h"
 #include "cli/Sink.h"
-#include "oxmv/metadata/TagTable.h"
-#include "oxmv/values/Dictionary.h"
+#include "oxmv/values/Value.h"
 
 namespace oxmv::cli {
 
 class CsvWriter {
  public:
-  // `columns`: tags or labels, with commas between them. Throws UsageError when one is neither.
-  // Writes the first line: "file", and the columns as they were named.
-  CsvWriter(Sink& sink, std::string_view columns);
+  // Writes the first line: what `leading` calls the fields before the tags, and the columns as they
+  // were named.
+  CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
+            std::vector<Column> columns);
 
-  // A tag that is not there leaves its field empty. Numbers and texts stand bare, lists of numbers
-  // with blanks between them, everything else as tag JSON.
-  void add(std::string_view file, const Dictionary& tags);
+  // `leading` are the fields before the tags, `values` those of the columns. Nothing leaves its field
+  // empty. Numbers and texts stand bare, lists of numbers with blanks between them, everything else
+  // as tag JSON.
+  void add(std::initializer_list<std::string_view> leading, std::span<const Value> values);
+
+  const std::vector<Column>& columns() const { return columns_; }
 
  private:
   Sink& sink_;
-  std::vector<const TagRow*> columns_;
+  std::vector<Column> columns_;
 };
 
 }  // namespace oxmv::cli

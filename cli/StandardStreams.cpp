@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <csignal>
 #include <cstddef>
+#include <utility>
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -12,6 +13,9 @@
 
 namespace oxmv::cli {
 namespace {
+
+// Whether a status line is on the terminal.
+bool isStatusShown = false;
 
 constexpr std::size_t worthAWrite = std::size_t{64} * 1024;
 
@@ -34,6 +38,7 @@ void StandardOutput::write(std::string_view text) {
 }
 
 void StandardOutput::flush() {
+  if (!waiting_.empty()) showStatus({});
   const std::error_code error = writeAll(STDOUT_FILENO, waiting_);
   waiting_.clear();
   if (error) throw OutputFailed{error};
@@ -59,7 +64,16 @@ std::optional<std::vector<std::uint8_t>> readStandardInput(std::error_code& erro
   return content;
 }
 
-void writeStandardError(std::string_view text) noexcept { writeAll(STDERR_FILENO, text); }
+void writeStandardError(std::string_view text) noexcept {
+  showStatus({});
+  writeAll(STDERR_FILENO, text);
+}
+
+void showStatus(std::string_view line) noexcept {
+  constexpr std::string_view backAndErased = "\r\x1B[K";
+  if (std::exchange(isStatusShown, !line.empty())) writeAll(STDERR_FILENO, backAndErased);
+  writeAll(STDERR_FILENO, line);
+}
 
 bool isStandardErrorTerminal() noexcept { return ::isatty(STDERR_FILENO) == 1; }
 

@@ -38,6 +38,10 @@ std::optional<std::vector<std::uint8_t>> readStandardInput(std::error_code& erro
 void writeStandardError(std::string_view text) noexcept;
 bool isStandardErrorTerminal() noexcept;
 
+// A line on a terminal's standard error that stays until something is written, to either stream;
+// that takes its place. An empty one only takes the last one away.
+void showStatus(std::string_view line) noexcept;
+
 // To be called first. Lets a closed pipe be an error like any other; and takes the places of
 // standard streams that were not given to us, so that no file we open gets one of them and
 // messages in it.

@@ -12,8 +12,9 @@ namespace oxmv::cli {
 namespace {
 
 constexpr auto all = std::to_array<const Verb*>(
-    {&showVerb, &getVerb, &setVerb, &unsetVerb, &diffVerb, &dumpVerb, &checkVerb, &encodeVerb,
-     &tagsVerb, &stillVerb, &demoVerb, &helpVerb, &versionVerb});
+    {&showVerb,   &getVerb,   &setVerb,   &unsetVerb,  &diffVerb,   &dumpVerb,    &checkVerb,
+     &encodeVerb, &tagsVerb,  &stillVerb, &dbListVerb, &dbShowVerb, &dbCheckVerb, &dbPathVerb,
+     &dbInitVerb, &prefsVerb, &pathsVerb, &demoVerb,   &helpVerb,   &versionVerb});
 
 std::string_view firstWord(std::string_view name) { return name.substr(0, name.find(' ')); }
 

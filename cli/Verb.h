@@ -45,7 +45,8 @@ struct Verb {
 constexpr std::size_t anyNumber = static_cast<std::size_t>(-1);
 
 extern const Verb showVerb, getVerb, setVerb, unsetVerb, diffVerb, dumpVerb, checkVerb, encodeVerb,
-    tagsVerb, stillVerb, demoVerb, helpVerb, versionVerb;
+    tagsVerb, stillVerb, dbListVerb, dbShowVerb, dbCheckVerb, dbPathVerb, dbInitVerb, prefsVerb,
+    pathsVerb, demoVerb, helpVerb, versionVerb;
 
 // Every verb, in the order in which help lists them.
 std::span<const Verb* const> verbs() noexcept;

@@ -1,23 +1,21 @@
 #include <array>
 #include <string>
+#include <variant>
 #include <vector>
 
 #include <fmt/format.h>
 
+#include "cli/Clips.h"
 #include "cli/Findings.h"
-#include "cli/Inputs.h"
 #include "cli/JsonResults.h"
 #include "cli/ValueText.h"
 #include "cli/Verb.h"
-#include "oxmv/metadata/MetadataDictionary.h"
 
 namespace oxmv::cli {
 namespace {
 
-std::vector<Finding> findingsIn(const Bytes& bytes) {
-  FindingCollector collector(bytes);
-  MetadataDictionary().initWithData(bytes, &collector);
-  std::vector<Finding> findings = collector.finish();
+std::vector<Finding> findingsToSay(const ClipName& name, const ClipStream& stream) {
+  std::vector<Finding> findings = findingsIn(name, stream);
   std::erase_if(findings,
                 [](const Finding& finding) { return finding.oddity == Oddity::terminator; });
   return findings;
@@ -48,14 +46,15 @@ void writeResult(JsonResults& results, const std::string& name,
 void run(Call& call) {
   const bool isJson = wantsJson(call);
   JsonResults results(call);
-  for (const std::string& name : namedInputs(call)) {
-    const auto content = readInput(name);
-    if (const auto* problem = std::get_if<FileProblem>(&content)) {
+  for (const ClipName& clip : namedClips(call)) {
+    const std::string& name = clip.word;
+    const auto read = readStream(clip);
+    if (const auto* problem = std::get_if<FileProblem>(&read)) {
       call.messages.error(name, problem->message, problem->code);
       if (isJson) writeResult(results, name, nullptr, problem);
       continue;
     }
-    const std::vector<Finding> findings = findingsIn(std::get<Bytes>(content));
+    const std::vector<Finding> findings = findingsToSay(clip, std::get<ClipStream>(read));
     if (!findings.empty()) call.messages.raise(Outcome::no);
     if (isJson) {
       writeResult(results, name, &findings, nullptr);
@@ -78,11 +77,13 @@ const Verb checkVerb = {
     .examples =
         "oxmv check *.colr\n"
         "oxmv check --json clip.colr\n"
-        "oxmv check clip.colr && echo well\n",
+        "oxmv check clip.colr && echo well\n"
+        "oxmv check 0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F @override\n",
     .details =
-        "One line for each finding: the file, the byte, what it is, and its code. Exit code 1\n"
-        "when something was found. Findings are whatever readers leave out, and whatever a\n"
-        "good writer would have written otherwise.\n",
+        "FILE names a clip as in oxmv help show. One line for each finding: the file, the byte,\n"
+        "what it is, and its code. Exit code 1 when something was found. Findings are whatever\n"
+        "readers leave out, and whatever a good writer would have written otherwise. Bytes are\n"
+        "counted from the start of the stream: of @last, from behind the GUID.\n",
     .flags = flags,
     .fewestWords = 0,
     .mostWords = anyNumber,

@@ -68,14 +68,14 @@ void writeResult(Call& call, const std::vector<Difference>* differences,
 
 void run(Call& call) {
   const bool isJson = wantsJson(call);
-  const std::vector<std::string> names = namedInputs(call);
+  const std::vector<ClipName> names = namedClips(call);
   std::optional<FileProblem> problem;
   std::vector<Dictionary> tags;
-  for (const std::string& name : names) {
+  for (const ClipName& name : names) {
     const auto read = readClip(call, name);
     if (const auto* clip = std::get_if<Clip>(&read)) {
       warnOfLosses(call, name, *clip);
-      tags.push_back(clip->metadata.metadata());
+      tags.push_back(clip->tags);
     } else if (!problem) {
       problem = std::get<FileProblem>(read);
     }
@@ -104,11 +104,13 @@ const Verb diffVerb = {
     .examples =
         "oxmv diff before.colr after.colr\n"
         "oxmv diff --json before.colr after.colr\n"
+        "oxmv diff @last @override\n"
         "oxmv diff -q a.colr b.colr > /dev/null && echo the same tags\n",
     .details =
-        "One line for each tag: + is in B only, - in A only, ~ in both with another value.\n"
-        "The order of the tags does not count. Exit code 1 when there is a difference. What\n"
-        "either clip holds and readers ignore is said as a warning.\n",
+        "A and B name clips as in oxmv help show. One line for each tag: + is in B only, - in A\n"
+        "only, ~ in both with another value. The order of the tags does not count. Exit code 1\n"
+        "when there is a difference. What either clip holds and readers ignore is said as a\n"
+        "warning.\n",
     .flags = flags,
     .fewestWords = 2,
     .mostWords = 2,

@@ -8,8 +8,8 @@
 
 #include <fmt/format.h>
 
+#include "cli/Clips.h"
 #include "cli/Findings.h"
-#include "cli/Inputs.h"
 #include "cli/JsonResults.h"
 #include "cli/TagJson.h"
 #include "cli/TagNames.h"
@@ -139,13 +139,16 @@ std::string visibleType(std::uint8_t type) {
 
 class TextReport final : public Report {
  public:
-  TextReport(Call& call, std::size_t bytes, int deepest)
+  TextReport(Call& call, const ClipStream& stream, int deepest)
       : output_(call.output),
         style_(call.style),
         extent_(call.arguments.has(Flag::verbose) ? Extent::whole : Extent::abbreviated),
-        bytes_(bytes),
-        offsetWidth_(std::max<std::size_t>(6, fmt::format("{}", bytes).size())),
+        bytes_(stream.bytes.size()),
+        offsetWidth_(std::max<std::size_t>(6, fmt::format("{}", bytes_).size())),
         tagWidth_(4 + 2 * static_cast<std::size_t>(std::min(deepest, 8))) {
+    if (stream.head > 0)
+      writeLine(fmt::format("{} before the stream: clip GUID {}", counted(stream.head, "byte"),
+                            guidText(stream.guid)));
     writeLine(style_.faint(fmt::format("{:>{}}  {:<{}}  {:>8}  TYPE  {:<14}  VALUE", "OFFSET",
                                        offsetWidth_, "TAG", tagWidth_, "SIZE", "READ AS")));
   }
@@ -204,10 +207,14 @@ class TextReport final : public Report {
 
 class JsonReport final : public Report {
  public:
-  JsonReport(Call& call, const std::string& file, std::size_t bytes)
+  JsonReport(Call& call, const std::string& file, const ClipStream& stream)
       : output_(call.output), json_(call.output) {
     beginResult(json_, schema, file);
-    json_.member("bytes", bytes);
+    json_.member("bytes", stream.bytes.size());
+    if (stream.head > 0) {
+      json_.member("head", stream.head);
+      json_.member("guid", guidText(stream.guid));
+    }
     json_.key("records");
     json_.beginArray();
   }
@@ -312,19 +319,22 @@ void reportProblem(Call& call, const std::string& name, const FileProblem& probl
 }
 
 void run(Call& call) {
-  const std::string& name = call.words.front();
-  const auto content = readInput(name);
-  if (const auto* problem = std::get_if<FileProblem>(&content))
-    return reportProblem(call, name, *problem);
-  const Bytes& bytes = std::get<Bytes>(content);
+  const ClipName name = clipNameFrom(call.words.front());
+  const auto read = readStream(name);
+  if (const auto* problem = std::get_if<FileProblem>(&read))
+    return reportProblem(call, name.word, *problem);
+  const ClipStream& stream = std::get<ClipStream>(read);
+  const Bytes& bytes = stream.bytes;
   FindingCollector collector(bytes);
   decode(bytes, collector);
-  const std::vector<Finding> findings = collector.finish();
+  std::vector<Finding> findings = collector.finish();
+  if (stream.head > 0)  // no stream is too short behind a head
+    std::erase_if(findings, [](const Finding& one) { return one.oddity == Oddity::tooShort; });
   if (wantsJson(call)) {
-    JsonReport json(call, name, bytes.size());
+    JsonReport json(call, name.word, stream);
     report(bytes, findings, json);
   } else {
-    TextReport text(call, bytes.size(), collector.deepest());
+    TextReport text(call, stream, collector.deepest());
     report(bytes, findings, text);
   }
 }
@@ -344,7 +354,9 @@ const Verb dumpVerb = {
     .details =
         "Each record has its offset, tag, size and type, how its tag is read, its value, and\n"
         "behind a ! what is odd about it. Records of a nested stream are indented. Markers and\n"
-        "bytes that no reader gets to are shown too: no byte of the file is left out.\n",
+        "bytes that no reader gets to are shown too: no byte of the file is left out. FILE names\n"
+        "a clip as in oxmv help show; offsets count from the start of its stream, of @last from\n"
+        "behind the GUID.\n",
     .flags = flags,
     .fewestWords = 1,
     .mostWords = 1,

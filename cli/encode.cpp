@@ -40,7 +40,7 @@ void run(Call& call) {
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
   if (!call.arguments.has(Flag::output))
     throw UsageError("missing-output", "encode needs --output OUT; - is standard output");
-  const std::string output = clipOutput(call, {input});
+  const ClipName output = clipOutput(call, {input});
   if (!mayGetClip(call, output)) return;
 
   const auto tags = readTags(call, input);
@@ -48,7 +48,7 @@ void run(Call& call) {
   if (!passes(call, input, findLosses(*tags, layout), allowed)) return;
   const auto stream = encodeStream(*tags, layout);
   if (!stream) return call.messages.error(input, "not enough memory", "no-memory");
-  writeClip(call, output, *stream);
+  putClip(call, output, *stream);
 }
 
 constexpr auto flags = std::to_array({Flag::output, Flag::layout, Flag::allow, Flag::dryRun});
@@ -61,13 +61,15 @@ const Verb encodeVerb = {
     .summary = "make a clip of tags in JSON",
     .examples =
         "oxmv encode tags.json -o clip.colr\n"
-        "oxmv encode tags.json -o clip.colr --layout readable\n",
+        "oxmv encode tags.json -o clip.colr --layout readable\n"
+        "oxmv encode tags.json -o 0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F\n",
     .details =
-        "Tags that would not read back as they are in FILE.json are refused, each with a code,\n"
-        "and nothing is written; --allow CODE lets losses of that code through. The layout\n"
-        "\"exact\" is what writers of clips have always made; \"readable\" pads all records, so\n"
-        "that data of any size read back. A file that is there is replaced, whole or not at\n"
-        "all. What is wrong with FILE.json is said with its line and column.\n",
+        "OUT names a clip as in oxmv help show, but for @last. Tags that would not read back as\n"
+        "they are in FILE.json are refused, each with a code, and nothing is written; --allow\n"
+        "CODE lets losses of that code through. The layout \"exact\" is what writers of clips\n"
+        "have always made; \"readable\" pads all records, so that data of any size read back. A\n"
+        "file that is there is replaced, whole or not at all; the file of an eye without tags is\n"
+        "removed. What is wrong with FILE.json is said with its line and column.\n",
     .flags = flags,
     .fewestWords = 1,
     .mostWords = 1,

@@ -108,12 +108,12 @@ std::vector<TagPath> pathsIn(std::span<const std::string> words) {
 }
 
 void run(Call& call) {
-  const std::string& name = call.words.front();
   const bool isJson = wantsJson(call);
   if (isJson && call.arguments.has(Flag::raw))
     throw UsageError("bad-flags", "--raw and JSON do not go together");
   std::vector<Answer> answers;
   for (TagPath& path : pathsIn(call.words.subspan(1))) answers.push_back({std::move(path), {}});
+  const ClipName name = clipNameFrom(call.words.front());
   const auto read = readClip(call, name);
   if (const auto* problem = std::get_if<FileProblem>(&read)) {
     if (isJson) writeResult(call, nullptr, problem);
@@ -122,10 +122,10 @@ void run(Call& call) {
   const Clip& clip = std::get<Clip>(read);
   bool isComplete = true;
   for (Answer& answer : answers) {
-    answer.value = valueAt(clip.metadata.metadata(), answer.path);
+    answer.value = valueAt(clip.tags, answer.path);
     if (answer.value.isNothing()) {
       isComplete = false;
-      call.messages.error(name, fmt::format("{} is not there", visible(answer.path.text())),
+      call.messages.error(name.word, fmt::format("{} is not there", visible(answer.path.text())),
                           "absent", Outcome::no);
     } else if (!isJson) {
       writeAnswer(call, answer);
@@ -146,6 +146,7 @@ const Verb getVerb = {
     .examples =
         "oxmv get clip.colr REEL\n"
         "oxmv get clip.colr \"White balance\" COL1/SATU TAG/ISO\n"
+        "oxmv get @override LOOK\n"
         "oxmv get --raw clip.colr FREE > data.bin\n",
     .details =
         "A TAG is its four letters or its label; one that stands in another is COL1/TAG, and\n"

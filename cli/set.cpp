@@ -196,8 +196,10 @@ const Verb setVerb = {
         "oxmv set --dry-run clip.colr \"White balance=1,1.2,1,1.5\" LCRC=0x1A2B3C4D\n"
         "oxmv set --backup clip.colr KWRd+=day COL1/SATU=0.8 TAG/ISO=400\n"
         "oxmv set clip.colr 'COL1:={\"SATU\":0.8,\"WBAL\":[1.0,1.2,1.0,1.5]}'\n"
+        "oxmv set --create 0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F/left REEL=A002\n"
         "oxmv set - REEL=A002 < clip.colr > copy.colr\n",
     .details =
+        "CLIP is what it is in oxmv help show, but for @last.\n"
         "TAG=VALUE   the value as the tag has it: text as it is, a number (0x for\n"
         "            hexadecimal), numbers with commas or blanks between them, hexadecimal\n"
         "            digits for data, JSON for what holds tags; a list of texts becomes\n"
@@ -211,7 +213,8 @@ const Verb setVerb = {
         "names in REG are put by themselves. Hexadecimal from 0x80000000 to 0xFFFFFFFF means\n"
         "the 32 bits of a negative integer. Every other record keeps its bytes. The file is\n"
         "replaced whole, keeps its permissions, and a symbolic link stays one. CLIP - reads\n"
-        "standard input and writes standard output. --dry-run shows old -> new.\n",
+        "standard input and writes standard output. With --create a clip that is not there is\n"
+        "made, but no folder: oxmv db init makes that. --dry-run shows old -> new.\n",
     .flags = flags,
     .fewestWords = 2,
     .mostWords = anyNumber,

@@ -105,11 +105,11 @@ std::vector<Loss> lossesBesideFieldOfView(Call& call, const std::string& name,
 }
 
 void store(Call& call, const std::string& name, const Dictionary& tags, Layout layout,
-           const std::vector<LossCode>& allowed, const std::string& output) {
+           const std::vector<LossCode>& allowed, const ClipName& output) {
   if (!passes(call, name, lossesBesideFieldOfView(call, name, tags, layout), allowed)) return;
   const auto stream = encodeStream(tags, layout);
   if (!stream) return call.messages.error(name, "not enough memory", "no-memory");
-  writeClip(call, output, *stream);
+  putClip(call, output, *stream);
 }
 
 void checkFlags(const Call& call, const std::string& name) {
@@ -129,7 +129,7 @@ void run(Call& call) {
   checkFlags(call, name);
   const Layout layout = layoutOf(call.arguments);
   const std::vector<LossCode> allowed = allowedLosses(call.arguments);
-  std::optional<std::string> output;
+  std::optional<ClipName> output;
   if (call.arguments.has(Flag::output)) {
     output = clipOutput(call, {name, call.arguments.value(Flag::cameras)});
     if (!mayGetClip(call, *output)) return;

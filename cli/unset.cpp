@@ -47,12 +47,15 @@ const Verb unsetVerb = {
     .examples =
         "oxmv unset clip.colr LOGC \"Reel name ALT\"\n"
         "oxmv unset --dry-run clip.colr COL1/SATU TAG/ISO\n"
+        "oxmv unset @override LOOK LCRC\n"
         "oxmv unset - GUID < clip.colr > copy.colr\n",
     .details =
-        "A TAG is its four letters or its label; one that stands in another is COL1/TAG, and\n"
-        "an entry of a group TAG/NAME or REG/NAME. Exit code 1 when a tag is not there; the\n"
-        "others are removed. The file is replaced whole or not at all. CLIP - reads standard\n"
-        "input and writes standard output. --dry-run shows what would go.\n",
+        "CLIP is what it is in oxmv help show, but for @last. The file of an eye goes with its\n"
+        "last tag; any other clip is left empty. A TAG is its four letters or its label; one\n"
+        "that stands in another is COL1/TAG, and an entry of a group TAG/NAME or REG/NAME. Exit\n"
+        "code 1 when a tag is not there; the others are removed. The file is replaced whole or\n"
+        "not at all. CLIP - reads standard input and writes standard output. --dry-run shows\n"
+        "what would go.\n",
     .flags = flags,
     .fewestWords = 2,
     .mostWords = anyNumber,

@@ -10,6 +10,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "oxmv/platform/Descriptor.h"
+
 namespace oxmv {
 namespace {
 
@@ -29,27 +31,6 @@ static_assert(maxFileSize == std::size_t{256} * 1024 * 1024, "the message names 
 
 using Content = std::vector<std::uint8_t>;
 
-std::error_code lastError() { return {errno, std::generic_category()}; }
-
-// A file descriptor that closes itself.
-class Descriptor {
- public:
-  explicit Descriptor(int number) : number_(number) {}
-  Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
-  Descriptor& operator=(Descriptor&&) = delete;
-  ~Descriptor() {
-    if (isOpen()) ::close(number_);
-  }
-
-  bool isOpen() const { return number_ >= 0; }
-  int number() const { return number_; }
-  // Some file systems tell only here that what was written has not arrived.
-  bool close() { return ::close(std::exchange(number_, -1)) == 0; }
-
- private:
-  int number_;
-};
-
 // What keeps a path from naming a file; none when nothing does.
 std::error_code objectionTo(const std::filesystem::path& path) {
   if (path.native().find('\0') != std::string::npos)
@@ -57,57 +38,22 @@ std::error_code objectionTo(const std::filesystem::path& path) {
   return {};
 }
 
-// What keeps a file of this kind and size from being ours; none when nothing does.
-std::error_code objectionTo(const struct stat& status) {
-  if (S_ISDIR(status.st_mode)) return make_error_code(std::errc::is_a_directory);
-  if (!S_ISREG(status.st_mode)) return FileError::notRegular;
-  return {};
-}
+struct OpenFile {
+  Descriptor file;
+  std::uintmax_t size;
+};
 
-// Opened for reading if it is a regular file; else not open, with the cause in `error`.
-Descriptor openFile(const std::filesystem::path& path, struct stat& status,
-                    std::error_code& error) {
+// Opened for reading if it is a regular file; else nothing, with the cause in `error`.
+std::optional<OpenFile> openFile(const std::filesystem::path& path, std::error_code& error) {
   error = objectionTo(path);
-  if (error) return Descriptor(-1);
+  if (error) return std::nullopt;
   // Non-blocking, so that a pipe without a writer answers at once; it means nothing to a regular
   // file.
   Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
-  if (!file.isOpen() || ::fstat(file.number(), &status) != 0) {
-    error = lastError();
-  } else {
-    error = objectionTo(status);
-  }
-  return error ? Descriptor(-1) : std::move(file);
-}
-
-// Reads until `content` is full or the file ends. Answers how many bytes that were; nothing, with the
-// cause in `error`, when the reading fails.
-std::optional<std::size_t> readInto(std::span<std::uint8_t> content, int file,
-                                    std::error_code& error) {
-  std::size_t size = 0;
-  while (size < content.size()) {
-    const ssize_t count = ::read(file, content.data() + size, content.size() - size);
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return error = lastError(), std::nullopt;
-    if (count == 0) break;
-    size += static_cast<std::size_t>(count);
-  }
-  return size;
-}
-
-// `content` comes with the size that is expected.
-bool readAll(int file, std::vector<std::uint8_t>& content, std::error_code& error) {
-  std::size_t size = 0;
-  for (;;) {
-    const auto count = readInto(std::span(content).subspan(size), file, error);
-    if (!count) return false;
-    size += *count;
-    if (size > maxFileSize) return error = FileError::tooLarge, false;
-    if (size < content.size()) break;
-    content.resize(std::min(std::max<std::size_t>(2 * size, 4096), maxFileSize + 1));
-  }
-  content.resize(size);
-  return true;
+  if (!file.isOpen()) return error = lastError(), std::nullopt;
+  const auto size = regularSize(file, error);
+  if (!size) return std::nullopt;
+  return OpenFile{std::move(file), *size};
 }
 
 bool writeAll(int file, std::span<const std::uint8_t> content) {
@@ -176,26 +122,25 @@ std::error_code make_error_code(FileError error) noexcept {
 
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error) {
-  struct stat status = {};
-  const Descriptor file = openFile(path, status, error);
-  if (!file.isOpen()) return std::nullopt;
-  const auto size = static_cast<std::uintmax_t>(status.st_size);
-  if (size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
-  std::vector<std::uint8_t> content(static_cast<std::size_t>(size) +
-                                    1);  // one more, to meet the end in one go
-  if (!readAll(file.number(), content, error)) return std::nullopt;
+  const auto open = openFile(path, error);
+  if (!open) return std::nullopt;
+  if (open->size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
+  // One more, to meet the end in one go.
+  std::vector<std::uint8_t> content(static_cast<std::size_t>(open->size) + 1);
+  const auto size = readToEnd(content, 0, open->file, error);
+  if (!size) return std::nullopt;
+  content.resize(*size);
   return content;
 }
 
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
                                                        std::size_t count, std::error_code& error,
                                                        bool* isOpened) {
-  struct stat status = {};
-  const Descriptor file = openFile(path, status, error);
-  if (isOpened != nullptr) *isOpened = file.isOpen();
-  if (!file.isOpen()) return std::nullopt;
+  const auto open = openFile(path, error);
+  if (isOpened != nullptr) *isOpened = open.has_value();
+  if (!open) return std::nullopt;
   std::vector<std::uint8_t> content(count);
-  const auto size = readInto(content, file.number(), error);
+  const auto size = readInto(content, open->file, error);
   if (!size) return std::nullopt;
   content.resize(*size);
   return content;
@@ -220,7 +165,7 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
   struct stat replaced = {};
   const bool isThere = ::lstat(target.c_str(), &replaced) == 0;
   if (!isThere && errno != ENOENT) return error = lastError(), false;
-  if (isThere && (error = objectionTo(replaced))) return false;
+  if (isThere && (error = objectionToKind(replaced))) return false;
 
   const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
   // Now, so that nothing but the synchronisation itself can fail once the file has its name.

@@ -48,11 +48,23 @@ Setting lookUp(const SettingRow& row, Host& host, std::string_view appID) {
 }
 
 std::string overrideFilePath(std::string_view appID) {
-  return overrideFolder(*host(), appID) + "/override.colr";
+  return overrideFilePathIn(overrideFolder(*host(), appID));
 }
 
 std::string lastFilePath(std::string_view appID) {
-  return overrideFolder(*host(), appID) + "/last";
+  return lastFilePathIn(overrideFolder(*host(), appID));
+}
+
+std::string overrideFilePathIn(std::string_view folder) {
+  return std::string(folder) + "/override.colr";
+}
+
+std::string lastFilePathIn(std::string_view folder) { return std::string(folder) + "/last"; }
+
+std::string databaseFolderPath(std::string_view appID) {
+  const auto current = host();
+  const std::string luts = lookUp(lutsFolderSetting, *current, appID).value;
+  return luts + '/' + lookUp(databaseFolderSetting, *current, appID).value;
 }
 
 std::string clipFilePath(const myGUID& guid, std::string_view appID) {

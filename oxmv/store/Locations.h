@@ -63,6 +63,13 @@ std::string overrideFilePath(std::string_view appID);
 // The "last" file. Stores the default of the folder likewise.
 std::string lastFilePath(std::string_view appID);
 
+// The same two within a folder that is known already.
+std::string overrideFilePathIn(std::string_view folder);
+std::string lastFilePathIn(std::string_view folder);
+
+// The folder of the clip database, in which the clips below are unless a template says otherwise.
+std::string databaseFolderPath(std::string_view appID);
+
 // A clip's combined file.
 std::string clipFilePath(const myGUID& guid, std::string_view appID);
 

@@ -50,6 +50,9 @@ bool isHidden(char32_t code) noexcept {
 }
 
 std::string visible(std::string_view text) {
+  // Nearly every text is plain.
+  if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c < 0x7F; }))
+    return std::string(text);
   std::string shown;
   shown.reserve(text.size());
   while (!text.empty()) {

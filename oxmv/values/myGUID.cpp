@@ -24,6 +24,14 @@ void appendHex(std::string& text, unsigned long number, int digits) {
   }
 }
 
+// The value of a hexadecimal digit; 16 for any other character.
+unsigned digitOf(char c) {
+  if (c >= '0' && c <= '9') return static_cast<unsigned>(c - '0');
+  if (c >= 'a' && c <= 'f') return static_cast<unsigned>(c - 'a') + 10;
+  if (c >= 'A' && c <= 'F') return static_cast<unsigned>(c - 'A') + 10;
+  return 16;
+}
+
 }  // namespace
 
 void copyOverImage(myGUID& guid, std::span<const std::uint8_t> image) noexcept {
@@ -53,6 +61,26 @@ std::string guidText(const myGUID& guid) {
     appendHex(text, guid.Data4[i], 2);
   }
   return text;
+}
+
+std::optional<myGUID> guidFromText(std::string_view text) noexcept {
+  constexpr std::string_view form = "xxxxxxxx-xxxx-xxxx-xxxx-xxxxxxxxxxxx";
+  if (text.size() != form.size()) return std::nullopt;
+  std::array<std::uint8_t, 16> bytes{};  // in the order of the text
+  std::size_t digits = 0;
+  for (std::size_t i = 0; i < form.size(); ++i) {
+    const unsigned digit = digitOf(text[i]);
+    if (form[i] == '-' ? text[i] != '-' : digit == 16) return std::nullopt;
+    if (form[i] == '-') continue;
+    bytes[digits / 2] = static_cast<std::uint8_t>(bytes[digits / 2] * 16u + digit);
+    ++digits;
+  }
+  const auto word = [&](std::size_t at) {
+    return static_cast<std::uint16_t>(bytes[at] << 8 | bytes[at + 1]);
+  };
+  myGUID guid{(static_cast<unsigned long>(word(0)) << 16) | word(2), word(4), word(6), {}};
+  std::copy(bytes.begin() + 8, bytes.end(), guid.Data4.begin());
+  return guid;
 }
 
 }  // namespace oxmv

@@ -5,8 +5,10 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 
 namespace oxmv {
 
@@ -28,5 +30,8 @@ void copyOverImage(myGUID& guid, std::span<const std::uint8_t> image) noexcept;
 
 // "00112233-4455-6677-8899-AABBCCDDEEFF": upper case; Data1 by its low 32 bits.
 std::string guidText(const myGUID& guid);
+
+// The GUID that such a text names; its digits may be of either case. Nothing for any other text.
+std::optional<myGUID> guidFromText(std::string_view text) noexcept;
 
 }  // namespace oxmv

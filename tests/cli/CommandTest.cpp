@@ -41,7 +41,7 @@ TEST(Command, HelpBeginsWithExamples) {
 
 TEST(Command, HelpOfEachVerbBeginsWithExamples) {
   for (const std::string verb : {"show", "get", "set", "unset", "diff", "dump", "check", "encode",
-                                 "tags", "demo", "help", "version"}) {
+                                 "tags", "prefs", "paths", "demo", "help", "version"}) {
     const Outcome help = run({"help", verb});
     EXPECT_EQ(help.exitCode, 0) << verb;
     EXPECT_EQ(help.err, "") << verb;

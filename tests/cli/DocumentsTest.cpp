@@ -10,6 +10,8 @@
 
 #include <gtest/gtest.h>
 
+#include "tests/support/TempDir.h"
+
 namespace {
 
 std::string contentOf(const std::string& path) {
@@ -54,8 +56,12 @@ std::vector<Example> examplesIn(const std::string& block) {
 // What a shell in the source folder prints, to either stream, with our command first in its path.
 std::string outputOf(const std::string& command) {
   const std::string folder = std::filesystem::path(OXMV_COMMAND).parent_path().string();
-  const std::string line =
-      "cd '" OXMV_SOURCE_DIR "' && PATH='" + folder + "':$PATH && { " + command + "; } 2>&1";
+  const oxmv::test::TempDir temporary;  // what an example makes there goes with it
+  // The preferences of whoever runs the tests are none of the documents' business.
+  const std::string line = "export HOME=/nonexistent TMPDIR='" + temporary.path().string() +
+                           "'; unset XDG_CONFIG_HOME XDG_CONFIG_DIRS OXMV_DB OXMV_LOOKS; "
+                           "cd '" OXMV_SOURCE_DIR "' && PATH='" +
+                           folder + "':$PATH && { " + command + "; } 2>&1";
   std::FILE* pipe = ::popen(line.c_str(), "r");
   std::string output;
   for (int c = std::fgetc(pipe); c != EOF; c = std::fgetc(pipe)) output += static_cast<char>(c);

@@ -35,6 +35,16 @@ TEST_F(Locations, ClipIsInTheDatabaseWithinTheLooks) {
   EXPECT_TRUE(host->synchronisations.empty());
 }
 
+TEST_F(Locations, DatabaseIsTheFolderOfItsClips) {
+  EXPECT_EQ(databaseFolderPath(appID), "/Library/Application Support/Ombrix/LUTs/db");
+  preferences()["LUTsPath"] = "/looks";
+  preferences()["CurrentDBPath"] = "/clips";
+  EXPECT_EQ(databaseFolderPath(appID), "/looks//clips");
+  EXPECT_TRUE(clipFilePath(guid, appID).starts_with("/looks//clips/"));
+  EXPECT_EQ(preferences().size(), 2u);
+  EXPECT_TRUE(host->synchronisations.empty());
+}
+
 TEST_F(Locations, EyesAreBesideTheirClip) {
   const std::string stem =
       "/Library/Application Support/Ombrix/LUTs/db/00112233-4455-6677-8899-AABBCCDDEE0F.";

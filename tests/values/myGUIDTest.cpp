@@ -1,5 +1,7 @@
 #include <numeric>
+#include <optional>
 #include <span>
+#include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -106,6 +108,34 @@ TEST(myGUID, TextIsUpperCaseIn8And4And4And4And12Digits) {
       guidText({0x0A1B2C3D, 0x4E5F, 0x0607, {0x08, 0x09, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0x0F}}),
       "0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F");
   EXPECT_EQ(guidText({}), "00000000-0000-0000-0000-000000000000");
+}
+
+TEST(myGUID, IsReadFromItsTextInEitherCase) {
+  const myGUID guid = {
+      0x0A1B2C3D, 0x4E5F, 0x0607, {0x08, 0x09, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0x0F}};
+  EXPECT_EQ(guidFromText("0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F"), guid);
+  EXPECT_EQ(guidFromText("0a1b2c3d-4e5f-0607-0809-aabbccddee0f"), guid);
+  EXPECT_EQ(guidFromText("00000000-0000-0000-0000-000000000000"), myGUID());
+  EXPECT_EQ(
+      guidFromText("FFFFFFFF-FFFF-FFFF-FFFF-FFFFFFFFFFFF"),
+      (myGUID{0xFFFFFFFFu, 0xFFFF, 0xFFFF, {0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF}}));
+}
+
+TEST(myGUID, IsNotReadFromAnyOtherText) {
+  const std::string good = "0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F";
+  for (std::size_t size = 0; size < good.size(); ++size)
+    EXPECT_EQ(guidFromText(good.substr(0, size)), std::nullopt) << size;
+  for (std::size_t at = 0; at < good.size(); ++at) {
+    for (const char wrong : {'G', ' ', '/', ':', '@', '`', '\0', '\xFF', '-', '0'}) {
+      std::string text = good;
+      text[at] = wrong;
+      const bool isGood = (wrong == '0') != (good[at] == '-') && (wrong == '0' || wrong == '-');
+      EXPECT_EQ(guidFromText(text).has_value(), isGood) << text;
+    }
+  }
+  EXPECT_EQ(guidFromText(good + "0"), std::nullopt);
+  EXPECT_EQ(guidFromText("{" + good + "}"), std::nullopt);
+  EXPECT_EQ(guidFromText(" " + good.substr(1)), std::nullopt);
 }
 
 TEST(myGUID, TextShowsTheLow32BitsOfData1) {

@@ -1,0 +1,101 @@
+#include "oxmv/metadata/TagPicker.h"
+
+#include <algorithm>
+#include <cstddef>
+#include <string_view>
+
+#include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagStreamFormat.h"
+#include "oxmv/metadata/TagTable.h"
+#include "oxmv/values/Dictionary.h"
+#include "oxmv/values/LittleEndian.h"
+
+namespace oxmv {
+namespace {
+
+// The value of a record whose payload is all there. Answers false when that takes a decoder.
+bool interpret(const TagRow& row, std::span<const std::uint8_t> payload, Value& value) {
+  switch (row.read) {
+    case Read::text: {
+      const auto end = std::find(payload.begin(), payload.end(), std::uint8_t{0});
+      value = std::string_view(reinterpret_cast<const char*>(payload.data()),
+                               static_cast<std::size_t>(end - payload.begin()));
+      return true;
+    }
+    case Read::uint8:
+      if (payload.empty()) return false;
+      value = std::int32_t{payload[0]};
+      return true;
+    case Read::uint16:
+      if (payload.size() < 2) return false;
+      value = static_cast<std::int32_t>(loadLe16(payload.data()));
+      return true;
+    case Read::int32:
+      if (payload.size() < 4) return false;
+      value = static_cast<std::int32_t>(loadLe32(payload.data()));
+      return true;
+    case Read::none:
+    case Read::float32:
+    case Read::floats:
+    case Read::integers:
+    case Read::data:
+    case Read::guid:
+    case Read::nested:
+    case Read::texts:
+    case Read::ints:
+    case Read::nestedList:
+    case Read::controlPoint:
+    case Read::tagName:
+    case Read::tagValue:
+    case Read::regName:
+    case Read::regValue: return false;
+  }
+  return false;
+}
+
+// Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or whose
+// length wraps, and for values of other kinds.
+bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
+          std::span<Value> values) {
+  std::size_t at = 0;
+  while (at < stream.size()) {
+    const std::size_t left = stream.size() - at;
+    if (left < recordHeaderSize) return false;
+    const std::uint8_t* header = stream.data() + at;
+    const bool isMarker = at > 0 && header[0] == markerBytes[0] && header[1] == markerBytes[1];
+    const std::uint32_t size = loadLe24(header + 4);
+    const std::uint32_t length = recordLength(size);
+    if (isMarker || length < size || left - recordHeaderSize < size) return false;
+    const auto wanted = std::find(tags.begin(), tags.end(), Tag{loadLe32(header)});
+    if (wanted != tags.end()) {
+      const TagRow* row = findTagRow(*wanted);
+      const auto index = static_cast<std::size_t>(wanted - tags.begin());
+      const auto payload = stream.subspan(at + recordHeaderSize, size);
+      if (row == nullptr || !interpret(*row, payload, values[index])) return false;
+    }
+    if (left <= length) return true;
+    at += length;
+  }
+  return true;
+}
+
+}  // namespace
+
+void pickTags(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
+              std::vector<Value>& values) {
+  values.assign(tags.size(), Value());
+  if (step(stream, tags, values)) {
+    // Of a tag that is asked for twice the first one has it.
+    for (std::size_t i = 0; i < tags.size(); ++i)
+      values[i] = values[static_cast<std::size_t>(std::find(tags.begin(), tags.end(), tags[i]) -
+                                                  tags.begin())];
+    return;
+  }
+  const Dictionary all = decodeStream(stream, static_cast<std::int32_t>(stream.size()));
+  for (std::size_t i = 0; i < tags.size(); ++i) {
+    const auto characters = charactersOf(tags[i]);
+    values[i] = all[{characters.data(), characters.size()}];
+  }
+}
+
+}  // namespace oxmv
