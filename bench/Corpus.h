@@ -1,0 +1,41 @@
+// What the codecs are measured on: many clips of one size, each a dictionary of its own.
+//
+// Many, because a processor learns the branches of a few by heart: with some dozens of clips every
+// figure is half of what a user sees. Tags stand in shuffled order and values are random, the same
+// ones on every machine.
+
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string_view>
+#include <vector>
+
+#include "oxmv/values/Dictionary.h"
+
+namespace bench {
+
+using Bytes = std::vector<std::uint8_t>;
+
+struct Corpus {
+  std::string_view name;
+  std::vector<oxmv::Dictionary> clips;  // as decoded, so in the order in which all formats get them
+  std::vector<Bytes> streams;           // the same clips as tag streams
+  double meanStreamSize = 0;            // bytes
+};
+
+// small    12 tags                                                                     about 216 bytes
+// typical  60 tags, COL1 of 20 tags, "TAG " group of 15, 5 keywords                         2 KB
+// large    200 tags (170 and a COL1 of 30), 50 control points of 6 tags, 1,000 keywords    30 KB
+//
+// The first two hold 2,048 clips, the last one 128. Every clip has a WBAL. Made at the first call;
+// throws std::logic_error if a clip would not come back from its stream as it was.
+std::span<const Corpus> corpora();
+
+// One clip of `tagCount` tags that differ from clip to clip (at most 170, the plain ones there are),
+// `keywords` keywords and `controlPoints` control points of six tags.
+oxmv::Dictionary clipOf(std::uint32_t seed, std::size_t tagCount, std::size_t keywords,
+                        std::size_t controlPoints);
+
+}  // namespace bench
