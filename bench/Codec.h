@@ -18,6 +18,7 @@
 #pragma once
 
 #include <array>
+#include <map>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -51,8 +52,8 @@ struct Holding {
   std::vector<typename Codec::Document> documents;
 
   static const Holding& of(const Corpus& corpus) {
-    static std::array<Holding, 3> all;
-    Holding& holding = all[static_cast<std::size_t>(&corpus - corpora().data())];
+    static std::map<const Corpus*, Holding> all;
+    Holding& holding = all[&corpus];
     if (holding.streams.empty()) {
       for (const oxmv::Dictionary& clip : corpus.clips)
         holding.streams.push_back(Codec::streamOf(clip));

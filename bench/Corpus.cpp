@@ -151,7 +151,17 @@ Dictionary large(ClipMaker& maker) {
   return made;
 }
 
-Corpus makeCorpus(std::string_view name, std::size_t count, Dictionary (*make)(ClipMaker&)) {
+Dictionary (*makerOf(std::string_view name))(ClipMaker&) {
+  if (name == "small") return small;
+  if (name == "typical") return typical;
+  if (name == "large") return large;
+  throw std::logic_error("no corpus of that name: " + std::string(name));
+}
+
+}  // namespace
+
+Corpus makeCorpus(std::string_view name, std::size_t count) {
+  const auto make = makerOf(name);
   ClipMaker maker(seed);
   Corpus corpus{name, {}, {}, 0};
   double total = 0;
@@ -168,14 +178,9 @@ Corpus makeCorpus(std::string_view name, std::size_t count, Dictionary (*make)(C
   return corpus;
 }
 
-}  // namespace
-
 std::span<const Corpus> corpora() {
-  static const std::vector<Corpus> made = {
-      makeCorpus("small", 2048, small),
-      makeCorpus("typical", 2048, typical),
-      makeCorpus("large", 128, large),
-  };
+  static const std::vector<Corpus> made = {makeCorpus("small", 2048), makeCorpus("typical", 2048),
+                                           makeCorpus("large", 128)};
   return made;
 }
 

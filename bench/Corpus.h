@@ -25,12 +25,17 @@ struct Corpus {
   double meanStreamSize = 0;            // bytes
 };
 
-// small    12 tags                                                                     about 216 bytes
-// typical  60 tags, COL1 of 20 tags, "TAG " group of 15, 5 keywords                         2 KB
-// large    200 tags (170 and a COL1 of 30), 50 control points of 6 tags, 1,000 keywords    30 KB
+// `count` clips of one of three sizes. Every clip has a WBAL.
 //
-// The first two hold 2,048 clips, the last one 128. Every clip has a WBAL. Made at the first call;
-// throws std::logic_error if a clip would not come back from its stream as it was.
+//   small    12 tags                                                                   about 216 bytes
+//   typical  60 tags, COL1 of 20 tags, "TAG " group of 15, 5 keywords                       2 KB
+//   large    200 tags (170 and a COL1 of 30), 50 control points of 6 tags, 1,000 keywords  30 KB
+//
+// Throws std::logic_error for another name, and if a clip would not come back from its stream as it
+// was.
+Corpus makeCorpus(std::string_view name, std::size_t count);
+
+// All three, made at the first call: 2,048 clips of the first two sizes, 128 of the last one.
 std::span<const Corpus> corpora();
 
 // One clip of `tagCount` tags that differ from clip to clip (at most 170, the plain ones there are),
