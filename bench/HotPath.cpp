@@ -2,6 +2,7 @@
 //
 //   oxmv_hot_path OPERATION CORPUS COUNT     does it to COUNT different clips: "decode", "typical", 64
 //   oxmv_hot_path                            lists the operations and corpora, a pair a line
+//   oxmv_hot_path --built-with               what else decides about the count: compiler, library ...
 //
 // Everything before is prepared outside measured(), and no clip comes twice.
 
@@ -33,6 +34,30 @@ void list() {
   }
 }
 
+// Patch versions are left out: they mend compilers, and hardly ever change what these make.
+void printBuiltWith() {
+#if defined(__clang__)
+  std::printf("Clang %d", __clang_major__);
+#else
+  std::printf("GCC %d", __GNUC__);
+#endif
+#if defined(__GLIBC__)
+  std::printf(", glibc %d.%d", __GLIBC__, __GLIBC_MINOR__);
+#endif
+#if defined(__x86_64__)
+  std::printf(", x86-64");
+#elif defined(__aarch64__)
+  std::printf(", arm64");
+#else
+  std::printf(", %zu bits", 8 * sizeof(void*));
+#endif
+#if defined(__OPTIMIZE__) && defined(NDEBUG)
+  std::printf(", optimised\n");
+#else
+  std::printf(", for debugging\n");
+#endif
+}
+
 What whatOf(std::string_view name) {
   for (const What what : everything) {
     if (nameOf(what) == name) return what;
@@ -43,6 +68,10 @@ What whatOf(std::string_view name) {
 int run(int argc, char** argv) {
   if (argc == 1) {
     list();
+    return 0;
+  }
+  if (argc == 2 && std::string_view(argv[1]) == "--built-with") {
+    printBuiltWith();
     return 0;
   }
   if (argc != 4) throw std::logic_error("wants an operation, a corpus and a count");
