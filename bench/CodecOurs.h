@@ -27,13 +27,4 @@ struct CodecOurs {
   static void replaceBalance(Document& document);
 };
 
-// Each adds the operations of one codec.
-void addOurs();
-void addFloors();
-void addMsgpack();
-void addNlohmann();
-void addProtobuf();
-void addRapidJson();
-void addSimdjson();
-
 }  // namespace bench

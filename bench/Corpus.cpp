@@ -184,12 +184,12 @@ std::span<const Corpus> corpora() {
   return made;
 }
 
-Dictionary clipOf(std::uint32_t from, std::size_t tagCount, std::size_t keywords,
-                  std::size_t controlPoints) {
-  ClipMaker maker(from);
-  Dictionary made = maker.tags(tagCount);
-  if (keywords > 0) made.set("KWRd", maker.keywords(keywords));
-  if (controlPoints > 0) made.set("CTLp", maker.controlPoints(controlPoints));
+Dictionary growingClip(std::size_t scale) {
+  ClipMaker maker(seed);
+  Dictionary made = maker.tags(12);
+  made.set("KWRd", maker.keywords(16 * scale));
+  made.set("TAG ", maker.group(8 * scale));
+  made.set("CTLp", maker.controlPoints(2 * scale));
   return made;
 }
 

@@ -38,9 +38,8 @@ Corpus makeCorpus(std::string_view name, std::size_t count);
 // All three, made at the first call: 2,048 clips of the first two sizes, 128 of the last one.
 std::span<const Corpus> corpora();
 
-// One clip of `tagCount` tags that differ from clip to clip (at most 170, the plain ones there are),
-// `keywords` keywords and `controlPoints` control points of six tags.
-oxmv::Dictionary clipOf(std::uint32_t seed, std::size_t tagCount, std::size_t keywords,
-                        std::size_t controlPoints);
+// A clip of which everything that repeats grows with `scale`: 16 keywords, 8 entries of the "TAG "
+// group and 2 control points for each. The 12 tags beside them stay.
+oxmv::Dictionary growingClip(std::size_t scale);
 
 }  // namespace bench

@@ -53,4 +53,15 @@ std::vector<Operation>& operations();
 // every document, from one that they encoded, and from one that they edited. Throw std::logic_error.
 std::vector<std::function<void()>>& checks();
 
+// Adds the operations and checks of all codecs: ours, the peers and the floors. Each of these has a
+// file of its own.
+void addAll();
+void addOurs();
+void addMsgpack();
+void addNlohmann();
+void addProtobuf();
+void addRapidJson();
+void addSimdjson();
+void addFloors();
+
 }  // namespace bench

@@ -14,7 +14,6 @@
 
 #include <benchmark/benchmark.h>
 
-#include "CodecOurs.h"
 #include "Corpus.h"
 #include "Operation.h"
 #include "Report.h"
@@ -79,16 +78,6 @@ void printCorpora() {
     std::printf("%-8.*s %5zu clips of %.0f bytes\n", static_cast<int>(corpus.name.size()),
                 corpus.name.data(), corpus.clips.size(), corpus.meanStreamSize);
   }
-}
-
-void addAll() {
-  addOurs();
-  addMsgpack();
-  addNlohmann();
-  addProtobuf();
-  addRapidJson();
-  addSimdjson();
-  addFloors();
 }
 
 int run(int argc, char** argv) {
