@@ -1,5 +1,5 @@
 // Protocol buffers: a map from text to a choice of values, with lists of one kind where a clip has
-// lists. Each document has an arena of its own, which is how its makers advise to use it here.
+// lists. Each document has an arena of its own, so that dropping it is one step.
 
 #include <memory>
 
