@@ -11,8 +11,8 @@ sources = git ls-files -z --cached --others --exclude-standard -- '*.h' '*.cpp'
 
 MAKEFLAGS += --no-print-directory
 .NOTPARALLEL:
-.PHONY: help build demo test bench install format format-check tidy fuzz clean \
-        packages-build packages-test packages-bench packages-ci
+.PHONY: help build demo test bench instructions install format format-check tidy fuzz \
+        clean packages-build packages-test packages-bench packages-ci
 
 help: ## list these targets
 	@sed -nE 's/^([a-z-]+):[^#]*## (.*)/  make \1\t\2/p' Makefile | expand -t 20
@@ -30,9 +30,13 @@ test: packages-test ## install what the tests need, build and run every test
 	ctest --preset dev
 
 bench: packages-bench ## measure: install what that needs, build, run the benchmarks
-	cmake --preset release -D OXMV_BENCH=ON
-	cmake --build --preset release --target oxmv_bench
-	build/release/bench/oxmv_bench
+	cmake --preset release -B build/bench -D OXMV_BENCH=ON
+	cmake --build build/bench --target bench
+
+instructions: packages-bench ## compare the instruction counts of the hot paths with those on record
+	cmake --preset release -B build/bench -D OXMV_BENCH=ON
+	cmake --build build/bench --target oxmv_hot_path
+	bench/count-instructions build/bench/bench/oxmv_hot_path
 
 install: build ## install below PREFIX, by default /usr/local; DESTDIR is honoured
 	cmake --install build/release --prefix "$(PREFIX)"
