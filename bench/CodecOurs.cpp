@@ -1,7 +1,5 @@
 #include "CodecOurs.h"
 
-#include <utility>
-
 #include "Codec.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamEncoder.h"

@@ -1,5 +1,6 @@
 #include "Corpus.h"
 
+#include <algorithm>
 #include <random>
 #include <stdexcept>
 #include <string>

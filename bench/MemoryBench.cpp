@@ -12,9 +12,9 @@
 #include <cmath>
 #include <cstdio>
 #include <ctime>
-#include <functional>
-#include <span>
-#include <string_view>
+#include <exception>
+#include <stdexcept>
+#include <string>
 #include <vector>
 
 #include "Codec.h"

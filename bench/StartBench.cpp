@@ -6,10 +6,7 @@
 // Each is asked for its version, in turn, many times. Printed are medians: processor time of the
 // process, user and system, and its largest resident memory.
 
-#include <algorithm>
-#include <array>
 #include <cstdio>
-#include <cstring>
 #include <string>
 #include <vector>
 
