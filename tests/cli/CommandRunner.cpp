@@ -50,7 +50,7 @@ class MemoryFile {
 void clearEnvironment() {
   for (const char* name : {"NO_COLOR", "OXMV_DB", "OXMV_LOOKS"}) ::unsetenv(name);
   for (const char* name : {"HOME", "XDG_CONFIG_HOME", "XDG_CONFIG_DIRS"})
-    ::setenv(name, "/nonexistent", 1);
+    ::setenv(name, "/dev/null/nowhere", 1);
   ::setenv("OXMV", OXMV_COMMAND, 1);
 }
 

@@ -58,7 +58,7 @@ std::string outputOf(const std::string& command) {
   const std::string folder = std::filesystem::path(OXMV_COMMAND).parent_path().string();
   const oxmv::test::TempDir temporary;  // what an example makes there goes with it
   // The preferences of whoever runs the tests are none of the documents' business.
-  const std::string line = "export HOME=/nonexistent TMPDIR='" + temporary.path().string() +
+  const std::string line = "export HOME=/dev/null/nowhere TMPDIR='" + temporary.path().string() +
                            "'; unset XDG_CONFIG_HOME XDG_CONFIG_DIRS OXMV_DB OXMV_LOOKS; "
                            "cd '" OXMV_SOURCE_DIR "' && PATH='" +
                            folder + "':$PATH && { " + command + "; } 2>&1";

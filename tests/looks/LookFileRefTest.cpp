@@ -30,11 +30,10 @@ Bytes get(const fs::path& path) {
 
 // The file of a look of one point.
 Bytes lookFile(std::string_view magic, const Bytes& version, std::string_view name) {
-  Bytes bytes(magic.begin(), magic.end());
-  bytes.insert(bytes.end(), version.begin(), version.end());
-  bytes.resize(24);
-  bytes.insert(bytes.end(), name.begin(), name.end());
-  bytes.resize(76);
+  Bytes bytes(76);
+  std::copy(magic.begin(), magic.end(), bytes.begin());
+  std::copy(version.begin(), version.end(), bytes.begin() + 4);
+  std::copy(name.begin(), name.end(), bytes.begin() + 24);
   return bytes;
 }
 
