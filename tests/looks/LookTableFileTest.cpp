@@ -1,3 +1,4 @@
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -12,11 +13,10 @@ using Bytes = std::vector<std::uint8_t>;
 
 // The start of a look-table file.
 Bytes start(std::string_view magic, const Bytes& version, std::string_view name = "Warm") {
-  Bytes bytes(magic.begin(), magic.end());
-  bytes.insert(bytes.end(), version.begin(), version.end());
-  bytes.resize(24);
-  bytes.insert(bytes.end(), name.begin(), name.end());
-  bytes.resize(64);
+  Bytes bytes(64);
+  std::copy(magic.begin(), magic.end(), bytes.begin());
+  std::copy(version.begin(), version.end(), bytes.begin() + 4);
+  std::copy(name.begin(), name.end(), bytes.begin() + 24);
   return bytes;
 }
 
