@@ -46,10 +46,11 @@ class LookFileRef {
   static LookFileRef initFromRef(const LookFileRef& other);
 
   // Imports a look description (see LookDescription.h): writes each of its tables to a look-table file
-  // in the look-table folder, and a copy of the description beside them. Answers the reference to the
-  // last look that was written; the empty reference when none was: the file cannot be read, is not
-  // well-formed, has no table, or every look is there already, which is never written anew. Files that
-  // cannot be written are written off: the answer does not depend on it.
+  // in the look-table folder, and a copy of the description beside them, unless a file of that name is
+  // there. Answers the reference to the last look that was new, whether its file could be written or
+  // not; the empty reference when none was: the file cannot be read, is not well-formed, has no table,
+  // or every look is there already, and such a file is never written anew. What one import may write
+  // is limited (see LookImport.h).
   //
   // Nothing, after an alert of the host, when a table comes before its size or a size is above 64.
   // What was written before stays.

@@ -1,5 +1,6 @@
 #include "oxmv/looks/LookImport.h"
 
+#include <set>
 #include <string>
 #include <vector>
 
@@ -10,8 +11,6 @@
 
 namespace oxmv {
 namespace {
-
-using Bytes = std::vector<std::uint8_t>;
 
 class Import {
  public:
@@ -24,15 +23,14 @@ class Import {
 
   std::optional<LookFileRef> run() {
     std::error_code error;
-    const auto file = readWholeFile(path_, error);
-    if (!file) {
+    file_ = readWholeFile(path_, error);
+    if (!file_) {
       stop({LookImportStop::unreadable, error, 0, {}, 0});
       return look_;
     }
-    file_ = &*file;
     // The whole file is judged before anything is written.
     LookProblem problem;
-    const auto description = LookDescription::parse(*file, &problem);
+    const auto description = LookDescription::parse(*file_, &problem);
     if (!description) {
       stop({LookImportStop::notWellFormed, {}, problem.offset, problem.what, 0});
       return look_;
@@ -74,8 +72,10 @@ class Import {
     report.values = record_.readTable(node.text);
     report.crc =
         calccrc(record_.table().data(), static_cast<std::ptrdiff_t>(report.values.stored * 4));
-    report.isNew = look_.generateLUTFile(static_cast<std::int32_t>(report.crc), record_.bytes(),
+    report.isNew = !current_.contains(report.crc) &&
+                   look_.generateLUTFile(static_cast<std::int32_t>(report.crc), record_.bytes(),
                                          size_, fileName_, &report.writeError);
+    if (!report.writeError) current_.insert(report.crc);
     if (report.isNew) {
       bytesLeft_ -= lookFileSize(size_);
       copyDescription(report);
@@ -112,9 +112,12 @@ class Import {
   LookImportObserver* observer_;
   std::uint64_t bytesLeft_;
 
-  const Bytes* file_ = nullptr;
+  std::optional<std::vector<std::uint8_t>> file_;
   std::int32_t size_ = 0;  // N, of the "LUT" element at hand
   OXLookFileRecord record_;
+  // The files met or written that are current. They are not looked for again: a hostile description
+  // may have millions of tables, all alike.
+  std::set<std::uint32_t> current_;
   LookFileRef look_;
 };
 

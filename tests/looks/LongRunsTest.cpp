@@ -1,5 +1,6 @@
-#include <random>
+#include <algorithm>
 #include <string>
+#include <vector>
 
 #include <gtest/gtest.h>
 

@@ -254,6 +254,31 @@ TEST_F(LookImport, TheLastWrittenIsTheAnswerAlsoBeforeOneThatIsThere) {
   EXPECT_FALSE(witness.tables.at(1).isNew);
 }
 
+TEST_F(LookImport, TableThatIsThereTwiceIsWrittenOnce) {
+  const auto look =
+      import("<look><LUT><size>1</size><a>0000803F</a><b>0000003F</b><c>0000803F</c></LUT></look>");
+  ASSERT_EQ(witness.tables.size(), 3u);
+  EXPECT_FALSE(witness.tables[2].isNew);
+  EXPECT_EQ(witness.tables[2].copy, Copy::notTried);
+  EXPECT_EQ(look->CRC(), witness.tables[1].crc);
+}
+
+TEST_F(LookImport, TableThatCouldNotBeWrittenIsTriedAgain) {
+  host->strings["OXMVLutsPath"] = folder / "missing";
+  import("<look><LUT><size>1</size><a>0000803F</a><b>0000803F</b></LUT></look>");
+  ASSERT_EQ(witness.tables.size(), 2u);
+  EXPECT_TRUE(witness.tables[1].isNew);
+  EXPECT_TRUE(witness.tables[1].writeError);
+}
+
+TEST_F(LookImport, MillionTablesAlikeAreOneFile) {
+  std::string description = "<look><LUT><size>64</size>";
+  for (int i = 0; i < 1000000; ++i) description += "<a/>";
+  put(folder / "Warm.xml", description + "</LUT></look>");
+  EXPECT_EQ(LookFileRef::initFromLookFile(folder / "Warm.xml")->CRC(), 0u);
+  EXPECT_EQ(files().size(), 2u);
+}
+
 TEST_F(LookImport, SizeHoldsUntilTheNextWithinItsLut) {
   import("<look><LUT><size>2</size><a>1</a><size>1</size><a>2</a><a>3</a></LUT></look>");
   ASSERT_EQ(witness.tables.size(), 3u);
