@@ -46,9 +46,15 @@ class MemoryFile {
   int descriptor_;
 };
 
-[[noreturn]] void become(std::vector<std::string> words) {
-  ::unsetenv("NO_COLOR");
+// Nothing of the user who runs the tests reaches the command, and it writes nowhere in their home.
+void clearEnvironment() {
+  for (const char* name : {"NO_COLOR", "OXMV_DB", "OXMV_LOOKS"}) ::unsetenv(name);
+  for (const char* name : {"HOME", "XDG_CONFIG_HOME", "XDG_CONFIG_DIRS"})
+    ::setenv(name, "/nonexistent", 1);
   ::setenv("OXMV", OXMV_COMMAND, 1);
+}
+
+[[noreturn]] void become(std::vector<std::string> words) {
   std::vector<char*> argv;
   for (std::string& word : words) argv.push_back(word.data());
   argv.push_back(nullptr);
@@ -63,12 +69,17 @@ int exitCodeOf(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
-Outcome runWords(const std::vector<std::string>& words, std::string_view input) {
+Outcome runWords(const std::vector<std::string>& words, std::string_view input,
+                 const std::vector<std::string>& environment = {}) {
   const MemoryFile in(input);
   const MemoryFile out;
   const MemoryFile err;
   const pid_t child = ::fork();
   if (child == 0) {
+    clearEnvironment();
+    for (const std::string& variable : environment)
+      ::setenv(variable.substr(0, variable.find('=')).c_str(),
+               variable.substr(variable.find('=') + 1).c_str(), 1);
     ::dup2(in.descriptor(), STDIN_FILENO);
     ::dup2(out.descriptor(), STDOUT_FILENO);
     ::dup2(err.descriptor(), STDERR_FILENO);
@@ -90,6 +101,11 @@ Outcome run(const std::vector<std::string>& arguments, std::string_view input) {
   return runWords(commandWith(arguments), input);
 }
 
+Outcome runWith(const std::vector<std::string>& environment,
+                const std::vector<std::string>& arguments, std::string_view input) {
+  return runWords(commandWith(arguments), input, environment);
+}
+
 Outcome runShell(const std::string& script) { return runWords({"/bin/sh", "-c", script}, {}); }
 
 Outcome runOnTerminal(const std::vector<std::string>& arguments,
@@ -98,6 +114,7 @@ Outcome runOnTerminal(const std::vector<std::string>& arguments,
   const pid_t child = ::forkpty(&terminal, nullptr, nullptr, nullptr);
   if (child < 0) throw std::runtime_error("no terminal");
   if (child == 0) {
+    clearEnvironment();
     std::vector<std::string> words = {"/usr/bin/env", "TERM=xterm"};
     words.insert(words.end(), environment.begin(), environment.end());
     for (const std::string& word : commandWith(arguments)) words.push_back(word);

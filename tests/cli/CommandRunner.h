@@ -18,8 +18,12 @@ struct Outcome {
 };
 
 // The command with these arguments. `input` is what standard input holds. Neither output is a
-// terminal, and the environment says nothing of colours.
+// terminal, and the environment says nothing of colours, folders or preferences.
 Outcome run(const std::vector<std::string>& arguments, std::string_view input = {});
+
+// The same with these variables in the environment: "NAME=VALUE".
+Outcome runWith(const std::vector<std::string>& environment,
+                const std::vector<std::string>& arguments, std::string_view input = {});
 
 // A shell script, in which "$OXMV" is the command.
 Outcome runShell(const std::string& script);
