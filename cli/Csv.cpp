@@ -32,6 +32,8 @@ std::string_view withoutLeadingBlanks(std::string_view text) {
 
 }  // namespace
 
+std::string csvField(std::string_view text) { return field(visible(text)); }
+
 CsvWriter::CsvWriter(Sink& sink, std::string_view columns) : sink_(sink) {
   std::string line = "file";
   for (bool isLast = false; !isLast;) {

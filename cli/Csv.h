@@ -12,6 +12,9 @@
 
 namespace oxmv::cli {
 
+// A text as a field: visible, and in quotes where it would end the field.
+std::string csvField(std::string_view text);
+
 class CsvWriter {
  public:
   // `columns`: tags or labels, with commas between them. Throws UsageError when one is neither.

@@ -13,7 +13,8 @@ namespace {
 
 constexpr auto all = std::to_array<const Verb*>(
     {&showVerb, &getVerb, &setVerb, &unsetVerb, &diffVerb, &dumpVerb, &checkVerb, &encodeVerb,
-     &tagsVerb, &stillVerb, &demoVerb, &helpVerb, &versionVerb});
+     &tagsVerb, &lookListVerb, &lookInfoVerb, &lookImportVerb, &lookLintVerb, &lookCheckVerb,
+     &lookInitVerb, &stillVerb, &demoVerb, &helpVerb, &versionVerb});
 
 std::string_view firstWord(std::string_view name) { return name.substr(0, name.find(' ')); }
 

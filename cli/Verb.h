@@ -46,6 +46,8 @@ constexpr std::size_t anyNumber = static_cast<std::size_t>(-1);
 
 extern const Verb showVerb, getVerb, setVerb, unsetVerb, diffVerb, dumpVerb, checkVerb, encodeVerb,
     tagsVerb, stillVerb, demoVerb, helpVerb, versionVerb;
+extern const Verb lookListVerb, lookInfoVerb, lookImportVerb, lookLintVerb, lookCheckVerb,
+    lookInitVerb;
 
 // Every verb, in the order in which help lists them.
 std::span<const Verb* const> verbs() noexcept;
