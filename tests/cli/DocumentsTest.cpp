@@ -10,6 +10,8 @@
 
 #include <gtest/gtest.h>
 
+#include "tests/support/TempDir.h"
+
 namespace {
 
 std::string contentOf(const std::string& path) {
@@ -51,11 +53,12 @@ std::vector<Example> examplesIn(const std::string& block) {
   return examples;
 }
 
-// What a shell in the source folder prints, to either stream, with our command first in its path.
-std::string outputOf(const std::string& command) {
+// What a shell in the source folder prints, to either stream, with our command first in its path and
+// the look tables in a folder of their own.
+std::string outputOf(const std::string& command, const std::string& looks) {
   const std::string folder = std::filesystem::path(OXMV_COMMAND).parent_path().string();
-  const std::string line =
-      "cd '" OXMV_SOURCE_DIR "' && PATH='" + folder + "':$PATH && { " + command + "; } 2>&1";
+  const std::string line = "cd '" OXMV_SOURCE_DIR "' && export OXMV_LOOKS='" + looks +
+                           "' && PATH='" + folder + "':$PATH && { " + command + "; } 2>&1";
   std::FILE* pipe = ::popen(line.c_str(), "r");
   std::string output;
   for (int c = std::fgetc(pipe); c != EOF; c = std::fgetc(pipe)) output += static_cast<char>(c);
@@ -64,10 +67,12 @@ std::string outputOf(const std::string& command) {
 }
 
 TEST(Documents, ReadmeShowsWhatTheCommandPrints) {
+  const oxmv::test::TempDir looks;
   std::size_t count = 0;
   for (const std::string& block : blocksOf(contentOf("README.md"), "console")) {
     for (const Example& example : examplesIn(block)) {
-      EXPECT_EQ(outputOf(example.command), example.output) << example.command;
+      EXPECT_EQ(outputOf(example.command, looks.path().string()), example.output)
+          << example.command;
       ++count;
     }
   }
