@@ -46,6 +46,9 @@ class NameJudge final : public XmlVisitor {
  public:
   explicit NameJudge(std::vector<LookFinding>& findings) : findings_(findings) {}
 
+  // The root, if it is one of them. It may have any name where a "LUT" stands below it.
+  std::optional<LookFinding> root;
+
   bool onElementStart(std::string_view name, std::size_t offset) override {
     ++depth_;
     const std::string_view bare = name.substr(name.rfind(':') + 1);
@@ -71,19 +74,20 @@ class NameJudge final : public XmlVisitor {
 
  private:
   void judgeLut(std::string_view name, std::size_t offset) {
-    if (depth_ == 2) {
+    const std::string shown = visible(name);
+    if (depth_ == 1) {
+      root = {"misplaced-lut",
+              fmt::format("<{}> is the root: put another element around it, as in "
+                          "<look><LUT>...</LUT></look>",
+                          shown),
+              offset};
+    } else if (depth_ == 2) {
       add("misspelt-lut",
-          fmt::format("<{}> is passed over: tables are in elements <LUT>, in capitals",
-                      visible(name)),
+          fmt::format("<{}> is passed over: tables are in elements <LUT>, in capitals", shown),
           offset);
     } else {
       add("misplaced-lut",
-          depth_ == 1 ? fmt::format("<{}> is the root: put another element around it, as in "
-                                    "<look><LUT>...</LUT></look>",
-                                    visible(name))
-                      : fmt::format("<{}> is passed over: it must stand right below the root",
-                                    visible(name)),
-          offset);
+          fmt::format("<{}> is passed over: it must stand right below the root", shown), offset);
     }
   }
 
@@ -113,9 +117,12 @@ class Lint {
     if (hasTooManyTables(*description)) return std::move(findings_);
     NameJudge names(findings_);
     walkXml(file_, names);
-    bool hasLut = std::any_of(findings_.begin(), findings_.end(), [](const LookFinding& finding) {
-      return finding.code == "misspelt-lut" || finding.code == "misplaced-lut";
-    });
+    const bool isMisnamed =
+        names.root ||
+        std::any_of(findings_.begin(), findings_.end(), [](const LookFinding& finding) {
+          return finding.code == "misspelt-lut" || finding.code == "misplaced-lut";
+        });
+    bool hasLut = false;
     judgeFileName();
     for (std::size_t i = 0; i < description->nodeCount(); ++i) {
       const LookNode node = description->node(i);
@@ -123,7 +130,8 @@ class Lint {
       take(node);
     }
     endLut();
-    if (!hasLut)
+    if (!hasLut && names.root) findings_.push_back(*std::move(names.root));
+    if (!hasLut && !isMisnamed)
       add("no-table", "no element <LUT> right below the root: there is nothing to import");
     if (second_)
       add("several-tables",

@@ -1,6 +1,7 @@
 #include "cli/LookSpace.h"
 
 #include <algorithm>
+#include <iterator>
 #include <string_view>
 
 #include "cli/LookFindings.h"
@@ -21,22 +22,23 @@ void cutAround(std::string_view file, std::span<const std::uint8_t> bytes, const
   const std::size_t end = std::min(file.find('<', *content), file.size());
   const std::string_view text = file.substr(*content, end - *content);
   const std::size_t first = std::min(text.find_first_not_of(whiteSpace), text.size());
-  if (first > 0) cuts.push_back({*content, first});
+  if (first > 0) cuts.push_back({*content, first, 0});
   const std::size_t rest = text.find_last_not_of(whiteSpace) + 1;
   // In an element the text may go on behind other markup.
   const bool isWhole = node.form == LookNode::Form::text || file.substr(end).starts_with("</");
   if (isWhole && first < text.size() && rest < text.size())
-    cuts.push_back({*content + rest, text.size() - rest});
+    cuts.push_back({*content + rest, text.size() - rest, 0});
 }
 
 }  // namespace
 
 std::size_t StrippedLook::offsetInFile(std::size_t offset) const {
-  for (const Cut& cut : cuts) {
-    if (cut.offset > offset) break;
-    offset += cut.size;
-  }
-  return offset;
+  const auto next = std::upper_bound(
+      cuts.begin(), cuts.end(), offset,
+      [](std::size_t place, const Cut& cut) { return place < cut.offset - cut.before; });
+  if (next == cuts.begin()) return offset;
+  const Cut& last = *std::prev(next);
+  return offset + last.before + last.size;
 }
 
 std::optional<StrippedLook> withoutSpace(std::span<const std::uint8_t> file) {
@@ -53,7 +55,10 @@ std::optional<StrippedLook> withoutSpace(std::span<const std::uint8_t> file) {
 
   stripped.bytes.reserve(file.size());
   std::size_t next = 0;
-  for (const Cut& cut : stripped.cuts) {
+  std::size_t before = 0;
+  for (Cut& cut : stripped.cuts) {
+    cut.before = before;
+    before += cut.size;
     stripped.bytes.insert(stripped.bytes.end(), file.begin() + static_cast<std::ptrdiff_t>(next),
                           file.begin() + static_cast<std::ptrdiff_t>(cut.offset));
     next = cut.offset + cut.size;

@@ -16,6 +16,7 @@ struct StrippedLook {
   struct Cut {
     std::size_t offset;  // in the file
     std::size_t size;
+    std::size_t before;  // bytes that were left out before it
   };
 
   std::vector<std::uint8_t> bytes;

@@ -163,6 +163,7 @@ TEST(LookLint, FindsDescriptionsWithoutATable) {
 TEST(LookLint, FindsElementsThatAreNotTakenForWhatTheyAre) {
   const std::string table = "<size>1</size><a>" + values + "</a>";
   EXPECT_EQ(findingsIn("<LUT>" + table + "</LUT>"), (Findings{{"1:1", "misplaced-lut"}}));
+  EXPECT_EQ(findingsIn("<LUT><LUT>" + table + "</LUT></LUT>"), Findings{});
   EXPECT_EQ(findingsIn("<x><y><LUT>" + table + "</LUT></y></x>"),
             (Findings{{"1:7", "misplaced-lut"}}));
   EXPECT_EQ(findingsIn("<look><lut>" + table + "</lut></look>"),
