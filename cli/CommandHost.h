@@ -5,6 +5,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "cli/Flags.h"
@@ -41,6 +42,9 @@ class CommandHost final : public Host {
   std::string localizedString(std::string_view key, std::string_view builtIn) override;
   void alert(std::string_view message) override;
   void log(std::string_view line) override;
+
+  // From here on the look-table folder is this one.
+  void setLooks(NamedFolder folder) { looks_ = std::move(folder); }
 
   // The alerts since this was called last.
   std::vector<std::string> takeAlerts();

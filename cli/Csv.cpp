@@ -35,6 +35,8 @@ void endLine(std::string& line) {
 
 }  // namespace
 
+std::string csvField(std::string_view text) { return field(visible(text)); }
+
 CsvWriter::CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
                      std::vector<Column> columns)
     : sink_(sink), columns_(std::move(columns)) {

@@ -13,6 +13,9 @@
 
 namespace oxmv::cli {
 
+// A text as a field: visible, and in quotes where it would end the field.
+std::string csvField(std::string_view text);
+
 class CsvWriter {
  public:
   // Writes the first line: what `leading` calls the fields before the tags, and the columns as they

@@ -16,6 +16,14 @@ struct DemoClip {
 // The clips in examples/, in the order of their names. Generated; see CMakeLists.txt.
 std::span<const DemoClip> demoClips() noexcept;
 
+struct DemoLook {
+  std::string_view name;  // of the file: "warm.xml"
+  std::string_view xml;
+};
+
+// The look descriptions in examples/, in the order of their names. Generated, too.
+std::span<const DemoLook> demoLooks() noexcept;
+
 // The still in examples/. Generated, too.
 std::span<const std::uint8_t> demoStill() noexcept;
 

@@ -37,6 +37,7 @@ constexpr auto rows = std::to_array<FlagRow>({
     {Flag::looks, "", "--looks", "DIR", "the look tables are in DIR (or in $OXMV_LOOKS)"},
     {Flag::reel, "", "--reel", "NAME", "the name of the reel"},
     {Flag::cameras, "", "--cameras", "FILE", "recognise the cameras in FILE, not those built in"},
+    {Flag::stripSpace, "", "--strip-space", "", "leave out the white space that counts as tables"},
     {Flag::color, "", "--color", "WHEN", "auto (default), always or never"},
 });
 

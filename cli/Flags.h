@@ -38,6 +38,7 @@ enum class Flag : std::uint8_t {
   looks,
   reel,
   cameras,
+  stripSpace,
   color,
 };
 

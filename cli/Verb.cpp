@@ -12,9 +12,11 @@ namespace oxmv::cli {
 namespace {
 
 constexpr auto all = std::to_array<const Verb*>(
-    {&showVerb,   &getVerb,   &setVerb,   &unsetVerb,  &diffVerb,   &dumpVerb,    &checkVerb,
-     &encodeVerb, &tagsVerb,  &stillVerb, &dbListVerb, &dbShowVerb, &dbCheckVerb, &dbPathVerb,
-     &dbInitVerb, &prefsVerb, &pathsVerb, &demoVerb,   &helpVerb,   &versionVerb});
+    {&showVerb,       &getVerb,      &setVerb,       &unsetVerb,    &diffVerb,     &dumpVerb,
+     &checkVerb,      &encodeVerb,   &tagsVerb,      &dbListVerb,   &dbShowVerb,   &dbCheckVerb,
+     &dbPathVerb,     &dbInitVerb,   &prefsVerb,     &pathsVerb,    &lookListVerb, &lookInfoVerb,
+     &lookImportVerb, &lookLintVerb, &lookCheckVerb, &lookInitVerb, &stillVerb,    &demoVerb,
+     &helpVerb,       &versionVerb});
 
 std::string_view firstWord(std::string_view name) { return name.substr(0, name.find(' ')); }
 

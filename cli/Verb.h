@@ -46,7 +46,8 @@ constexpr std::size_t anyNumber = static_cast<std::size_t>(-1);
 
 extern const Verb showVerb, getVerb, setVerb, unsetVerb, diffVerb, dumpVerb, checkVerb, encodeVerb,
     tagsVerb, stillVerb, dbListVerb, dbShowVerb, dbCheckVerb, dbPathVerb, dbInitVerb, prefsVerb,
-    pathsVerb, demoVerb, helpVerb, versionVerb;
+    pathsVerb, lookListVerb, lookInfoVerb, lookImportVerb, lookLintVerb, lookCheckVerb,
+    lookInitVerb, demoVerb, helpVerb, versionVerb;
 
 // Every verb, in the order in which help lists them.
 std::span<const Verb* const> verbs() noexcept;

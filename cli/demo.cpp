@@ -29,6 +29,7 @@ struct DemoFile {
 
 constexpr std::string_view damagedName = "damaged.colr";
 constexpr std::string_view stillName = "still.jpg";
+constexpr std::string_view lookName = "warm.xml";
 
 // Of the tags of a clip.
 std::string sourceName(std::string_view clip) {
@@ -56,6 +57,8 @@ std::vector<DemoFile> demoFiles() {
     files.push_back({std::string(clip.name), streamOf(std::get<Dictionary>(tags)), "a clip"});
     files.push_back({sourceName(clip.name), bytesOf(clip.json), "its tags, to encode"});
   }
+  for (const DemoLook& look : demoLooks())
+    files.push_back({std::string(look.name), bytesOf(look.xml), "a look, to import"});
   files.push_back({std::string(damagedName), damagedStream(), "a clip that was damaged"});
   const auto still = demoStill();
   files.push_back({std::string(stillName), {still.begin(), still.end()}, "a still from a camera"});
@@ -87,13 +90,16 @@ std::string inShell(const std::string& name) {
 void sayWhatNext(Call& call, const std::filesystem::path& folder) {
   const auto path = [&](std::string_view name) { return inShell((folder / name).string()); };
   const std::string_view shown = demoClips().back().name;
-  call.output.write(fmt::format(
-      "\nNow try\n"
-      "  oxmv show {}\n"
-      "  oxmv dump {}\n"
-      "  oxmv still {}\n"
-      "  oxmv encode -v {} -o {}\n",
-      path(shown), path(damagedName), path(stillName), path(sourceName(shown)), path("new.colr")));
+  call.output.write(
+      fmt::format("\nNow try\n"
+                  "  oxmv show {}\n"
+                  "  oxmv dump {}\n"
+                  "  oxmv still {}\n"
+                  "  oxmv look init --looks {}\n"
+                  "  oxmv look import --looks {} {}\n"
+                  "  oxmv encode -v {} -o {}\n",
+                  path(shown), path(damagedName), path(stillName), path("looks"), path("looks"),
+                  path(lookName), path(sourceName(shown)), path("new.colr")));
 }
 
 void run(Call& call) {
@@ -124,7 +130,7 @@ constexpr auto flags = std::to_array({Flag::dryRun});
 const Verb demoVerb = {
     .name = "demo",
     .words = "DIR",
-    .summary = "write a few clips and a still to try things on",
+    .summary = "write a few clips, looks and a still to try things on",
     .examples =
         "oxmv demo try\n"
         "oxmv demo --dry-run try\n",

@@ -20,10 +20,11 @@ class LookDescription::Builder final : public XmlVisitor {
     ++depth_;
     if (depth_ == lutDepth && name == "LUT") {
       isInLut_ = true;
-      return add(LookNode::Kind::lut, offset);
+      return add(LookNode::Kind::lut, LookNode::Form::element, offset);
     }
     if (!isInLut_ || depth_ != nodeDepth) return true;
-    return add(name == "size" ? LookNode::Kind::size : LookNode::Kind::table, offset);
+    return add(name == "size" ? LookNode::Kind::size : LookNode::Kind::table,
+               LookNode::Form::element, offset);
   }
 
   bool onElementEnd() override {
@@ -37,7 +38,7 @@ class LookDescription::Builder final : public XmlVisitor {
     if (!isInLut_) return true;
     // Pieces that follow each other are one node; within a section the section is the node.
     if (isChildOfLut() && !isText_ && !isCdata_) {
-      if (!add(LookNode::Kind::table, offset)) return false;
+      if (!add(LookNode::Kind::table, LookNode::Form::text, offset)) return false;
       isText_ = true;
     }
     return append(piece, offset);
@@ -45,7 +46,7 @@ class LookDescription::Builder final : public XmlVisitor {
 
   bool onCdataStart(std::size_t offset) override {
     isCdata_ = true;
-    return addChild(offset, {}, offset);
+    return addChild(LookNode::Form::cdata, offset, {}, offset);
   }
 
   bool onCdataEnd() override {
@@ -55,11 +56,12 @@ class LookDescription::Builder final : public XmlVisitor {
 
   bool onComment(std::string_view text, std::size_t offset) override {
     constexpr std::size_t start = std::string_view("<!--").size();
-    return addChild(offset, text, offset + start);
+    return addChild(LookNode::Form::comment, offset, text, offset + start);
   }
 
   bool onProcessingInstruction(std::string_view data, std::size_t offset) override {
-    return addChild(offset, data, to_.file_.size());  // where it stands is not told
+    // Where the data stands is not told.
+    return addChild(LookNode::Form::instruction, offset, data, to_.file_.size());
   }
 
  private:
@@ -69,19 +71,20 @@ class LookDescription::Builder final : public XmlVisitor {
   bool isChildOfLut() const { return isInLut_ && depth_ == lutDepth; }
 
   // Begins a node, and so ends a text before it. Without entities no file has as many nodes as bytes.
-  bool add(LookNode::Kind kind, std::size_t offset) {
+  bool add(LookNode::Kind kind, LookNode::Form form, std::size_t offset) {
     constexpr std::size_t always = std::size_t{1} << 20;
     if (to_.nodes_.size() >= std::max(to_.file_.size(), always)) return false;
-    to_.nodes_.push_back({static_cast<std::uint32_t>(offset), 0, 0, kind, false});
+    to_.nodes_.push_back({static_cast<std::uint32_t>(offset), 0, 0, kind, form, false});
     isText_ = false;
     return true;
   }
 
   // What is no element; deeper down it is a part of one, and comments and instructions have no text
   // there.
-  bool addChild(std::size_t offset, std::string_view text, std::size_t textOffset) {
+  bool addChild(LookNode::Form form, std::size_t offset, std::string_view text,
+                std::size_t textOffset) {
     if (!isChildOfLut()) return true;
-    return add(LookNode::Kind::table, offset) && append(text, textOffset);
+    return add(LookNode::Kind::table, form, offset) && append(text, textOffset);
   }
 
   // Whether the piece stands there in the file, as it is.
@@ -222,7 +225,8 @@ std::optional<LookDescription> LookDescription::parse(std::span<const std::uint8
 LookNode LookDescription::node(std::size_t index) const {
   const Entry& entry = nodes_[index];
   const std::string_view whole = entry.isInFile ? file_ : text_;
-  LookNode node = {entry.kind, whole.substr(entry.textStart, entry.textLength), entry.offset, {}};
+  LookNode node = {
+      entry.kind, entry.form, whole.substr(entry.textStart, entry.textLength), entry.offset, {}};
   if (entry.isInFile) node.textOffset = entry.textStart;
   return node;
 }

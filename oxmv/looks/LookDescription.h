@@ -29,7 +29,10 @@ struct LookNode {
     size,   // a "size" element
     table,  // any other child
   };
+  // What it is in the document.
+  enum class Form : std::uint8_t { element, text, cdata, comment, instruction };
   Kind kind;
+  Form form;
   // All the text in it, that of elements within included: what an element or a section holds, the
   // text of a comment, the data of a processing instruction. UTF-8; empty for a "LUT" element.
   std::string_view text;
@@ -74,6 +77,7 @@ class LookDescription {
     std::uint32_t textStart;
     std::uint32_t textLength;
     LookNode::Kind kind;
+    LookNode::Form form;
     bool isInFile;  // textStart counts in the file, else in text_
   };
 

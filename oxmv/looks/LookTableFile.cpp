@@ -23,6 +23,10 @@ Magic magicOf(std::span<const std::uint8_t> start) {
   return Magic::none;
 }
 
+constexpr std::uint32_t inOtherOrder(std::uint32_t number) {
+  return number << 24 | (number & 0xFF00) << 8 | (number >> 8 & 0xFF00) | number >> 24;
+}
+
 int hexDigit(char c) {
   if (c >= '0' && c <= '9') return c - '0';
   if (c >= 'A' && c <= 'F') return c - 'A' + 10;
@@ -53,6 +57,24 @@ void storeLookHeader(const OXLOOK_HEADER& header, std::span<std::uint8_t> bytes)
   storeLe32(&bytes[16], header.constantA);
   storeLe32(&bytes[20], header.constantB);
   std::copy(header.lutName.begin(), header.lutName.end(), bytes.begin() + nameOffset);
+}
+
+std::optional<OXLOOK_HEADER> loadLookHeader(std::span<const std::uint8_t> bytes) noexcept {
+  const Magic magic = magicOf(bytes);
+  if (magic == Magic::none || bytes.size() < lookHeaderSize) return std::nullopt;
+  const auto number = [&](std::size_t offset) {
+    const std::uint32_t value = loadLe32(&bytes[offset]);
+    return magic == Magic::ours ? value : inOtherOrder(value);
+  };
+  OXLOOK_HEADER header;
+  std::copy_n(bytes.begin(), header.magic.size(), header.magic.begin());
+  header.version = number(4);
+  header.headerSize = number(8);
+  header.lutSize = number(12);
+  header.constantA = number(16);
+  header.constantB = number(20);
+  std::copy_n(bytes.begin() + nameOffset, header.lutName.size(), header.lutName.begin());
+  return header;
 }
 
 std::array<char, 40> lookNameField(std::string_view displayName) {

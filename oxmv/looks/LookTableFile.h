@@ -80,6 +80,10 @@ class OXLookFileRecord {
 // Writes the header's 64 bytes to the start of a file. `bytes` has room for them.
 void storeLookHeader(const OXLOOK_HEADER& header, std::span<std::uint8_t> bytes);
 
+// The header that a file of 64 bytes or more begins with, in either byte order, which its magic tells.
+// Nothing when the magic is another.
+std::optional<OXLOOK_HEADER> loadLookHeader(std::span<const std::uint8_t> bytes) noexcept;
+
 // What the name field holds for a display name: nothing but zeros when it has 39 bytes or more, or
 // is not ASCII.
 std::array<char, 40> lookNameField(std::string_view displayName);

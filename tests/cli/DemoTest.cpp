@@ -43,7 +43,7 @@ TEST(Demo, SaysWhatItWroteAndWhatToTry) {
   std::size_t files = 0;
   while (files < lines.size() && !lines[files].empty()) ++files;
   EXPECT_EQ(files, namesIn(folder / "demo").size());
-  ASSERT_EQ(lines.size(), files + 6);
+  ASSERT_EQ(lines.size(), files + 8);
   EXPECT_EQ(lines[files + 1], "Now try");
   for (std::size_t i = files + 2; i < lines.size(); ++i) {
     ASSERT_TRUE(lines[i].starts_with("  oxmv ")) << lines[i];

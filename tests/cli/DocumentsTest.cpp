@@ -53,15 +53,16 @@ std::vector<Example> examplesIn(const std::string& block) {
   return examples;
 }
 
-// What a shell in the source folder prints, to either stream, with our command first in its path.
-std::string outputOf(const std::string& command) {
+// What a shell in the source folder prints, to either stream, with our command first in its path and
+// the look tables in a folder of their own.
+std::string outputOf(const std::string& command, const std::string& looks) {
   const std::string folder = std::filesystem::path(OXMV_COMMAND).parent_path().string();
   const oxmv::test::TempDir temporary;  // what an example makes there goes with it
   // The preferences of whoever runs the tests are none of the documents' business.
   const std::string line = "export HOME=/dev/null/nowhere TMPDIR='" + temporary.path().string() +
-                           "'; unset XDG_CONFIG_HOME XDG_CONFIG_DIRS OXMV_DB OXMV_LOOKS; "
-                           "cd '" OXMV_SOURCE_DIR "' && PATH='" +
-                           folder + "':$PATH && { " + command + "; } 2>&1";
+                           "'; unset XDG_CONFIG_HOME XDG_CONFIG_DIRS OXMV_DB; "
+                           "cd '" OXMV_SOURCE_DIR "' && export OXMV_LOOKS='" +
+                           looks + "' && PATH='" + folder + "':$PATH && { " + command + "; } 2>&1";
   std::FILE* pipe = ::popen(line.c_str(), "r");
   std::string output;
   for (int c = std::fgetc(pipe); c != EOF; c = std::fgetc(pipe)) output += static_cast<char>(c);
@@ -70,10 +71,12 @@ std::string outputOf(const std::string& command) {
 }
 
 TEST(Documents, ReadmeShowsWhatTheCommandPrints) {
+  const oxmv::test::TempDir looks;
   std::size_t count = 0;
   for (const std::string& block : blocksOf(contentOf("README.md"), "console")) {
     for (const Example& example : examplesIn(block)) {
-      EXPECT_EQ(outputOf(example.command), example.output) << example.command;
+      EXPECT_EQ(outputOf(example.command, looks.path().string()), example.output)
+          << example.command;
       ++count;
     }
   }

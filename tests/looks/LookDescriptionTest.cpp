@@ -65,6 +65,19 @@ TEST(LookDescription, GivesTheChildrenOfItsLuts) {
             "LUT\nsize: 2\ntable: 0000803F\n");
 }
 
+TEST(LookDescription, TellsWhatItsNodesAreInTheDocument) {
+  const std::string file =
+      "<look><LUT> <size>2</size><a/><!-- b --><?c d?><![CDATA[e]]>f</LUT></look>";
+  const auto description = LookDescription::parse(bytesOf(file));
+  ASSERT_TRUE(description);
+  using Form = LookNode::Form;
+  std::vector<Form> forms;
+  for (std::size_t i = 0; i < description->nodeCount(); ++i)
+    forms.push_back(description->node(i).form);
+  EXPECT_EQ(forms, (std::vector<Form>{Form::element, Form::text, Form::element, Form::element,
+                                      Form::comment, Form::instruction, Form::cdata, Form::text}));
+}
+
 TEST(LookDescription, RootMayHaveAnyName) {
   EXPECT_EQ(nodesOf("<x><LUT><a/></LUT></x>"), "LUT\ntable: \n");
   EXPECT_EQ(nodesOf("<LUT><LUT><a/></LUT></LUT>"), "LUT\ntable: \n");

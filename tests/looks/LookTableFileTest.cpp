@@ -39,6 +39,38 @@ TEST(LookHeader, IsStoredByteForByte) {
   EXPECT_EQ(bytes, expected);
 }
 
+TEST(LookHeader, IsLoadedInEitherByteOrder) {
+  OXLOOK_HEADER header;
+  header.lutSize = 17;
+  header.lutName = lookNameField("Warm");
+  Bytes bytes(64);
+  storeLookHeader(header, bytes);
+  for (const bool isSwapped : {false, true}) {
+    if (isSwapped) {
+      for (std::size_t i = 0; i < 24; i += 4)
+        std::reverse(bytes.begin() + static_cast<std::ptrdiff_t>(i),
+                     bytes.begin() + static_cast<std::ptrdiff_t>(i + 4));
+    }
+    const auto loaded = loadLookHeader(bytes);
+    ASSERT_TRUE(loaded);
+    EXPECT_EQ(std::string(loaded->magic.data(), 4), isSwapped ? "KLXO" : "OXLK");
+    EXPECT_EQ(loaded->version, 2u);
+    EXPECT_EQ(loaded->headerSize, 64u);
+    EXPECT_EQ(loaded->lutSize, 17u);
+    EXPECT_EQ(loaded->constantA, 0x00015A01u);
+    EXPECT_EQ(loaded->constantB, 0x0002160Au);
+    EXPECT_EQ(loaded->lutName, header.lutName);
+  }
+}
+
+TEST(LookHeader, OfAnotherMagicOrTooFewBytesIsNothing) {
+  EXPECT_FALSE(loadLookHeader(start("OXLX", {2, 0, 0, 0})));
+  const Bytes bytes = start("OXLK", {2, 0, 0, 0});
+  EXPECT_TRUE(loadLookHeader(bytes));
+  for (std::size_t size = 0; size < bytes.size(); ++size)
+    EXPECT_FALSE(loadLookHeader(std::span(bytes).first(size))) << size;
+}
+
 TEST(LookFileSize, IsSixtyFourBytesAndTwelveForAPoint) {
   EXPECT_EQ(lookFileSize(1), 76u);
   EXPECT_EQ(lookFileSize(2), 160u);
