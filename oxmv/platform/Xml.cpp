@@ -41,6 +41,9 @@ class Walk {
                    const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
           of(self).entity({value, value != nullptr ? static_cast<std::size_t>(length) : 0});
         });
+    XML_SetAttlistDeclHandler(
+        parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*,
+                   int) { of(self).attributeDeclaration(); });
     XML_SetElementHandler(
         parser,
         [](void* self, const XML_Char* name, const XML_Char**) { of(self).elementStart(name); },
@@ -130,6 +133,10 @@ class Walk {
     tell([](XmlVisitor& to) { return to.onElementEnd(); });
   }
 
+  void attributeDeclaration() {
+    if (++declaredAttributes_ > maxXmlDeclaredAttributes) object("too many attributes declared");
+  }
+
   void entity(std::string_view value) {
     if (value.find('&') == std::string_view::npos) return;
     if (++nestedEntities_ > maxXmlNestedEntities) object("too many entities within entities");
@@ -143,6 +150,7 @@ class Walk {
   XmlVisitor& visitor_;
   std::size_t depth_ = 0;
   std::size_t nestedEntities_ = 0;
+  std::size_t declaredAttributes_ = 0;
   bool isStopped_ = false;
   std::size_t stoppedAt_ = 0;
   std::string_view objection_;

@@ -16,6 +16,10 @@ constexpr std::size_t maxXmlDepth = 4096;
 // expansion takes stack for each.
 constexpr std::size_t maxXmlNestedEntities = 16;
 
+// Attributes that a document declares. The parser goes through those of an element's name each time
+// that such an element begins, so many declarations and many elements would take the product of both.
+constexpr std::size_t maxXmlDeclaredAttributes = 64;
+
 // Hears what a document holds, in its order. Texts are UTF-8, with line ends as single line feeds;
 // they are valid during the call. `offset` is where in the document, in bytes, the event begins;
 // within an entity, where the reference to it begins. Answering false ends the walk.

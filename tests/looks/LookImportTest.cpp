@@ -370,11 +370,14 @@ TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
     for (int k = 0; k < 10; ++k) bomb += "&e" + std::to_string(i - 1) + ";";
     bomb += "'>";
   }
+  std::string declaring = "<!DOCTYPE look [<!ATTLIST LUT";
+  for (int i = 0; i < 20000; ++i) declaring += " a" + std::to_string(i) + " CDATA 'x'";
   std::string deep;
   for (int i = 0; i < 100000; ++i) deep += "<a>";
   for (int i = 0; i < 100000; ++i) deep += "</a>";
   for (const std::string& file : {
            bomb + "]><look>" + body + "<a>&e12;</a></LUT></look>",
+           declaring + ">]><look>" + body + "</LUT></look>",
            "<look>" + body + deep + "</LUT></look>",
            "<look>" + body + std::string(1, '\0') + "</LUT></look>",
            "<look>" + body + "</LUT></look>" + std::string(100, '\0'),

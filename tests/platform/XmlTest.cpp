@@ -223,6 +223,36 @@ TEST(Xml, EntitiesWithinEntitiesAreLimited) {
   EXPECT_EQ(endOf(chain(100000)).kind, Kind::malformed);
 }
 
+// Declares attributes of one element, in one list or each in its own, without a default or with one.
+std::string declaring(std::size_t attributes, std::string_view between, std::string_view what) {
+  std::string document = "<!DOCTYPE a [<!ATTLIST a";
+  for (std::size_t i = 0; i < attributes; ++i) {
+    if (i > 0) document += between;
+    document += " b" + std::to_string(i) + ' ' + std::string(what);
+  }
+  return document + ">]><a/>";
+}
+
+TEST(Xml, DeclaredAttributesAreLimited) {
+  for (const char* between : {"", "><!ATTLIST a", "><!ATTLIST c"}) {
+    for (const char* what : {"CDATA #IMPLIED", "CDATA 'x'", "(x|y) 'x'", "ID #REQUIRED"}) {
+      EXPECT_EQ(endOf(declaring(maxXmlDeclaredAttributes, between, what)).kind, Kind::wellFormed)
+          << between << what;
+      const XmlEnd end = endOf(declaring(maxXmlDeclaredAttributes + 1, between, what));
+      EXPECT_EQ(end.kind, Kind::malformed);
+      EXPECT_EQ(end.what, "too many attributes declared");
+    }
+  }
+}
+
+TEST(Xml, ManyDeclaredAttributesOfManyElementsAreRefusedAtOnce) {
+  std::string document = declaring(20000, "", "CDATA 'x'");
+  document.resize(document.size() - std::string_view("<a/>").size());
+  document += "<r>";
+  for (int i = 0; i < 200000; ++i) document += "<a/>";
+  EXPECT_EQ(endOf(document + "</r>").what, "too many attributes declared");
+}
+
 std::string nested(std::size_t depth) {
   std::string document;
   for (std::size_t i = 0; i < depth; ++i) document += "<a>";
