@@ -12,8 +12,8 @@ namespace oxmv {
 // Elements nested deeper than this only hostile input has; what is open takes memory.
 constexpr std::size_t maxXmlDepth = 4096;
 
-// Entities of a document whose text refers to entities. Each may stand in the next, and their
-// expansion takes stack for each.
+// Entities of a document, parameter entities among them, whose text refers to entities. Each may stand
+// in the next, and their expansion takes stack for each.
 constexpr std::size_t maxXmlNestedEntities = 16;
 
 // Attributes that a document declares. The parser goes through those of an element's name each time

@@ -362,6 +362,12 @@ TEST_F(LookImport, EveryShorterFileGivesTheEmptyReference) {
   }
 }
 
+std::string hundredTimes(std::string_view text) {
+  std::string all;
+  for (int i = 0; i < 100; ++i) all += text;
+  return all;
+}
+
 TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
   const std::string body = "<LUT><size>1</size><a>0000803F</a>";
   std::string bomb = "<!DOCTYPE look [<!ENTITY e0 '" + std::string(100, 'F') + "'>";
@@ -378,6 +384,8 @@ TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
   for (const std::string& file : {
            bomb + "]><look>" + body + "<a>&e12;</a></LUT></look>",
            declaring + ">]><look>" + body + "</LUT></look>",
+           "<!DOCTYPE look [<!ENTITY e '" + std::string(1000000, 'x') + "'>]><look>" + body +
+               "<a b='" + hundredTimes("&e;") + "'/></LUT></look>",
            "<look>" + body + deep + "</LUT></look>",
            "<look>" + body + std::string(1, '\0') + "</LUT></look>",
            "<look>" + body + "</LUT></look>" + std::string(100, '\0'),

@@ -1,3 +1,4 @@
+#include <fstream>
 #include <new>
 #include <stdexcept>
 #include <string>
@@ -7,6 +8,7 @@
 
 #include "oxmv/platform/Xml.h"
 #include "support/SmallStack.h"
+#include "support/TempDir.h"
 
 namespace oxmv {
 namespace {
@@ -205,6 +207,20 @@ TEST(Xml, EntitiesThatMultiplyAreMalformed) {
   EXPECT_EQ(endOf(document + "]><a>&e3;</a>").kind, Kind::wellFormed);
 }
 
+// An entity of a megabyte, in an attribute of an element.
+std::string entityInAttribute(int times) {
+  std::string document = "<!DOCTYPE a [<!ENTITY e '" + std::string(1000000, 'x') + "'>]><a b='";
+  for (int i = 0; i < times; ++i) document += "&e;";
+  return document + "'/>";
+}
+
+TEST(Xml, DocumentThatTakesTooMuchMemoryIsMalformed) {
+  EXPECT_EQ(endOf(entityInAttribute(10)).kind, Kind::wellFormed);
+  const XmlEnd end = endOf(entityInAttribute(95));
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.what, "takes too much memory");
+}
+
 // A chain of entities, each within the next.
 std::string chain(std::size_t nested) {
   std::string document = "<!DOCTYPE a [<!ENTITY e0 'x'>";
@@ -253,6 +269,53 @@ TEST(Xml, ManyDeclaredAttributesOfManyElementsAreRefusedAtOnce) {
   EXPECT_EQ(endOf(document + "</r>").what, "too many attributes declared");
 }
 
+TEST(Xml, ReadsDeclarationsInAndBehindAParameterEntity) {
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY % p '<!ENTITY e \"x\">'>%p;]><a>&e;</a>"), "x");
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY % p ' '>%p;<!ENTITY e 'x'>]><a>&e;</a>"), "x");
+}
+
+TEST(Xml, DeclarationsInAndBehindAParameterEntityCount) {
+  const std::string one = "<!DOCTYPE a [<!ENTITY % p '<!ATTLIST a p CDATA #IMPLIED>'>%p;";
+  const std::string_view start = "<!DOCTYPE a [";
+  const std::string rest = declaring(maxXmlDeclaredAttributes, "", "CDATA 'x'");
+  EXPECT_EQ(endOf(one + rest.substr(start.size())).what, "too many attributes declared");
+  const std::string fewer = declaring(maxXmlDeclaredAttributes - 1, "", "CDATA 'x'");
+  EXPECT_EQ(endOf(one + fewer.substr(start.size())).kind, Kind::wellFormed);
+}
+
+// A chain of parameter entities, each within the next.
+std::string parameterChain(std::size_t nested) {
+  std::string document = "<!DOCTYPE a [<!ENTITY % e0 '<!ENTITY x \"y\">'>";
+  for (std::size_t i = 1; i <= nested; ++i) {
+    document += "<!ENTITY % e" + std::to_string(i) + " '&#37;e" + std::to_string(i - 1) + ";'>";
+  }
+  return document + "%e" + std::to_string(nested) + ";]><a>&x;</a>";
+}
+
+TEST(Xml, ParameterEntitiesWithinParameterEntitiesAreLimited) {
+  EXPECT_EQ(textsOf(parameterChain(maxXmlNestedEntities)), "y");
+  EXPECT_EQ(endOf(parameterChain(maxXmlNestedEntities + 1)).what,
+            "too many entities within entities");
+  EXPECT_EQ(endOf(parameterChain(100000)).kind, Kind::malformed);
+  EXPECT_EQ(endOf("<!DOCTYPE a [<!ENTITY % e '&#37;e;'>%e;]><a/>").kind, Kind::malformed);
+}
+
+TEST(Xml, ParameterEntityFromOutsideIsNeverOpened) {
+  const test::TempDir folder;
+  const std::string outside = folder / "outside";
+  std::ofstream(outside) << "<!ENTITY x 'loaded'>";
+  for (const std::string& start :
+       {"<!DOCTYPE a SYSTEM '" + outside + "'>", "<!DOCTYPE a SYSTEM 'file://" + outside + "'>",
+        "<!DOCTYPE a [<!ENTITY % e SYSTEM '" + outside + "'>%e;]>",
+        "<!DOCTYPE a [<!ENTITY % e PUBLIC 'p' 'file://" + outside + "'>%e;]>"}) {
+    EXPECT_EQ(textsOf(start + "<a>&x;</a>"), "") << start;
+  }
+  // What is declared behind it might mean something else there, and so is passed over.
+  EXPECT_EQ(
+      textsOf("<!DOCTYPE a [<!ENTITY % e SYSTEM '" + outside + "'>%e;<!ENTITY x 'y'>]><a>&x;</a>"),
+      "");
+}
+
 std::string nested(std::size_t depth) {
   std::string document;
   for (std::size_t i = 0; i < depth; ++i) document += "<a>";
@@ -273,6 +336,7 @@ TEST(Xml, NeedsLittleStack) {
       [] {
         EXPECT_EQ(endOf(nested(maxXmlDepth)).kind, Kind::wellFormed);
         EXPECT_EQ(endOf(chain(maxXmlNestedEntities)).kind, Kind::wellFormed);
+        EXPECT_EQ(endOf(parameterChain(maxXmlNestedEntities)).kind, Kind::wellFormed);
       },
       std::size_t{1} << 20);
   EXPECT_LE(used, std::size_t{64} << 10);
