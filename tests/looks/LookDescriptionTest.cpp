@@ -276,6 +276,33 @@ TEST(LookDescription, EveryShorterFileIsReadAlikeInBothWays) {
   EXPECT_TRUE(parsed(file));
 }
 
+TEST(LookDescription, TextOutOfTheFileIsLimitedAlikeInBothWays) {
+  // Out of the file: "&" and what follows it, and a text that is taken out at its end.
+  const std::string file = "<look><LUT><size>1</size><a>&amp;<b/>" + run + "</a>" + run + "<c>" +
+                           run + "<d/>\r\n</c><e>" + run + "</e></LUT></look>";
+  const std::size_t most = 1 + run.size() + run.size() + 1;
+  for (const LookParsing parsing : {LookParsing::quick, LookParsing::plain}) {
+    EXPECT_TRUE(LookDescription::parse(bytesOf(file), nullptr, parsing, most));
+    LookProblem problem;
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing, most - 1));
+    EXPECT_EQ(problem.what, "its nodes have too much text");
+    EXPECT_EQ(problem.offset, file.find('\r'));
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing, run.size()));
+    EXPECT_EQ(problem.what, "its nodes have too much text");
+  }
+}
+
+TEST(LookDescription, FileAboveTheLargestIsRefusedInBothWays) {
+  std::string file = "<look><LUT>";
+  file.resize(maxFileSize + 1 - std::string_view("</LUT></look>").size(), '0');
+  file += "</LUT></look>";
+  for (const LookParsing parsing : {LookParsing::quick, LookParsing::plain}) {
+    LookProblem problem;
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing));
+    EXPECT_EQ(problem.what, "larger than 256 MiB");
+  }
+}
+
 TEST(LookDescription, EntitiesThatMakeTooMuchAreRefused) {
   // As many as Expat lets pass, each a node, from a file of some kilobytes.
   std::string file = "<!DOCTYPE look [<!ENTITY e0 '";
@@ -292,7 +319,7 @@ TEST(LookDescription, EntitiesThatMakeTooMuchAreRefused) {
   ASSERT_TRUE(few);
   EXPECT_EQ(few->nodeCount(), 100001u);
   EXPECT_FALSE(LookDescription::parse(bytesOf(file + "&e3;&e3;</LUT></look>"), &problem));
-  EXPECT_EQ(problem.what, "its entities make too much of it");
+  EXPECT_EQ(problem.what, "its entities make too many nodes of it");
 }
 
 TEST(LookDescription, MissingMemoryReachesTheCaller) {
