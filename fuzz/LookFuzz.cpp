@@ -57,6 +57,9 @@ void compareTables(std::string_view text) {
   require(table.stored == std::min(room, table.groups));
   require(table.groups * 8 <= text.size() + 7 && table.malformed <= table.groups);
   require(table.leading <= text.size());
+  require(std::all_of(
+      values[0].begin() + static_cast<std::ptrdiff_t>(table.stored * 4), values[0].end(),
+      [&](std::uint8_t byte) { return byte == untouched || (byte == 0 && !table.isAscii); }));
 }
 
 }  // namespace
