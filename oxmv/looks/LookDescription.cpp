@@ -175,7 +175,7 @@ class LookDescription::Restorer final : public XmlVisitor {
       }
       ++next_;
       added_ += run.text.size() - 1;
-      if (!builder_.onText(run.text, run.offset)) return false;
+      if (!putBack(run)) return false;
       piece.remove_prefix(place - offset + 1);
       offset = place + 1;
     }
@@ -192,6 +192,20 @@ class LookDescription::Restorer final : public XmlVisitor {
   }
 
  private:
+  // Tells the builder of a run as the parser would: each line end is a line feed.
+  bool putBack(const LongRun& run) {
+    std::string_view text = run.text;
+    std::size_t offset = run.offset;
+    for (std::size_t end; (end = text.find('\r')) != std::string_view::npos;) {
+      if (!builder_.onText(text.substr(0, end), offset)) return false;
+      if (!builder_.onText("\n", offset + end)) return false;
+      end += text.substr(end).starts_with("\r\n") ? 2 : 1;
+      text.remove_prefix(end);
+      offset += end;
+    }
+    return text.empty() || builder_.onText(text, offset);
+  }
+
   // The place in the document; right once every run before it has been put back, and if one was not
   // the whole result is dropped.
   std::size_t restored(std::size_t offset) const { return offset + added_; }

@@ -60,6 +60,10 @@ std::string nodesOf(std::string_view file) {
 
 const std::string run(minLongRun, 'A');
 
+// Line ends of every kind: as they are in a file, and as what is read from it has them.
+const std::string returns = "\r\n" + run + "\r\n\r\n1\r\r2\n\r\n\r3\r" + run + "\r\n4\r";
+const std::string feeds = "\n" + run + "\n\n1\n\n2\n\n\n3\n" + run + "\n4\n";
+
 TEST(LookDescription, GivesTheChildrenOfItsLuts) {
   EXPECT_EQ(nodesOf("<look><LUT><size>2</size><data>0000803F</data></LUT></look>"),
             "LUT\nsize: 2\ntable: 0000803F\n");
@@ -133,6 +137,27 @@ TEST(LookDescription, LongTextsAreTheSame) {
   EXPECT_EQ(nodesOf("<look><LUT><a>" + run + "</a></LUT></look>"), "LUT\ntable: " + run + "\n");
   EXPECT_EQ(nodesOf("<look><LUT>" + run + "<a>" + run + "</a>" + run + "</LUT>" + run + "</look>"),
             "LUT\ntable: " + run + "\ntable: " + run + "\ntable: " + run + "\n");
+}
+
+TEST(LookDescription, LineEndsOfLongTextsAreLineFeeds) {
+  EXPECT_EQ(nodesOf("<look><LUT><a>" + returns + "</a></LUT></look>"),
+            "LUT\ntable: " + feeds + "\n");
+  EXPECT_EQ(nodesOf("<look><LUT>" + returns + "<a>x<b/>" + returns + "<b/>\r\n</a>" + returns +
+                    "</LUT></look>"),
+            "LUT\ntable: " + feeds + "\ntable: x" + feeds + "\n\ntable: " + feeds + "\n");
+  EXPECT_EQ(nodesOf("<look><LUT><![CDATA[>" + returns + "<]]></LUT>" + returns + "</look>"),
+            "LUT\ntable: >" + feeds + "<\n");
+  EXPECT_EQ(nodesOf("<look><LUT>" + run + "\r</LUT><LUT>\n" + run + "</LUT></look>"),
+            "LUT\ntable: " + run + "\n\nLUT\ntable: \n" + run + "\n");
+}
+
+TEST(LookDescription, LongTableWithCarriageReturnsIsCopiedOnce) {
+  std::string lines;
+  for (int i = 0; i < 20000; ++i) lines += "0000803F0000003F\r\n";
+  const std::string file = "<look><LUT><size>64</size><data>" + lines + "</data></LUT></look>";
+  const test::MemoryMeter meter;
+  ASSERT_TRUE(LookDescription::parse(bytesOf(file)));
+  EXPECT_LT(meter.peak(), file.size() * 5 / 4);
 }
 
 TEST(LookDescription, LongTextsBesideOthersAreTheSame) {
@@ -245,10 +270,11 @@ TEST(LookDescription, LongTableIsNotCopied) {
 // One change somewhere: both ways must still agree, whatever comes of it.
 TEST(LookDescription, DamagedOnesAreReadAlikeInBothWays) {
   std::mt19937 random(5);
-  const std::string parts[] = {run,      "<a>",       "</a>", "<LUT>",          "</LUT>", "<!--",
-                               "-->",    "<![CDATA[", "]]>",  "<?p ",           "?>",     "\"",
-                               "'",      ">",         "<",    "&amp;",          "&#48;",  "\r\n",
-                               "\u00E9", "<b c='",    "'/>",  "<size>1</size>", " ",      "x"};
+  const std::string parts[] = {run,    returns,  "<a>",       "</a>", "<LUT>",          "</LUT>",
+                               "<!--", "-->",    "<![CDATA[", "]]>",  "<?p ",           "?>",
+                               "\"",   "'",      ">",         "<",    "&amp;",          "&#48;",
+                               "\r\n", "\u00E9", "<b c='",    "'/>",  "<size>1</size>", " ",
+                               "x"};
   int parsedOnes = 0;
   for (int i = 0; i < 3000; ++i) {
     std::string file = "<look><LUT>";
