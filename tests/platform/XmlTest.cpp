@@ -5,8 +5,11 @@
 #include <vector>
 
 #include <gtest/gtest.h>
+#include <sys/resource.h>
+#include <unistd.h>
 
 #include "oxmv/platform/Xml.h"
+#include "support/ChildProcess.h"
 #include "support/SmallStack.h"
 #include "support/TempDir.h"
 
@@ -219,6 +222,29 @@ TEST(Xml, DocumentThatTakesTooMuchMemoryIsMalformed) {
   const XmlEnd end = endOf(entityInAttribute(95));
   EXPECT_EQ(end.kind, Kind::malformed);
   EXPECT_EQ(end.what, "takes too much memory");
+}
+
+TEST(Xml, MemoryThatTheSystemLacksReachesTheCaller) {
+#ifdef OXMV_ADDRESS_SANITIZER
+  GTEST_SKIP() << "the sanitizer ends the program where the system has no memory";
+#endif
+  const std::string document = "<a b='" + std::string(std::size_t{64} << 20, 'x') + "'/>";
+  EXPECT_TRUE(test::inChildProcess([&] {
+    std::size_t pages = 0;  // that the process has by now
+    std::ifstream("/proc/self/statm") >> pages;
+    const std::size_t some = std::size_t{16} << 20;
+    rlimit limit = {};
+    if (pages == 0 || ::getrlimit(RLIMIT_AS, &limit) != 0) return false;
+    limit.rlim_cur = pages * static_cast<std::size_t>(::sysconf(_SC_PAGESIZE)) + some;
+    if (::setrlimit(RLIMIT_AS, &limit) != 0) return false;
+    Recorder recorder;
+    try {
+      walk(document, recorder);
+    } catch (const std::bad_alloc&) {
+      return true;
+    }
+    return false;
+  }));
 }
 
 // A chain of entities, each within the next.
