@@ -3,8 +3,10 @@
 //
 //   lookImport        -- the whole import: read, parse, convert, check, write the table and the copy
 //   lookImportLines   -- the same, the text in lines
+//   lookImportCrlf    -- the same, each line ends in carriage return and line feed
 //   lookFloor         -- the floor: the file read, 3 MB copied, that and the file written, no more
 //   lookParse         -- the description's nodes, long texts left out of the parsing
+//   lookParseCrlf     -- the same for the text in lines that end in carriage return and line feed
 //   lookParsePlain    -- the same, everything through the XML parser
 //   lookRuns          -- the search for long texts
 //   lookHex           -- the text into values; Portable: without vector instructions
@@ -59,6 +61,7 @@ std::string tableText(std::size_t each, std::string_view separator) {
 
 const std::string oneLine = '"' + tableText(valueCount, "") + '"';
 const std::string lines = tableText(12, "\n");
+const std::string crlfLines = tableText(12, "\r\n");
 const std::string blanks = tableText(1, " ");
 
 Bytes descriptionOf(const std::string& text) {
@@ -137,6 +140,9 @@ BENCHMARK(lookImport)->Unit(benchmark::kMicrosecond);
 void lookImportLines(benchmark::State& state) { import(state, lines); }
 BENCHMARK(lookImportLines)->Unit(benchmark::kMicrosecond);
 
+void lookImportCrlf(benchmark::State& state) { import(state, crlfLines); }
+BENCHMARK(lookImportCrlf)->Unit(benchmark::kMicrosecond);
+
 void lookFloor(benchmark::State& state) {
   const Folder folder;
   put(folder.description(), descriptionOf(oneLine));
@@ -156,17 +162,20 @@ void lookFloor(benchmark::State& state) {
 }
 BENCHMARK(lookFloor)->Unit(benchmark::kMicrosecond);
 
-void parse(benchmark::State& state, LookParsing parsing) {
-  const Bytes file = descriptionOf(oneLine);
+void parse(benchmark::State& state, const std::string& text, LookParsing parsing) {
+  const Bytes file = descriptionOf(text);
   for (auto _ : state) {
     benchmark::DoNotOptimize(LookDescription::parse(file, nullptr, parsing)->nodeCount());
   }
 }
 
-void lookParse(benchmark::State& state) { parse(state, LookParsing::quick); }
+void lookParse(benchmark::State& state) { parse(state, oneLine, LookParsing::quick); }
 BENCHMARK(lookParse)->Unit(benchmark::kMicrosecond);
 
-void lookParsePlain(benchmark::State& state) { parse(state, LookParsing::plain); }
+void lookParseCrlf(benchmark::State& state) { parse(state, crlfLines, LookParsing::quick); }
+BENCHMARK(lookParseCrlf)->Unit(benchmark::kMicrosecond);
+
+void lookParsePlain(benchmark::State& state) { parse(state, oneLine, LookParsing::plain); }
 BENCHMARK(lookParsePlain)->Unit(benchmark::kMicrosecond);
 
 void runs(benchmark::State& state, Instructions instructions) {

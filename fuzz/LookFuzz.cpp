@@ -4,8 +4,8 @@
 // - a text that is said to stand in the file stands there;
 // - every table reads the same with portable and with vector instructions, and stays in its record.
 //
-// The byte 1, which no XML has, stands for a run long enough to be left out of the parsing, so that
-// small inputs reach that, too.
+// The bytes 1 and 2, which no XML has, stand for runs long enough to be left out of the parsing, the
+// second with every kind of line end, so that small inputs reach that, too.
 
 #include <algorithm>
 #include <cstddef>
@@ -33,6 +33,8 @@ std::string withRuns(std::span<const std::uint8_t> bytes) {
   for (const std::uint8_t byte : bytes) {
     if (byte == 1) {
       for (std::size_t i = 0; i < minLongRun; ++i) text += "0123456789abcdefABCDEF \n"[i % 24];
+    } else if (byte == 2) {
+      for (std::size_t i = 0; i < minLongRun; ++i) text += "0123456789abcdef\r\n \r\r\n\n"[i % 23];
     } else {
       text += static_cast<char>(byte);
     }
@@ -57,6 +59,9 @@ void compareTables(std::string_view text) {
   require(table.stored == std::min(room, table.groups));
   require(table.groups * 8 <= text.size() + 7 && table.malformed <= table.groups);
   require(table.leading <= text.size());
+  require(std::all_of(
+      values[0].begin() + static_cast<std::ptrdiff_t>(table.stored * 4), values[0].end(),
+      [&](std::uint8_t byte) { return byte == untouched || (byte == 0 && !table.isAscii); }));
 }
 
 }  // namespace

@@ -38,7 +38,8 @@ constexpr std::size_t maxLeading = 3;
 // Reads the groups of `utf8`, which must be valid, into `values`, four bytes each, as many as have
 // room. A malformed group is the value 0. As many characters at the end as stand before the first
 // digit are ignored, as far as no group begins there, so the text may be enclosed in quotation marks.
-// Nothing is ever written behind the last value stored.
+// Behind the last value stored nothing is written if the text is ASCII; if it is not, there may be
+// zeros in place of what was there.
 HexTable readHexTable(std::string_view utf8, std::span<std::uint8_t> values,
                       Instructions instructions = bestInstructions());
 

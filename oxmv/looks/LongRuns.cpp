@@ -10,9 +10,8 @@
 namespace oxmv {
 namespace {
 
-// No carriage return: a parser makes line feeds of them. No ampersand, no bracket, nothing that is
-// not ASCII.
-constexpr std::string_view runCharacters = "0123456789ABCDEFabcdef \t\n,\"'";
+// No ampersand, no bracket, nothing that is not ASCII.
+constexpr std::string_view runCharacters = "0123456789ABCDEFabcdef \t\r\n,\"'";
 
 constexpr std::array<bool, 256> makeMembers() {
   std::array<bool, 256> members = {};

@@ -21,8 +21,8 @@ namespace oxmv {
 // A shorter run is not worth replacing.
 constexpr std::size_t minLongRun = 1024;
 
-// One run: hexadecimal digits, blanks, tabulators, line feeds, commas and quotation marks between a
-// '>' and a '<'.
+// One run: hexadecimal digits, blanks, tabulators, line ends, commas and quotation marks between a '>'
+// and a '<'. So no line end is half of one: carriage return and line feed are both in it.
 struct LongRun {
   std::size_t offset;     // in the document
   std::string_view text;  // a view into the document

@@ -5,7 +5,6 @@
 
 #include "oxmv/looks/LongRuns.h"
 #include "oxmv/platform/Unicode.h"
-#include "oxmv/platform/WholeFile.h"
 #include "oxmv/platform/Xml.h"
 #include "oxmv/values/Numbers.h"
 
@@ -14,7 +13,11 @@ namespace oxmv {
 // Makes the nodes of what the walk through a document tells.
 class LookDescription::Builder final : public XmlVisitor {
  public:
-  explicit Builder(LookDescription& description) : to_(description) {}
+  Builder(LookDescription& description, std::size_t mostText)
+      : to_(description), mostText_(std::min(mostText, maxFileSize)) {}
+
+  // Why it ended the walk; empty if it did not.
+  std::string_view objection() const { return objection_; }
 
   bool onElementStart(std::string_view name, std::size_t offset) override {
     ++depth_;
@@ -73,7 +76,10 @@ class LookDescription::Builder final : public XmlVisitor {
   // Begins a node, and so ends a text before it. Without entities no file has as many nodes as bytes.
   bool add(LookNode::Kind kind, LookNode::Form form, std::size_t offset) {
     constexpr std::size_t always = std::size_t{1} << 20;
-    if (to_.nodes_.size() >= std::max(to_.file_.size(), always)) return false;
+    if (to_.nodes_.size() >= std::max(to_.file_.size(), always)) {
+      objection_ = "its entities make too many nodes of it";
+      return false;
+    }
     to_.nodes_.push_back({static_cast<std::uint32_t>(offset), 0, 0, kind, form, false});
     isText_ = false;
     return true;
@@ -104,7 +110,11 @@ class LookDescription::Builder final : public XmlVisitor {
       if (isFirst) node.textStart = static_cast<std::uint32_t>(offset);
       node.isInFile = true;
     } else {
-      if (to_.text_.size() + node.textLength + piece.size() > maxFileSize) return false;
+      const std::size_t takenAlong = node.isInFile ? node.textLength : 0;
+      if (to_.text_.size() + takenAlong + piece.size() > mostText_) {
+        objection_ = "its nodes have too much text";
+        return false;
+      }
       if (isFirst || node.isInFile) takeOut(node);
       to_.text_ += piece;
     }
@@ -113,6 +123,9 @@ class LookDescription::Builder final : public XmlVisitor {
   }
 
   void takeOut(Entry& node) {
+    // Room for all that may follow, unless entities make more of it: text is taken out of files whose
+    // lines end in carriage returns, and then nearly all of it.
+    if (to_.text_.empty()) to_.text_.reserve(to_.file_.size() - node.offset);
     const auto start = static_cast<std::uint32_t>(to_.text_.size());
     if (node.isInFile) to_.text_ += to_.file_.substr(node.textStart, node.textLength);
     node.textStart = start;
@@ -120,6 +133,8 @@ class LookDescription::Builder final : public XmlVisitor {
   }
 
   LookDescription& to_;
+  const std::size_t mostText_;
+  std::string_view objection_;
   std::size_t depth_ = 0;
   bool isInLut_ = false;
   bool isText_ = false;   // the last node is a text that may go on
@@ -163,7 +178,7 @@ class LookDescription::Restorer final : public XmlVisitor {
       }
       ++next_;
       added_ += run.text.size() - 1;
-      if (!builder_.onText(run.text, run.offset)) return false;
+      if (!putBack(run)) return false;
       piece.remove_prefix(place - offset + 1);
       offset = place + 1;
     }
@@ -180,6 +195,20 @@ class LookDescription::Restorer final : public XmlVisitor {
   }
 
  private:
+  // Tells the builder of a run as the parser would: each line end is a line feed.
+  bool putBack(const LongRun& run) {
+    std::string_view text = run.text;
+    std::size_t offset = run.offset;
+    for (std::size_t end; (end = text.find('\r')) != std::string_view::npos;) {
+      if (!builder_.onText(text.substr(0, end), offset)) return false;
+      if (!builder_.onText("\n", offset + end)) return false;
+      end += text.substr(end).starts_with("\r\n") ? 2 : 1;
+      text.remove_prefix(end);
+      offset += end;
+    }
+    return text.empty() || builder_.onText(text, offset);
+  }
+
   // The place in the document; right once every run before it has been put back, and if one was not
   // the whole result is dropped.
   std::size_t restored(std::size_t offset) const { return offset + added_; }
@@ -191,16 +220,18 @@ class LookDescription::Restorer final : public XmlVisitor {
 };
 
 std::optional<LookDescription> LookDescription::parse(std::span<const std::uint8_t> file,
-                                                      LookProblem* problem, LookParsing parsing) {
+                                                      LookProblem* problem, LookParsing parsing,
+                                                      std::size_t mostText) {
   const std::string_view text(reinterpret_cast<const char*>(file.data()), file.size());
   // In UTF-16 the bytes of a run need not be what they seem. Such a document begins with a byte order
   // mark, or has a zero in its first character.
   const bool isUtf16 = text.size() < 2 || file[0] >= 0xFE || file[0] == 0 || file[1] == 0;
-  if (parsing == LookParsing::quick && !isUtf16) {
+  const bool isTooLarge = text.size() > maxFileSize;  // also if the rest of it is not
+  if (parsing == LookParsing::quick && !isUtf16 && !isTooLarge) {
     const Skeleton skeleton = withoutLongRuns(text);
     if (!skeleton.runs.empty()) {
       LookDescription description(text);
-      Builder builder(description);
+      Builder builder(description, mostText);
       Restorer restorer(skeleton, builder);
       const std::span bytes(reinterpret_cast<const std::uint8_t*>(skeleton.text.data()),
                             skeleton.text.size());
@@ -211,13 +242,12 @@ std::optional<LookDescription> LookDescription::parse(std::span<const std::uint8
   }
 
   LookDescription description(text);
-  Builder builder(description);
+  Builder builder(description, mostText);
   const XmlEnd end = walkXml(file, builder);
   if (end.kind == XmlEnd::Kind::wellFormed) return description;
   if (problem != nullptr) {
-    const bool isTooLarge = end.kind == XmlEnd::Kind::stopped;
-    *problem = {end.offset,
-                isTooLarge ? "its entities make too much of it" : std::string(end.what)};
+    const bool isStopped = end.kind == XmlEnd::Kind::stopped;
+    *problem = {end.offset, std::string(isStopped ? builder.objection() : end.what)};
   }
   return std::nullopt;
 }

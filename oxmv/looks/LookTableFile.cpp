@@ -37,7 +37,7 @@ int hexDigit(char c) {
 }  // namespace
 
 void OXLookFileRecord::reset(std::int32_t size) {
-  std::fill_n(bytes_.begin() + lookHeaderSize, used_, std::uint8_t{0});
+  std::fill_n(bytes_.begin(), lookHeaderSize + used_, std::uint8_t{0});
   used_ = 0;
   length_ = lookFileSize(size);
   if (bytes_.size() < length_) bytes_.resize(length_);
@@ -45,7 +45,12 @@ void OXLookFileRecord::reset(std::int32_t size) {
 
 HexTable OXLookFileRecord::readTable(std::string_view utf8) {
   const HexTable table = readHexTable(utf8, bytes().subspan(lookHeaderSize));
-  used_ = std::max(used_, table.stored * 4);
+  const auto values = bytes_.begin() + lookHeaderSize;
+  const auto end = static_cast<std::ptrdiff_t>(table.stored * 4);
+  if (table.stored * 4 < used_) {
+    std::fill(values + end, values + static_cast<std::ptrdiff_t>(used_), std::uint8_t{0});
+  }
+  used_ = table.stored * 4;
   return table;
 }
 

@@ -61,7 +61,8 @@ class OXLookFileRecord {
   // Makes it a record of N points per axis, 1 to 64, whose table is zero.
   void reset(std::int32_t size);
 
-  // Fills the table from its text, from the start; see readHexTable().
+  // Fills the table from its text, from the start; see readHexTable(). What the text has no values
+  // for is zero.
   HexTable readTable(std::string_view utf8);
 
   // The header, which is zero until LookFileRef::generateLUTFile() fills it, and the table. Valid

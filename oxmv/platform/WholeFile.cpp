@@ -208,4 +208,15 @@ bool removeFile(const std::filesystem::path& path, std::error_code& error) {
   return !error;
 }
 
+bool writeNewFile(const std::filesystem::path& path, std::span<const std::uint8_t> content,
+                  std::error_code& error) {
+  error = objectionTo(path);
+  if (error) return false;
+  struct stat there = {};
+  const bool isThere = ::lstat(path.c_str(), &there) == 0;
+  if (!isThere && replaceWholeFile(path, std::nullopt, content, error)) return true;
+  if (isThere || error == FileError::changed) error = make_error_code(std::errc::file_exists);
+  return false;
+}
+
 }  // namespace oxmv

@@ -62,6 +62,11 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
 // in `error` when that fails, also when there is none.
 [[nodiscard]] bool removeFile(const std::filesystem::path& path, std::error_code& error);
 
+// writeWholeFile() where nothing has that name, neither file nor folder nor a symbolic link, wherever
+// it leads; std::errc::file_exists where something has.
+[[nodiscard]] bool writeNewFile(const std::filesystem::path& path,
+                                std::span<const std::uint8_t> content, std::error_code& error);
+
 }  // namespace oxmv
 
 template <>

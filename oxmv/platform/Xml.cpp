@@ -1,6 +1,7 @@
 #include "oxmv/platform/Xml.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <exception>
 #include <limits>
 #include <memory>
@@ -20,6 +21,20 @@ struct ParserFree {
   void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
 };
 using Parser = std::unique_ptr<XML_ParserStruct, ParserFree>;
+
+// The parser calls it a lack of memory, too, when a document makes it pass its own limits: then it
+// does not ask for the memory at all. So those it asks remember whether they had none.
+thread_local bool isMemoryShort = false;
+
+void* remembering(void* memory) {
+  if (memory == nullptr) isMemoryShort = true;
+  return memory;
+}
+
+constexpr XML_Memory_Handling_Suite memoryFunctions = {
+    [](std::size_t size) { return remembering(std::malloc(size)); },
+    [](void* memory, std::size_t size) { return remembering(std::realloc(memory, size)); },
+    [](void* memory) { std::free(memory); }};
 
 std::string_view viewOf(const XML_Char* text) { return text != nullptr ? text : ""; }
 
@@ -41,6 +56,9 @@ class Walk {
                    const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
           of(self).entity({value, value != nullptr ? static_cast<std::size_t>(length) : 0});
         });
+    XML_SetAttlistDeclHandler(
+        parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*,
+                   int) { of(self).attributeDeclaration(); });
     XML_SetElementHandler(
         parser,
         [](void* self, const XML_Char* name, const XML_Char**) { of(self).elementStart(name); },
@@ -68,21 +86,27 @@ class Walk {
               [&](XmlVisitor& to) { return to.onProcessingInstruction(viewOf(data), offset); });
         });
     // No handler for external entities: none is loaded. None for unknown encodings: they are errors.
-    XML_SetParamEntityParsing(parser, XML_PARAM_ENTITY_PARSING_NEVER);
+    // Parameter entities of the document itself are expanded: a parser that passes one over must pass
+    // over the declarations behind it, too, and the limits would not see what it did with them.
+    XML_SetParamEntityParsing(parser, XML_PARAM_ENTITY_PARSING_ALWAYS);
   }
   Walk(const Walk&) = delete;
   Walk& operator=(const Walk&) = delete;
 
   XmlEnd run(std::span<const std::uint8_t> document) {
+    isMemoryShort = false;
     const auto* const text = reinterpret_cast<const char*>(document.data());
     const XML_Status status = XML_Parse(parser_, document.empty() ? "" : text,
                                         static_cast<int>(document.size()), XML_TRUE);
     if (thrown_ != nullptr) std::rethrow_exception(thrown_);
     if (status == XML_STATUS_OK) return {};
     const XML_Error error = XML_GetErrorCode(parser_);
-    if (error == XML_ERROR_NO_MEMORY) throw std::bad_alloc();
+    if (error == XML_ERROR_NO_MEMORY && isMemoryShort) throw std::bad_alloc();
     if (!objection_.empty()) return {XmlEnd::Kind::malformed, stoppedAt_, objection_};
     if (isStopped_) return {XmlEnd::Kind::stopped, stoppedAt_, {}};
+    if (error == XML_ERROR_NO_MEMORY) {
+      return {XmlEnd::Kind::malformed, offset(), "takes too much memory"};
+    }
     return {XmlEnd::Kind::malformed, offset(), viewOf(XML_ErrorString(error))};
   }
 
@@ -130,8 +154,12 @@ class Walk {
     tell([](XmlVisitor& to) { return to.onElementEnd(); });
   }
 
+  void attributeDeclaration() {
+    if (++declaredAttributes_ > maxXmlDeclaredAttributes) object("too many attributes declared");
+  }
+
   void entity(std::string_view value) {
-    if (value.find('&') == std::string_view::npos) return;
+    if (value.find_first_of("&%") == std::string_view::npos) return;
     if (++nestedEntities_ > maxXmlNestedEntities) object("too many entities within entities");
   }
 
@@ -143,6 +171,7 @@ class Walk {
   XmlVisitor& visitor_;
   std::size_t depth_ = 0;
   std::size_t nestedEntities_ = 0;
+  std::size_t declaredAttributes_ = 0;
   bool isStopped_ = false;
   std::size_t stoppedAt_ = 0;
   std::string_view objection_;
@@ -155,7 +184,7 @@ XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor) {
   if (document.size() > maxFileSize) {
     return {XmlEnd::Kind::malformed, maxFileSize, "larger than 256 MiB"};
   }
-  const Parser parser(XML_ParserCreate(nullptr));
+  const Parser parser(XML_ParserCreate_MM(nullptr, &memoryFunctions, nullptr));
   if (parser == nullptr) throw std::bad_alloc();
   return Walk(parser.get(), visitor).run(document);
 }

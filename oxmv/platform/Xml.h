@@ -12,9 +12,13 @@ namespace oxmv {
 // Elements nested deeper than this only hostile input has; what is open takes memory.
 constexpr std::size_t maxXmlDepth = 4096;
 
-// Entities of a document whose text refers to entities. Each may stand in the next, and their
-// expansion takes stack for each.
+// Entities of a document, parameter entities among them, whose text refers to entities. Each may stand
+// in the next, and their expansion takes stack for each.
 constexpr std::size_t maxXmlNestedEntities = 16;
+
+// Attributes that a document declares. The parser goes through those of an element's name each time
+// that such an element begins, so many declarations and many elements would take the product of both.
+constexpr std::size_t maxXmlDeclaredAttributes = 64;
 
 // Hears what a document holds, in its order. Texts are UTF-8, with line ends as single line feeds;
 // they are valid during the call. `offset` is where in the document, in bytes, the event begins;

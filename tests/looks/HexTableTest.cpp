@@ -28,10 +28,9 @@ Read read(std::string_view text, std::size_t room = 64) {
     Bytes values(room * 4, untouched);
     const HexTable table = readHexTable(text, values, kind);
     EXPECT_LE(table.stored, std::min(room, table.groups));
-    if (table.isAscii) {
-      EXPECT_TRUE(std::all_of(values.begin() + static_cast<std::ptrdiff_t>(table.stored * 4),
-                              values.end(), [](auto byte) { return byte == untouched; }));
-    }
+    EXPECT_TRUE(
+        std::all_of(values.begin() + static_cast<std::ptrdiff_t>(table.stored * 4), values.end(),
+                    [&](auto byte) { return byte == untouched || (byte == 0 && !table.isAscii); }));
     values.resize(table.stored * 4);
     if (kind == Instructions::portable) {
       first = {table, values};
@@ -177,6 +176,15 @@ TEST(HexTable, GroupWithACharacterThatIsNotAsciiIsEightCharacters) {
   const Read got = read("0000\u20AC03F0000003F");
   EXPECT_EQ(got.values, (Bytes{0, 0, 0, 0, 0x00, 0x00, 0x00, 0x3F}));
   EXPECT_EQ(got.table.malformed, 1u);
+}
+
+TEST(HexTable, ValuesStoredBeforeTheTextTurnsOutNotToBeAsciiLeaveZeros) {
+  // Counted in bytes the text is longer than in characters, and the second group begins early enough.
+  const std::string front(20, '#');
+  const Read got = read(front + "0000803F0000003F0000803E\U0001F3A8\U0001F3A8");
+  EXPECT_FALSE(got.table.isAscii);
+  EXPECT_EQ(got.table.stored, 1u);
+  EXPECT_EQ(got.values, one);
 }
 
 // The rules as they are written, a character at a time.

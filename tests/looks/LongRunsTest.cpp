@@ -65,7 +65,7 @@ TEST(LongRuns, HoldTheseCharactersOnly) {
       text[at] = static_cast<char>(c);
       const bool isMember =
           c != 0 &&
-          std::string_view("0123456789ABCDEFabcdef \t\n,\"'").find(static_cast<char>(c)) !=
+          std::string_view("0123456789ABCDEFabcdef \t\r\n,\"'").find(static_cast<char>(c)) !=
               std::string_view::npos;
       const std::string document = "<a>" + text + "</a>";
       EXPECT_EQ(skeletonOf(document).runs.size(), isMember ? 1u : 0u) << c << " at " << at;

@@ -60,6 +60,10 @@ std::string nodesOf(std::string_view file) {
 
 const std::string run(minLongRun, 'A');
 
+// Line ends of every kind: as they are in a file, and as what is read from it has them.
+const std::string returns = "\r\n" + run + "\r\n\r\n1\r\r2\n\r\n\r3\r" + run + "\r\n4\r";
+const std::string feeds = "\n" + run + "\n\n1\n\n2\n\n\n3\n" + run + "\n4\n";
+
 TEST(LookDescription, GivesTheChildrenOfItsLuts) {
   EXPECT_EQ(nodesOf("<look><LUT><size>2</size><data>0000803F</data></LUT></look>"),
             "LUT\nsize: 2\ntable: 0000803F\n");
@@ -146,6 +150,27 @@ TEST(LookDescription, LongTextsAreTheSame) {
   EXPECT_EQ(nodesOf("<look><LUT><a>" + run + "</a></LUT></look>"), "LUT\ntable: " + run + "\n");
   EXPECT_EQ(nodesOf("<look><LUT>" + run + "<a>" + run + "</a>" + run + "</LUT>" + run + "</look>"),
             "LUT\ntable: " + run + "\ntable: " + run + "\ntable: " + run + "\n");
+}
+
+TEST(LookDescription, LineEndsOfLongTextsAreLineFeeds) {
+  EXPECT_EQ(nodesOf("<look><LUT><a>" + returns + "</a></LUT></look>"),
+            "LUT\ntable: " + feeds + "\n");
+  EXPECT_EQ(nodesOf("<look><LUT>" + returns + "<a>x<b/>" + returns + "<b/>\r\n</a>" + returns +
+                    "</LUT></look>"),
+            "LUT\ntable: " + feeds + "\ntable: x" + feeds + "\n\ntable: " + feeds + "\n");
+  EXPECT_EQ(nodesOf("<look><LUT><![CDATA[>" + returns + "<]]></LUT>" + returns + "</look>"),
+            "LUT\ntable: >" + feeds + "<\n");
+  EXPECT_EQ(nodesOf("<look><LUT>" + run + "\r</LUT><LUT>\n" + run + "</LUT></look>"),
+            "LUT\ntable: " + run + "\n\nLUT\ntable: \n" + run + "\n");
+}
+
+TEST(LookDescription, LongTableWithCarriageReturnsIsCopiedOnce) {
+  std::string lines;
+  for (int i = 0; i < 20000; ++i) lines += "0000803F0000003F\r\n";
+  const std::string file = "<look><LUT><size>64</size><data>" + lines + "</data></LUT></look>";
+  const test::MemoryMeter meter;
+  ASSERT_TRUE(LookDescription::parse(bytesOf(file)));
+  EXPECT_LT(meter.peak(), file.size() * 5 / 4);
 }
 
 TEST(LookDescription, LongTextsBesideOthersAreTheSame) {
@@ -258,10 +283,11 @@ TEST(LookDescription, LongTableIsNotCopied) {
 // One change somewhere: both ways must still agree, whatever comes of it.
 TEST(LookDescription, DamagedOnesAreReadAlikeInBothWays) {
   std::mt19937 random(5);
-  const std::string parts[] = {run,      "<a>",       "</a>", "<LUT>",          "</LUT>", "<!--",
-                               "-->",    "<![CDATA[", "]]>",  "<?p ",           "?>",     "\"",
-                               "'",      ">",         "<",    "&amp;",          "&#48;",  "\r\n",
-                               "\u00E9", "<b c='",    "'/>",  "<size>1</size>", " ",      "x"};
+  const std::string parts[] = {run,    returns,  "<a>",       "</a>", "<LUT>",          "</LUT>",
+                               "<!--", "-->",    "<![CDATA[", "]]>",  "<?p ",           "?>",
+                               "\"",   "'",      ">",         "<",    "&amp;",          "&#48;",
+                               "\r\n", "\u00E9", "<b c='",    "'/>",  "<size>1</size>", " ",
+                               "x"};
   int parsedOnes = 0;
   for (int i = 0; i < 3000; ++i) {
     std::string file = "<look><LUT>";
@@ -289,6 +315,33 @@ TEST(LookDescription, EveryShorterFileIsReadAlikeInBothWays) {
   EXPECT_TRUE(parsed(file));
 }
 
+TEST(LookDescription, TextOutOfTheFileIsLimitedAlikeInBothWays) {
+  // Out of the file: "&" and what follows it, and a text that is taken out at its end.
+  const std::string file = "<look><LUT><size>1</size><a>&amp;<b/>" + run + "</a>" + run + "<c>" +
+                           run + "<d/>\r\n</c><e>" + run + "</e></LUT></look>";
+  const std::size_t most = 1 + run.size() + run.size() + 1;
+  for (const LookParsing parsing : {LookParsing::quick, LookParsing::plain}) {
+    EXPECT_TRUE(LookDescription::parse(bytesOf(file), nullptr, parsing, most));
+    LookProblem problem;
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing, most - 1));
+    EXPECT_EQ(problem.what, "its nodes have too much text");
+    EXPECT_EQ(problem.offset, file.find('\r'));
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing, run.size()));
+    EXPECT_EQ(problem.what, "its nodes have too much text");
+  }
+}
+
+TEST(LookDescription, FileAboveTheLargestIsRefusedInBothWays) {
+  std::string file = "<look><LUT>";
+  file.resize(maxFileSize + 1 - std::string_view("</LUT></look>").size(), '0');
+  file += "</LUT></look>";
+  for (const LookParsing parsing : {LookParsing::quick, LookParsing::plain}) {
+    LookProblem problem;
+    EXPECT_FALSE(LookDescription::parse(bytesOf(file), &problem, parsing));
+    EXPECT_EQ(problem.what, "larger than 256 MiB");
+  }
+}
+
 TEST(LookDescription, EntitiesThatMakeTooMuchAreRefused) {
   // As many as Expat lets pass, each a node, from a file of some kilobytes.
   std::string file = "<!DOCTYPE look [<!ENTITY e0 '";
@@ -305,7 +358,7 @@ TEST(LookDescription, EntitiesThatMakeTooMuchAreRefused) {
   ASSERT_TRUE(few);
   EXPECT_EQ(few->nodeCount(), 100001u);
   EXPECT_FALSE(LookDescription::parse(bytesOf(file + "&e3;&e3;</LUT></look>"), &problem));
-  EXPECT_EQ(problem.what, "its entities make too much of it");
+  EXPECT_EQ(problem.what, "its entities make too many nodes of it");
 }
 
 TEST(LookDescription, MissingMemoryReachesTheCaller) {

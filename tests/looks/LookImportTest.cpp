@@ -123,7 +123,7 @@ TEST_F(LookImport, WritesTheTableAndCopiesTheDescription) {
   EXPECT_TRUE(witness.stops.empty());
 }
 
-TEST_F(LookImport, SecondTimeDoesAndGivesNothing) {
+TEST_F(LookImport, KeepsWhatIsThereTheSecondTimeAndGivesTheEmptyReference) {
   import(onePoint);
   const auto before = files();
   struct stat old = {};
@@ -263,12 +263,48 @@ TEST_F(LookImport, TableThatIsThereTwiceIsWrittenOnce) {
   EXPECT_EQ(look->CRC(), witness.tables[1].crc);
 }
 
-TEST_F(LookImport, TableThatCouldNotBeWrittenIsTriedAgain) {
-  host->strings["OXMVLutsPath"] = folder / "missing";
-  import("<look><LUT><size>1</size><a>0000803F</a><b>0000803F</b></LUT></look>");
-  ASSERT_EQ(witness.tables.size(), 2u);
-  EXPECT_TRUE(witness.tables[1].isNew);
-  EXPECT_TRUE(witness.tables[1].writeError);
+TEST_F(LookImport, TableThatCouldNotBeWrittenIsNotTriedAgain) {
+  // The folder comes while the tables are told, too late for the first and all like it.
+  class Maker final : public LookImportObserver {
+   public:
+    Maker(fs::path folder, LookImportObserver& next) : folder_(std::move(folder)), next_(next) {}
+    void onTable(const LookTableReport& table) override {
+      fs::create_directory(folder_);
+      next_.onTable(table);
+    }
+
+   private:
+    fs::path folder_;
+    LookImportObserver& next_;
+  };
+  const fs::path late = folder / "late";
+  host->strings["OXMVLutsPath"] = late;
+  put(folder / "Warm.xml",
+      "<look><LUT><size>1</size><a>0000803F</a><b>0000003F</b><c>0000803F</c></LUT></look>");
+  Maker maker(late, witness);
+  const auto look = LookFileRef::initFromLookFile(folder / "Warm.xml", &maker);
+  ASSERT_EQ(witness.tables.size(), 3u);
+  EXPECT_EQ(witness.tables[0].writeError, std::errc::no_such_file_or_directory);
+  EXPECT_FALSE(witness.tables[1].writeError);
+  EXPECT_TRUE(witness.tables[2].isNew);
+  EXPECT_EQ(witness.tables[2].writeError, witness.tables[0].writeError);
+  EXPECT_FALSE(fs::exists(late / lookFileNameOf(witness.tables[0].crc)));
+  EXPECT_TRUE(fs::exists(late / lookFileNameOf(witness.tables[1].crc)));
+  EXPECT_EQ(look->CRC(), witness.tables[2].crc);  // as if it had been tried
+  EXPECT_EQ(look->version(), 2);
+  for (const LookTableReport& table : witness.tables) {
+    EXPECT_EQ(table.copy, Copy::failed);
+    EXPECT_EQ(table.copyError, std::errc::no_such_file_or_directory);
+  }
+  EXPECT_FALSE(fs::exists(late / "Warm.xml"));
+}
+
+TEST_F(LookImport, LinkThatLeadsNowhereIsLeftAlone) {
+  fs::create_symlink(folder / "nowhere", looks / "Warm.xml");
+  import(onePoint);
+  EXPECT_EQ(witness.tables.at(0).copy, Copy::alreadyThere);
+  EXPECT_FALSE(witness.tables.at(0).copyError);
+  EXPECT_FALSE(fs::exists(folder / "nowhere"));
 }
 
 TEST_F(LookImport, MillionTablesAlikeAreOneFile) {
@@ -362,6 +398,12 @@ TEST_F(LookImport, EveryShorterFileGivesTheEmptyReference) {
   }
 }
 
+std::string hundredTimes(std::string_view text) {
+  std::string all;
+  for (int i = 0; i < 100; ++i) all += text;
+  return all;
+}
+
 TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
   const std::string body = "<LUT><size>1</size><a>0000803F</a>";
   std::string bomb = "<!DOCTYPE look [<!ENTITY e0 '" + std::string(100, 'F') + "'>";
@@ -370,11 +412,16 @@ TEST_F(LookImport, HostileFilesGiveTheEmptyReference) {
     for (int k = 0; k < 10; ++k) bomb += "&e" + std::to_string(i - 1) + ";";
     bomb += "'>";
   }
+  std::string declaring = "<!DOCTYPE look [<!ATTLIST LUT";
+  for (int i = 0; i < 20000; ++i) declaring += " a" + std::to_string(i) + " CDATA 'x'";
   std::string deep;
   for (int i = 0; i < 100000; ++i) deep += "<a>";
   for (int i = 0; i < 100000; ++i) deep += "</a>";
   for (const std::string& file : {
            bomb + "]><look>" + body + "<a>&e12;</a></LUT></look>",
+           declaring + ">]><look>" + body + "</LUT></look>",
+           "<!DOCTYPE look [<!ENTITY e '" + std::string(1000000, 'x') + "'>]><look>" + body +
+               "<a b='" + hundredTimes("&e;") + "'/></LUT></look>",
            "<look>" + body + deep + "</LUT></look>",
            "<look>" + body + std::string(1, '\0') + "</LUT></look>",
            "<look>" + body + "</LUT></look>" + std::string(100, '\0'),
@@ -460,6 +507,35 @@ TEST_F(LookImport, WritesNoMoreThanItsLimit) {
   EXPECT_EQ(files().size(), 3u);
   EXPECT_TRUE(host->alerts.empty());
   EXPECT_EQ(maxImportedBytes, 1073741824u);
+}
+
+TEST_F(LookImport, WritesNoMoreFilesThanItsLimit) {
+  // The second is there already, and does not count.
+  put(folder / "Warm.xml",
+      "<look><LUT><size>1</size><a>0000803F</a><a>0000803F</a><a>0000003F</a></LUT></look>");
+  EXPECT_TRUE(importLook(folder / "Warm.xml", &witness, maxImportedBytes, 2));
+  EXPECT_TRUE(witness.stops.empty());
+  EXPECT_EQ(files().size(), 3u);
+  fs::remove_all(looks);
+  fs::create_directory(looks);
+  witness = {};
+  const auto look = importLook(folder / "Warm.xml", &witness, maxImportedBytes, 1);
+  ASSERT_EQ(witness.tables.size(), 1u);
+  EXPECT_EQ(look->CRC(), witness.tables[0].crc);
+  ASSERT_EQ(witness.stops.size(), 1u);
+  EXPECT_EQ(witness.stops[0].reason, LookImportStop::tooMuch);
+  EXPECT_EQ(files().size(), 2u);
+  EXPECT_TRUE(host->alerts.empty());
+  EXPECT_EQ(maxImportedFiles, 4096u);
+}
+
+TEST_F(LookImport, FilesThatCannotBeWrittenCount) {
+  host->strings["OXMVLutsPath"] = folder / "missing";
+  put(folder / "Warm.xml",
+      "<look><LUT><size>1</size><a>0000803F</a><a>0000003F</a><a>0000803E</a></LUT></look>");
+  importLook(folder / "Warm.xml", &witness, maxImportedBytes, 2);
+  EXPECT_EQ(witness.tables.size(), 2u);
+  EXPECT_EQ(witness.stops.at(0).reason, LookImportStop::tooMuch);
 }
 
 TEST_F(LookImport, AnswerIsTheSameWithoutAWitness) {

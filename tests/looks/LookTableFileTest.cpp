@@ -257,6 +257,28 @@ TEST(OXLookFileRecord, IsZeroAgainAfterReset) {
   EXPECT_EQ(Bytes(record.table().begin(), record.table().end()), Bytes(27 * 12));
 }
 
+TEST(OXLookFileRecord, ReadTwiceHasTheSecondTableOnly) {
+  OXLookFileRecord record;
+  record.reset(2);
+  record.readTable("0000803F0000003F0000803E");
+  EXPECT_EQ(record.readTable("12345678").stored, 1u);
+  std::vector<std::uint8_t> expected = {0x12, 0x34, 0x56, 0x78};
+  expected.resize(96);
+  EXPECT_TRUE(std::equal(expected.begin(), expected.end(), record.table().begin()));
+  EXPECT_EQ(record.readTable("").stored, 0u);
+  expected.assign(96, 0);
+  EXPECT_TRUE(std::equal(expected.begin(), expected.end(), record.table().begin()));
+}
+
+TEST(OXLookFileRecord, HeaderIsZeroAgainAfterReset) {
+  OXLookFileRecord record;
+  record.reset(1);
+  storeLookHeader({}, record.bytes());
+  record.reset(1);
+  const auto bytes = record.bytes();
+  EXPECT_TRUE(std::all_of(bytes.begin(), bytes.end(), [](auto byte) { return byte == 0; }));
+}
+
 TEST(OXLookFileRecord, HasRoomForItsValuesOnly) {
   OXLookFileRecord record;
   record.reset(1);

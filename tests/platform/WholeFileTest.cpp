@@ -386,5 +386,41 @@ TEST(ReplaceWholeFile, LeavesAFileThatMayNotBeReadAnyMore) {
   }));
 }
 
+TEST(WriteNewFile, WritesWhereNothingIs) {
+  const TempDir folder;
+  std::error_code error = std::make_error_code(std::errc::io_error);
+  EXPECT_TRUE(writeNewFile(folder / "clip", newContent, error));
+  EXPECT_FALSE(error);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
+}
+
+TEST(WriteNewFile, LeavesWhatIsThereAlone) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  fs::create_directory(folder / "folder");
+  fs::create_symlink("clip", folder / "link");
+  fs::create_symlink("nowhere", folder / "nothing");
+  fs::create_symlink("circle", folder / "circle");
+  for (const char* name : {"clip", "folder", "link", "nothing", "circle"}) {
+    std::error_code error;
+    EXPECT_FALSE(writeNewFile(folder / name, newContent, error)) << name;
+    EXPECT_EQ(error, std::errc::file_exists) << name;
+  }
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
+  EXPECT_FALSE(fs::exists(folder / "nowhere"));
+}
+
+TEST(WriteNewFile, SaysWhyItCouldNot) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  std::error_code error;
+  EXPECT_FALSE(writeNewFile(folder / "missing/clip", newContent, error));
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+  EXPECT_FALSE(writeNewFile(folder / "clip/clip", newContent, error));
+  EXPECT_EQ(error, std::errc::not_a_directory);
+  EXPECT_FALSE(writeNewFile(folder / std::string("a\0b", 3), newContent, error));
+  EXPECT_EQ(error, std::errc::invalid_argument);
+}
+
 }  // namespace
 }  // namespace oxmv

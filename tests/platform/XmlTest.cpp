@@ -1,12 +1,17 @@
+#include <fstream>
 #include <new>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
+#include <sys/resource.h>
+#include <unistd.h>
 
 #include "oxmv/platform/Xml.h"
+#include "support/ChildProcess.h"
 #include "support/SmallStack.h"
+#include "support/TempDir.h"
 
 namespace oxmv {
 namespace {
@@ -205,6 +210,43 @@ TEST(Xml, EntitiesThatMultiplyAreMalformed) {
   EXPECT_EQ(endOf(document + "]><a>&e3;</a>").kind, Kind::wellFormed);
 }
 
+// An entity of a megabyte, in an attribute of an element.
+std::string entityInAttribute(int times) {
+  std::string document = "<!DOCTYPE a [<!ENTITY e '" + std::string(1000000, 'x') + "'>]><a b='";
+  for (int i = 0; i < times; ++i) document += "&e;";
+  return document + "'/>";
+}
+
+TEST(Xml, DocumentThatTakesTooMuchMemoryIsMalformed) {
+  EXPECT_EQ(endOf(entityInAttribute(10)).kind, Kind::wellFormed);
+  const XmlEnd end = endOf(entityInAttribute(95));
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.what, "takes too much memory");
+}
+
+TEST(Xml, MemoryThatTheSystemLacksReachesTheCaller) {
+#ifdef OXMV_ADDRESS_SANITIZER
+  GTEST_SKIP() << "the sanitizer ends the program where the system has no memory";
+#endif
+  const std::string document = "<a b='" + std::string(std::size_t{64} << 20, 'x') + "'/>";
+  EXPECT_TRUE(test::inChildProcess([&] {
+    std::size_t pages = 0;  // that the process has by now
+    std::ifstream("/proc/self/statm") >> pages;
+    const std::size_t some = std::size_t{16} << 20;
+    rlimit limit = {};
+    if (pages == 0 || ::getrlimit(RLIMIT_AS, &limit) != 0) return false;
+    limit.rlim_cur = pages * static_cast<std::size_t>(::sysconf(_SC_PAGESIZE)) + some;
+    if (::setrlimit(RLIMIT_AS, &limit) != 0) return false;
+    Recorder recorder;
+    try {
+      walk(document, recorder);
+    } catch (const std::bad_alloc&) {
+      return true;
+    }
+    return false;
+  }));
+}
+
 // A chain of entities, each within the next.
 std::string chain(std::size_t nested) {
   std::string document = "<!DOCTYPE a [<!ENTITY e0 'x'>";
@@ -221,6 +263,83 @@ TEST(Xml, EntitiesWithinEntitiesAreLimited) {
   EXPECT_EQ(end.kind, Kind::malformed);
   EXPECT_EQ(end.what, "too many entities within entities");
   EXPECT_EQ(endOf(chain(100000)).kind, Kind::malformed);
+}
+
+// Declares attributes of one element, in one list or each in its own, without a default or with one.
+std::string declaring(std::size_t attributes, std::string_view between, std::string_view what) {
+  std::string document = "<!DOCTYPE a [<!ATTLIST a";
+  for (std::size_t i = 0; i < attributes; ++i) {
+    if (i > 0) document += between;
+    document += " b" + std::to_string(i) + ' ' + std::string(what);
+  }
+  return document + ">]><a/>";
+}
+
+TEST(Xml, DeclaredAttributesAreLimited) {
+  for (const char* between : {"", "><!ATTLIST a", "><!ATTLIST c"}) {
+    for (const char* what : {"CDATA #IMPLIED", "CDATA 'x'", "(x|y) 'x'", "ID #REQUIRED"}) {
+      EXPECT_EQ(endOf(declaring(maxXmlDeclaredAttributes, between, what)).kind, Kind::wellFormed)
+          << between << what;
+      const XmlEnd end = endOf(declaring(maxXmlDeclaredAttributes + 1, between, what));
+      EXPECT_EQ(end.kind, Kind::malformed);
+      EXPECT_EQ(end.what, "too many attributes declared");
+    }
+  }
+}
+
+TEST(Xml, ManyDeclaredAttributesOfManyElementsAreRefusedAtOnce) {
+  std::string document = declaring(20000, "", "CDATA 'x'");
+  document.resize(document.size() - std::string_view("<a/>").size());
+  document += "<r>";
+  for (int i = 0; i < 200000; ++i) document += "<a/>";
+  EXPECT_EQ(endOf(document + "</r>").what, "too many attributes declared");
+}
+
+TEST(Xml, ReadsDeclarationsInAndBehindAParameterEntity) {
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY % p '<!ENTITY e \"x\">'>%p;]><a>&e;</a>"), "x");
+  EXPECT_EQ(textsOf("<!DOCTYPE a [<!ENTITY % p ' '>%p;<!ENTITY e 'x'>]><a>&e;</a>"), "x");
+}
+
+TEST(Xml, DeclarationsInAndBehindAParameterEntityCount) {
+  const std::string one = "<!DOCTYPE a [<!ENTITY % p '<!ATTLIST a p CDATA #IMPLIED>'>%p;";
+  const std::string_view start = "<!DOCTYPE a [";
+  const std::string rest = declaring(maxXmlDeclaredAttributes, "", "CDATA 'x'");
+  EXPECT_EQ(endOf(one + rest.substr(start.size())).what, "too many attributes declared");
+  const std::string fewer = declaring(maxXmlDeclaredAttributes - 1, "", "CDATA 'x'");
+  EXPECT_EQ(endOf(one + fewer.substr(start.size())).kind, Kind::wellFormed);
+}
+
+// A chain of parameter entities, each within the next.
+std::string parameterChain(std::size_t nested) {
+  std::string document = "<!DOCTYPE a [<!ENTITY % e0 '<!ENTITY x \"y\">'>";
+  for (std::size_t i = 1; i <= nested; ++i) {
+    document += "<!ENTITY % e" + std::to_string(i) + " '&#37;e" + std::to_string(i - 1) + ";'>";
+  }
+  return document + "%e" + std::to_string(nested) + ";]><a>&x;</a>";
+}
+
+TEST(Xml, ParameterEntitiesWithinParameterEntitiesAreLimited) {
+  EXPECT_EQ(textsOf(parameterChain(maxXmlNestedEntities)), "y");
+  EXPECT_EQ(endOf(parameterChain(maxXmlNestedEntities + 1)).what,
+            "too many entities within entities");
+  EXPECT_EQ(endOf(parameterChain(100000)).kind, Kind::malformed);
+  EXPECT_EQ(endOf("<!DOCTYPE a [<!ENTITY % e '&#37;e;'>%e;]><a/>").kind, Kind::malformed);
+}
+
+TEST(Xml, ParameterEntityFromOutsideIsNeverOpened) {
+  const test::TempDir folder;
+  const std::string outside = folder / "outside";
+  std::ofstream(outside) << "<!ENTITY x 'loaded'>";
+  for (const std::string& start :
+       {"<!DOCTYPE a SYSTEM '" + outside + "'>", "<!DOCTYPE a SYSTEM 'file://" + outside + "'>",
+        "<!DOCTYPE a [<!ENTITY % e SYSTEM '" + outside + "'>%e;]>",
+        "<!DOCTYPE a [<!ENTITY % e PUBLIC 'p' 'file://" + outside + "'>%e;]>"}) {
+    EXPECT_EQ(textsOf(start + "<a>&x;</a>"), "") << start;
+  }
+  // What is declared behind it might mean something else there, and so is passed over.
+  EXPECT_EQ(
+      textsOf("<!DOCTYPE a [<!ENTITY % e SYSTEM '" + outside + "'>%e;<!ENTITY x 'y'>]><a>&x;</a>"),
+      "");
 }
 
 std::string nested(std::size_t depth) {
@@ -243,6 +362,7 @@ TEST(Xml, NeedsLittleStack) {
       [] {
         EXPECT_EQ(endOf(nested(maxXmlDepth)).kind, Kind::wellFormed);
         EXPECT_EQ(endOf(chain(maxXmlNestedEntities)).kind, Kind::wellFormed);
+        EXPECT_EQ(endOf(parameterChain(maxXmlNestedEntities)).kind, Kind::wellFormed);
       },
       std::size_t{1} << 20);
   EXPECT_LE(used, std::size_t{64} << 10);
