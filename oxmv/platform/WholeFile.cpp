@@ -86,6 +86,26 @@ std::string temporaryName() {
   return name + ".tmp";
 }
 
+// A file of a name that was made for it, which is gone again unless it is given another.
+class TemporaryFile {
+ public:
+  explicit TemporaryFile(const std::filesystem::path& path) : path_(path) {}
+  TemporaryFile(const TemporaryFile&) = delete;
+  TemporaryFile& operator=(const TemporaryFile&) = delete;
+  ~TemporaryFile() {
+    if (isTemporary_) ::unlink(path_.c_str());
+  }
+
+  bool rename(const std::filesystem::path& path) {
+    isTemporary_ = ::rename(path_.c_str(), path.c_str()) != 0;
+    return !isTemporary_;
+  }
+
+ private:
+  const std::filesystem::path& path_;
+  bool isTemporary_ = true;
+};
+
 // Opened to be synchronised. A folder that may be written but not read cannot be, and that is no
 // error.
 Descriptor openFolder(const std::filesystem::path& folder, std::error_code& error) {
@@ -176,16 +196,14 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
   const mode_t mode = isThere ? 0600 : 0666;
   Descriptor file(::open(temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));
   if (!file.isOpen()) return error = lastError(), false;
+  // From here on also want of memory leaves nothing behind.
+  TemporaryFile made(temporary);
   const bool isComplete = writeAll(file.number(), content) &&
                           (!isThere || takeOver(file.number(), replaced)) &&
                           ::fsync(file.number()) == 0 && file.close();
-  if (!isComplete) error = lastError();
-  if (!error && old != nullptr && !hasContent(target, *old)) error = FileError::changed;
-  if (!error && ::rename(temporary.c_str(), target.c_str()) != 0) error = lastError();
-  if (error) {
-    ::unlink(temporary.c_str());
-    return false;
-  }
+  if (!isComplete) return error = lastError(), false;
+  if (old != nullptr && !hasContent(target, *old)) return error = FileError::changed, false;
+  if (!made.rename(target)) return error = lastError(), false;
   if (!syncFolder(openedFolder)) return error = lastError(), false;
   return true;
 }

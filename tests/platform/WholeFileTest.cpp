@@ -3,6 +3,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -13,6 +14,7 @@
 #include "oxmv/platform/WholeFile.h"
 #include "tests/support/ChildProcess.h"
 #include "tests/support/Files.h"
+#include "tests/support/Memory.h"
 #include "tests/support/TempDir.h"
 
 namespace oxmv {
@@ -384,6 +386,50 @@ TEST(ReplaceWholeFile, LeavesAFileThatMayNotBeReadAnyMore) {
     return !replaceWholeFile(folder / "clip", std::nullopt, newContent, error) &&
            error == FileError::changed;
   }));
+}
+
+// Runs a writer with memory for no allocation, for one and so on; answers how often it ran out.
+template <class Writer>
+std::size_t shortagesOf(const TempDir& folder, Writer write) {
+  for (std::size_t granted = 0; granted < 100; ++granted) {
+    test::putFile(folder / "clip", oldContent);
+    const fs::path path = folder / "clip";
+    bool isWritten = false;
+    bool wasFelt = false;
+    {
+      const test::MemoryShortage shortage(granted);
+      try {
+        isWritten = write(path);
+      } catch (const std::bad_alloc&) {
+      }
+      wasFelt = shortage.wasFelt();
+    }
+    EXPECT_EQ(test::getFile(path), isWritten ? newContent : oldContent) << granted;
+    EXPECT_EQ(test::namesIn(folder.path()), std::set<std::string>{"clip"}) << granted;
+    if (!wasFelt) return isWritten ? granted : 0;
+  }
+  return 0;
+}
+
+TEST(WriteWholeFile, WithoutMemoryLeavesTheOldFileAndNothingElse) {
+  const TempDir folder;
+  EXPECT_GT(shortagesOf(folder,
+                        [](const fs::path& path) {
+                          std::error_code error;
+                          return writeWholeFile(path, newContent, error);
+                        }),
+            0u);
+}
+
+TEST(ReplaceWholeFile, WithoutMemoryLeavesTheOldFileAndNothingElse) {
+  const TempDir folder;
+  const std::optional<Bytes> old = oldContent;
+  EXPECT_GT(shortagesOf(folder,
+                        [&](const fs::path& path) {
+                          std::error_code error;
+                          return replaceWholeFile(path, old, newContent, error);
+                        }),
+            0u);
 }
 
 }  // namespace
