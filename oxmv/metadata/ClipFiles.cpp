@@ -50,9 +50,9 @@ MetadataDictionary MetadataDictionary::initFromLast() {
   object._guid = last.guid;
   if (error) {
     object.setLoadError(error);
-  } else if (const auto stream = last.stream()) {
+  } else if (last.stream) {
     // maxFileSize is far below what the length can say.
-    object.initWithBytes(*stream, static_cast<std::int32_t>(stream->size()));
+    object.initWithBytes(*last.stream, static_cast<std::int32_t>(last.stream->size()));
   } else {
     object.loadError_ = LoadError::tooShort;
   }

@@ -56,6 +56,19 @@ std::optional<OpenFile> openFile(const std::filesystem::path& path, std::error_c
   return OpenFile{std::move(file), *size};
 }
 
+// The content from where the first `start` bytes have been read.
+std::optional<Content> contentBehind(std::size_t start, const OpenFile& open,
+                                     std::error_code& error) {
+  if (open.size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
+  const auto whole = static_cast<std::size_t>(open.size);
+  // One more, to meet the end in one go.
+  Content content((whole > start ? whole - start : 0) + 1);
+  const auto size = readToEnd(content, 0, open.file, error);
+  if (!size) return std::nullopt;
+  content.resize(*size);
+  return content;
+}
+
 bool writeAll(int file, std::span<const std::uint8_t> content) {
   while (!content.empty()) {
     const ssize_t count = ::write(file, content.data(), content.size());
@@ -144,13 +157,7 @@ std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::pa
                                                        std::error_code& error) {
   const auto open = openFile(path, error);
   if (!open) return std::nullopt;
-  if (open->size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
-  // One more, to meet the end in one go.
-  std::vector<std::uint8_t> content(static_cast<std::size_t>(open->size) + 1);
-  const auto size = readToEnd(content, 0, open->file, error);
-  if (!size) return std::nullopt;
-  content.resize(*size);
-  return content;
+  return contentBehind(0, *open, error);
 }
 
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
@@ -164,6 +171,21 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
   if (!size) return std::nullopt;
   content.resize(*size);
   return content;
+}
+
+std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::path& path,
+                                                        std::span<std::uint8_t>& head,
+                                                        std::error_code& error) {
+  const std::size_t wanted = head.size();
+  auto there = head;
+  head = head.first(0);
+  const auto open = openFile(path, error);
+  if (!open) return std::nullopt;
+  const auto headSize = readInto(there, open->file, error);
+  if (!headSize) return std::nullopt;
+  head = there.first(*headSize);
+  if (*headSize < wanted) return std::nullopt;
+  return contentBehind(wanted, *open, error);
 }
 
 namespace {

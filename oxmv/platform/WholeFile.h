@@ -39,6 +39,13 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
                                                        std::size_t count, std::error_code& error,
                                                        bool* isOpened = nullptr);
 
+// The content of such a file behind a head of fixed size, which is read first and cut to the bytes of
+// it that are there: they are in `head` whatever becomes of the rest, also when std::bad_alloc leaves.
+// Answers nothing, without an error, when the file ends within the head.
+std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::path& path,
+                                                        std::span<std::uint8_t>& head,
+                                                        std::error_code& error);
+
 // Puts a file with this content at `path`, in place of the regular file that may be there: whoever
 // opens it finds the old content or the new, whole, also after a crash. The content goes to a
 // temporary file of random name in the same folder (".oxmv-<16 digits>.tmp"), which then takes the

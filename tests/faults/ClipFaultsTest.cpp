@@ -14,6 +14,7 @@
 
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/platform/WholeFile.h"
+#include "oxmv/store/LastRecord.h"
 #include "tests/faults/SystemCalls.h"
 #include "tests/support/FakeHost.h"
 #include "tests/support/Files.h"
@@ -231,6 +232,32 @@ TEST(ClipFault, FailureOfAnyCallWhileLoadingIsRemembered) {
     EXPECT_EQ(clip.loadErrorCode(), std::errc::io_error);
   }
   EXPECT_EQ(failures, 4u);  // open, fstat, and two reads, of which the second finds the end
+}
+
+// The head of the "last" file is read first, and stays.
+TEST(ClipFault, FailureBehindTheGuidOfTheLastFileKeepsTheGuid) {
+  const Database database;
+  const fs::path file = database.folder() / "last";
+  Bytes content(sizeof(myGUID), 9);
+  content.insert(content.end(), oldContent.begin(), oldContent.end());
+  putFile(file, content);
+  std::size_t zeros = 0;
+  std::size_t guids = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    std::error_code error;
+    armFault(nth, {.kind = Fault::Kind::fail, .error = EIO});
+    const LastRecord last = readLastRecord(file, error);
+    disarmFault();
+    if (faultyFunction().empty()) break;
+    if (faultyFunction() == "close") continue;
+    EXPECT_EQ(error, std::errc::io_error);
+    EXPECT_EQ(last.stream, std::nullopt);
+    ++(last.guid.Data1 == 0 ? zeros : guids);
+    EXPECT_EQ(last.guidSize, last.guid.Data1 == 0 ? 0 : sizeof(myGUID));
+  }
+  EXPECT_EQ(zeros, 3u);  // open, fstat, and the read of the GUID
+  EXPECT_EQ(guids, 2u);  // the read of the rest, and that of the end
 }
 
 TEST(ClipFault, RemovalThatFailsIsTold) {

@@ -146,6 +146,57 @@ TEST(ReadFileStart, SaysWhyThereIsNothingToRead) {
   EXPECT_EQ(error, std::errc::is_a_directory);
 }
 
+TEST(ReadBehindHead, GivesHeadAndRest) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  Bytes buffer(3);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error = FileError::tooLarge;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), (Bytes{0, 0xFF}));
+  EXPECT_FALSE(error);
+  EXPECT_EQ(head.size(), 3u);
+  EXPECT_EQ(buffer, (Bytes{'n', 'e', 'w'}));
+  buffer.resize(5);
+  head = buffer;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), Bytes());
+  EXPECT_EQ(buffer, newContent);
+}
+
+TEST(ReadBehindHead, CutsAHeadThatIsNotWhole) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  Bytes buffer(6, 7);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_FALSE(error);
+  EXPECT_EQ(head.size(), 5u);
+  EXPECT_EQ(buffer, (Bytes{'n', 'e', 'w', 0, 0xFF, 7}));
+}
+
+TEST(ReadBehindHead, HasTheHeadOfAFileThatIsTooLarge) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  fs::resize_file(dir / "clip", maxFileSize + 1);  // sparse
+  Bytes buffer(5);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_EQ(head.size(), 5u);
+  EXPECT_EQ(buffer, newContent);
+}
+
+TEST(ReadBehindHead, HasNoHeadOfAFileThatIsNotThere) {
+  const TempDir dir;
+  Bytes buffer(5);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+  EXPECT_TRUE(head.empty());
+}
+
 TEST(WriteWholeFile, MakesANewFile) {
   const TempDir folder;
   const mode_t mask = ::umask(027);
