@@ -73,9 +73,9 @@ class MetadataDictionary {
     return initWithData(data, observer);
   }
 
-  // The initialisers below load a file. They never fail: without a file that can be read the object
-  // has no tags, and loadError() says why. Ask it before saving such an object: over a file that
-  // could not be read just now, saving would lose everything in it.
+  // The initialisers below load a file. They never fail: without a file that can be read, or memory
+  // for it, the object has no tags, and loadError() says why. Ask it before saving such an object:
+  // over a file that could not be read just now, saving would lose everything in it.
 
   // A combined object with the tags of the override file.
   static MetadataDictionary initFromOverride();
@@ -84,7 +84,8 @@ class MetadataDictionary {
   // GUID record in its stream replaces the GUID that the file begins with.
   static MetadataDictionary initFromLast();
 
-  // The GUID at the head of the "last" file; zero in every byte that is not there.
+  // The GUID at the head of the "last" file; zero in every byte that is not there. std::bad_alloc
+  // may leave it, as it may leave the paths below.
   static myGUID lastGUID();
 
   // A clip of the database: the combined object of that GUID.
@@ -121,7 +122,7 @@ class MetadataDictionary {
   //
   // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
   // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
-  // there still.
+  // there still, as it is when std::bad_alloc leaves for want of memory to make the path or to write.
   [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
 
   // The same for the override file, which is never removed: an object without tags leaves it empty.
@@ -195,7 +196,11 @@ class MetadataDictionary {
   std::size_t eye() const { return _eye; }
 
  private:
-  void load(const std::filesystem::path& path);
+  // Calls `read`, which loads a file by a path of its own making.
+  template <class Read>
+  void load(Read read);
+  template <class MakePath>
+  void loadStream(MakePath makePath);
   void setLoadError(std::error_code error);
 
   std::optional<Dictionary> _simpleTags;  // none until something is loaded or set

@@ -346,6 +346,49 @@ TEST_F(ClipFiles, WithoutMemoryNothingIsWrittenAndNothingSaid) {
   EXPECT_EQ(getFile(combined()), takeThree);
 }
 
+// Loads with memory for no allocation, for one and so on, until it is enough. What could not be
+// loaded says so; answers how often the GUID was there all the same.
+std::size_t guidsWithoutMemory(MetadataDictionary (*load)(), const myGUID& wanted) {
+  std::size_t guids = 0;
+  for (std::size_t granted = 0; granted < 1000; ++granted) {
+    std::optional<MetadataDictionary> object;
+    bool wasFelt = false;
+    {
+      const MemoryShortage shortage(granted);
+      object = load();
+      wasFelt = shortage.wasFelt();
+    }
+    if (!wasFelt) {
+      EXPECT_EQ(object->metadata(), three);
+      EXPECT_EQ(object->loadError(), LoadError::none);
+      return guids;
+    }
+    expectNoTags(*object, LoadError::unreadable);
+    EXPECT_EQ(object->loadErrorCode(), std::errc::not_enough_memory);
+    if (object->GUID() == wanted) ++guids;
+  }
+  ADD_FAILURE() << "never enough";
+  return 0;
+}
+
+TEST_F(ClipFiles, WithoutMemoryNoTagsAreLoaded) {
+  putFile(combined(), takeThree);
+  putFile(left(), takeThree);
+  putFile(overrideFile(), takeThree);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromGUID(guid); }, guid), 5u);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromGUIDForSingleEye(guid, 0); },
+                               guid),
+            5u);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromOverride(); }, {}), 5u);
+}
+
+TEST_F(ClipFiles, WithoutMemoryForItsStreamTheLastFileGivesItsGuid) {
+  Bytes content = imageOf(9);
+  content.insert(content.end(), takeThree.begin(), takeThree.end());
+  putFile(lastFile(), content);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromLast(); }, guidOf(9)), 0u);
+}
+
 // The override file.
 
 TEST_F(ClipFiles, OverrideObjectHasTheTagsOfTheOverrideFile) {
