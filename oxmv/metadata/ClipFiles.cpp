@@ -41,19 +41,20 @@ void MetadataDictionary::load(Read read) try {
 }
 
 template <class MakePath>
-void MetadataDictionary::loadStream(MakePath makePath) {
+void MetadataDictionary::loadStream(MakePath makePath, bool mayBeEmpty) {
   load([&] {
     std::error_code error;
     const auto content = readWholeFile(makePath(), error);
     if (!content) return setLoadError(error);
     initWithData(*content);
-    if (!content->empty() && content->size() < shortestData) loadError_ = LoadError::tooShort;
+    if (content->size() < shortestData && !(content->empty() && mayBeEmpty))
+      loadError_ = LoadError::tooShort;
   });
 }
 
 MetadataDictionary MetadataDictionary::initFromOverride() {
   MetadataDictionary object;
-  object.loadStream([&] { return overrideFilePath(object._appID); });
+  object.loadStream([&] { return overrideFilePath(object._appID); }, true);
   return object;
 }
 
@@ -85,7 +86,7 @@ MetadataDictionary MetadataDictionary::initFromGUIDForRightEye(const myGUID& gui
   if (rightEye) return initFromGUIDForSingleEye(guid, 1);
   MetadataDictionary object;
   object._guid = guid;
-  object.loadStream([&] { return object.fileURL(); });
+  object.loadStream([&] { return object.fileURL(); }, true);
   object._guid = guid;  // a GUID record in the file does not change which clip this is
   return object;
 }
@@ -94,7 +95,7 @@ MetadataDictionary MetadataDictionary::initFromGUIDForSingleEye(const myGUID& gu
                                                                 std::size_t eye) {
   MetadataDictionary object;
   object._guid = guid;
-  object.loadStream([&] { return object.fileURLS(eye); });
+  object.loadStream([&] { return object.fileURLS(eye); }, false);
   object._isSingle = true;
   object._eye = eye;
   // Kept on purpose: here a GUID record in the file does change which clip this is.

@@ -28,10 +28,11 @@ constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
 // Why an object that was to be loaded from a file has no tags.
 enum class LoadError {
-  none,        // it was loaded; a file of no bytes at all is a clip without tags
+  none,        // it was loaded; no bytes at all are what saving an object without tags leaves
   missing,     // there is no such file
   unreadable,  // the system's reason is in MetadataDictionary::loadErrorCode()
-  tooShort,    // 1 to 11 bytes hold no stream; a "last" file needs its GUID
+  tooShort,  // 1 to 11 bytes are not decoded; a "last" file needs its GUID; an eye's file has bytes,
+             // as saving one without tags removes it
 };
 
 // One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
@@ -200,7 +201,7 @@ class MetadataDictionary {
   template <class Read>
   void load(Read read);
   template <class MakePath>
-  void loadStream(MakePath makePath);
+  void loadStream(MakePath makePath, bool mayBeEmpty);
   void setLoadError(std::error_code error);
 
   std::optional<Dictionary> _simpleTags;  // none until something is loaded or set

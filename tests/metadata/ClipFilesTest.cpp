@@ -134,6 +134,17 @@ TEST_F(ClipFiles, FileOfNoBytesIsAClipWithoutTags) {
   expectNoTags(MetadataDictionary::initFromGUID(guid), LoadError::none);
 }
 
+TEST_F(ClipFiles, OverrideOfNoBytesIsOneWithoutTags) {
+  putFile(overrideFile(), {});
+  expectNoTags(MetadataDictionary::initFromOverride(), LoadError::none);
+}
+
+// Saving an eye without tags removes its file, so one of no bytes has lost them.
+TEST_F(ClipFiles, EyeFileOfNoBytesIsTooShort) {
+  putFile(left(), {});
+  expectNoTags(MetadataDictionary::initFromGUIDForSingleEye(guid, 0), LoadError::tooShort);
+}
+
 TEST_F(ClipFiles, LoadErrorEndsWhenTheObjectIsGivenTags) {
   auto clip = MetadataDictionary::initFromGUID(guid);
   EXPECT_EQ(clip.loadError(), LoadError::missing);
