@@ -11,6 +11,7 @@
 #include <string>
 #include <string_view>
 #include <system_error>
+#include <utility>
 #include <vector>
 
 #include "oxmv/metadata/StreamObserver.h"
@@ -31,8 +32,8 @@ enum class LoadError {
   none,        // it was loaded; no bytes at all are what saving an object without tags leaves
   missing,     // there is no such file
   unreadable,  // the system's reason is in MetadataDictionary::loadErrorCode()
-  tooShort,  // 1 to 11 bytes are not decoded; a "last" file needs its GUID; an eye's file has bytes,
-             // as saving one without tags removes it
+  tooShort,  // 1 to 11 bytes are not decoded; a "last" file needs its GUID, and an eye's file some
+             // bytes, for saving an eye without tags removes it
 };
 
 // One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
@@ -55,13 +56,14 @@ class MetadataDictionary {
   // table of labels, for all objects: the next translateTag() makes it anew. Kept on purpose, and
   // without effect on labels handed out.
   MetadataDictionary& init() &;
+  MetadataDictionary init() && { return std::move(init()); }
 
   // Takes the tags from a stream; see processBytes(). Everything else stays as it was.
   MetadataDictionary& initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
                                     StreamObserver* observer = nullptr) &;
   MetadataDictionary initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
                                    StreamObserver* observer = nullptr) && {
-    return initWithBytes(bytes, length, observer);
+    return std::move(initWithBytes(bytes, length, observer));
   }
 
   // The same for a whole stream. Fewer than 12 bytes, the shortest record with a value, change
@@ -71,7 +73,7 @@ class MetadataDictionary {
                                    StreamObserver* observer = nullptr) &;
   MetadataDictionary initWithData(std::span<const std::uint8_t> data,
                                   StreamObserver* observer = nullptr) && {
-    return initWithData(data, observer);
+    return std::move(initWithData(data, observer));
   }
 
   // The initialisers below load a file. They never fail: without a file that can be read, or memory
@@ -123,7 +125,8 @@ class MetadataDictionary {
   //
   // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
   // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
-  // there still, as it is when std::bad_alloc leaves for want of memory to make the path or to write.
+  // there still, as it is when std::bad_alloc leaves for want of memory to make the path or to write;
+  // but for the one case, named there, of a name that may not last.
   [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
 
   // The same for the override file, which is never removed: an object without tags leaves it empty.
