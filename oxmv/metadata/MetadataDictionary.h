@@ -27,13 +27,14 @@ class CameraTables;
 // The identifier under which the library's preferences are kept.
 constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
-// Why an object that was to be loaded from a file has no tags.
+// Why an object that was to be loaded from a file has no tags. A file of no bytes at all is what
+// saving an object without tags leaves, and is no failure; but an eye's file is removed then, so that
+// one of no bytes is too short.
 enum class LoadError {
-  none,        // it was loaded; no bytes at all are what saving an object without tags leaves
+  none,        // it was loaded
   missing,     // there is no such file
   unreadable,  // the system's reason is in MetadataDictionary::loadErrorCode()
-  tooShort,  // 1 to 11 bytes are not decoded; a "last" file needs its GUID, and an eye's file some
-             // bytes, for saving an eye without tags removes it
+  tooShort,    // 1 to 11 bytes are not decoded; a "last" file needs its GUID
 };
 
 // One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
