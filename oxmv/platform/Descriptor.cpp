@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cerrno>
 
+#include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -15,6 +16,25 @@ Descriptor::~Descriptor() {
 }
 
 bool Descriptor::close() { return ::close(std::exchange(number_, -1)) == 0; }
+
+Descriptor openToRead(const Descriptor* folder, const char* name) {
+  constexpr int flags = O_RDONLY | O_CLOEXEC | O_NOCTTY;
+  // Non-blocking, so that a pipe without a writer answers at once. It means nothing to a regular
+  // file, unless another process holds a lease on it: then the system asks for it back, and the file
+  // can be opened after a while.
+  const int at = folder == nullptr ? AT_FDCWD : folder->number();
+  const int number = ::openat(at, name, flags | O_NONBLOCK);
+  if (number >= 0 || errno != EWOULDBLOCK) return Descriptor(number);
+  struct stat status = {};
+  if (::fstatat(at, name, &status, 0) == 0 && !S_ISREG(status.st_mode)) {
+    errno = EWOULDBLOCK;
+    return Descriptor(-1);
+  }
+  for (;;) {
+    const int waited = ::openat(at, name, flags);
+    if (waited >= 0 || errno != EINTR) return Descriptor(waited);
+  }
+}
 
 std::error_code lastError() noexcept { return {errno, std::generic_category()}; }
 

@@ -31,6 +31,10 @@ class Descriptor {
   int number_;
 };
 
+// Opens a file for reading, whose name is one in `folder` or, if that is null, a path. A pipe without
+// a writer never makes this wait. Not open when that fails; see lastError().
+Descriptor openToRead(const Descriptor* folder, const char* name);
+
 // Of the system call that failed last.
 std::error_code lastError() noexcept;
 

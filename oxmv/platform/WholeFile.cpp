@@ -47,9 +47,7 @@ struct OpenFile {
 std::optional<OpenFile> openFile(const std::filesystem::path& path, std::error_code& error) {
   error = objectionTo(path);
   if (error) return std::nullopt;
-  // Non-blocking, so that a pipe without a writer answers at once; it means nothing to a regular
-  // file.
-  Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  Descriptor file = openToRead(nullptr, path.c_str());
   if (!file.isOpen()) return error = lastError(), std::nullopt;
   const auto size = regularSize(file, error);
   if (!size) return std::nullopt;

@@ -87,6 +87,18 @@ int open(const char* path, int flags, ...) {
   return pass("open", [&] { return next(path, flags, mode); });
 }
 
+int openat(int folder, const char* path, int flags, ...) {
+  static auto* const next = original<int(int, const char*, int, ...)>("openat");
+  mode_t mode = 0;
+  if ((flags & O_CREAT) != 0) {
+    va_list arguments;
+    va_start(arguments, flags);
+    mode = va_arg(arguments, mode_t);
+    va_end(arguments);
+  }
+  return pass("openat", [&] { return next(folder, path, flags, mode); });
+}
+
 int close(int file) {
   static auto* const next = original<int(int)>("close");
   return pass("close", [&] { return next(file); });

@@ -14,6 +14,7 @@
 #include "oxmv/platform/WholeFile.h"
 #include "tests/support/ChildProcess.h"
 #include "tests/support/Files.h"
+#include "tests/support/LeasedFile.h"
 #include "tests/support/Memory.h"
 #include "tests/support/TempDir.h"
 
@@ -78,6 +79,16 @@ TEST(ReadWholeFile, RefusesAPipeWithoutWaitingForIt) {
   EXPECT_FALSE(readWholeFile(folder / "pipe", error));
   EXPECT_EQ(error, FileError::notRegular);
   EXPECT_EQ(error.message(), "Not a regular file");
+}
+
+TEST(ReadWholeFile, WaitsForAFileThatAnotherProcessHasForItself) {
+  const TempDir folder;
+  test::putFile(folder / "clip", newContent);
+  const test::LeasedFile lease(folder / "clip");
+  if (!lease.isHeld()) GTEST_SKIP() << "no leases here";
+  std::error_code error;
+  EXPECT_EQ(readWholeFile(folder / "clip", error), newContent);
+  EXPECT_FALSE(error);
 }
 
 TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
