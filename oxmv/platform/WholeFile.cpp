@@ -133,7 +133,8 @@ bool syncFolder(const Descriptor& folder) {
 
 // Gives the new file the permissions, owner and group of the old one. An owner or group that cannot
 // be given leaves ours, without the bits that would let the file run as somebody else, and without
-// what another group was allowed.
+// what another group was allowed. Where the file system has no permissions to give, those that the
+// new file has will do, unless they allow more.
 bool takeOver(int file, const struct stat& old) {
   constexpr auto asItIs = static_cast<uid_t>(-1);
   mode_t mode = old.st_mode & 07777;
@@ -141,7 +142,13 @@ bool takeOver(int file, const struct stat& old) {
   const bool hasOwner = ::fchown(file, old.st_uid, asItIs) == 0;
   if (!hasGroup) mode &= ~static_cast<mode_t>(S_IRWXG);
   if (!hasGroup || !hasOwner) mode &= 0777;
-  return ::fchmod(file, mode) == 0;
+  if (::fchmod(file, mode) == 0) return true;
+  const int cause = errno;
+  if (cause != EPERM && cause != ENOTSUP) return false;
+  struct stat made = {};
+  if (::fstat(file, &made) != 0) return false;
+  errno = cause;
+  return (made.st_mode & 07777 & ~mode) == 0;
 }
 
 }  // namespace

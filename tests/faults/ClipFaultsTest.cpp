@@ -9,6 +9,7 @@
 #include <gtest/gtest.h>
 #include <sched.h>
 #include <sys/mount.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -232,6 +233,29 @@ TEST(ClipFault, FailureOfAnyCallWhileLoadingIsRemembered) {
     EXPECT_EQ(clip.loadErrorCode(), std::errc::io_error);
   }
   EXPECT_EQ(failures, 4u);  // open, fstat, and two reads, of which the second finds the end
+}
+
+// As where the file system has no permissions of its own.
+TEST(ClipFault, PermissionsThatCannotBeGivenAreDoneWithout) {
+  const Database database;
+  for (const int error : {EPERM, ENOTSUP, EIO}) {
+    for (const mode_t mode : {0666, 0600, 0400}) {
+      fs::remove(database.file());
+      putFile(database.file(), oldContent);
+      ASSERT_EQ(::chmod(database.file().c_str(), mode), 0);
+      const MetadataDictionary clip = newClip();
+      std::error_code cause;
+      armFault(1, {.kind = Fault::Kind::fail, .error = error, .function = "fchmod"});
+      const bool hasSaved = clip.writeToGUIDFile(&cause);
+      disarmFault();
+      ASSERT_EQ(faultyFunction(), "fchmod");
+      // The new file is the owner's to read and to write.
+      EXPECT_EQ(hasSaved, error != EIO && mode != 0400) << error << ' ' << mode;
+      EXPECT_EQ(getFile(database.file()), hasSaved ? newContent : oldContent);
+      if (!hasSaved) EXPECT_EQ(cause.value(), error);
+      EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
+    }
+  }
 }
 
 // The head of the "last" file is read first, and stays.

@@ -30,7 +30,7 @@ Function* original(const char* name) {
 // Makes a call, or what has been armed for it.
 template <class Call>
 auto pass(std::string_view name, Call call) -> decltype(call()) {
-  if (!isArmed) return call();
+  if (!isArmed || (!currentFault.function.empty() && currentFault.function != name)) return call();
   const bool isIt = ++calls == faultyCall;
   if (isIt) faulty = name;
   const bool isLater = currentFault.isLasting && faulty == name;

@@ -16,6 +16,7 @@ struct Fault {
   int error = 0;                   // for `fail`: errno
   bool isLasting = false;          // for `fail`: every later call of the same function fails, too
   std::function<void()> action{};  // for `meanwhile`: what somebody else does right before the call
+  std::string function{};          // unless empty, only calls of this function are counted
 };
 
 // Arms the n-th call from now on, counted from 1. With 0 none: the calls are counted only.
