@@ -206,6 +206,7 @@ bool hasContent(const std::filesystem::path& path, const std::optional<Content>&
 bool write(const std::filesystem::path& path, std::span<const std::uint8_t> content,
            const std::optional<Content>* old, std::error_code& error) {
   error = objectionTo(path);
+  if (!error && content.size() > maxFileSize) error = FileError::tooLarge;
   if (error) return false;
   const std::filesystem::path target = followLinks(path, error);
   if (error) return false;

@@ -13,7 +13,7 @@
 
 namespace oxmv {
 
-// The largest file that is read. Clips take kilobytes and the largest looks some megabytes; what is
+// The largest file that is read and written. Clips take kilobytes and the largest looks some megabytes; what is
 // larger is no file of ours, and must not fill the host's memory.
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 
@@ -50,7 +50,8 @@ std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::p
 // opens it finds the old content or the new, whole, also after a crash. The content goes to a
 // temporary file of random name in the same folder (".oxmv-<16 digits>.tmp"), which then takes the
 // place of the old one and has its permissions and, where the system allows, its owner. A symbolic
-// link is followed: the file it leads to is replaced. Folders are not made.
+// link is followed: the file it leads to is replaced. Folders are not made. Content of more than
+// maxFileSize, which could not be read again, is FileError::tooLarge.
 //
 // Answers false with the cause in `error` when that fails; then what was there is there still, and
 // nothing else. In one case the new file is there already: when the system fails to say that its name

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 
@@ -246,6 +247,27 @@ TEST(WriteWholeFile, WritesAnEmptyFile) {
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "clip", {}, error));
   EXPECT_EQ(fs::file_size(folder / "clip"), 0u);
+}
+
+TEST(WriteWholeFile, RefusesMoreThanCanBeReadAgain) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  // Pages that nobody looks at take no memory.
+  constexpr std::size_t size = maxFileSize + 1;
+  void* const pages =
+      ::mmap(nullptr, size, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0);
+  ASSERT_NE(pages, MAP_FAILED);
+  const std::span content(static_cast<const std::uint8_t*>(pages), size);
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "clip", content, error));
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_FALSE(replaceWholeFile(folder / "clip", oldContent, content, error));
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_FALSE(writeWholeFile(folder / "absent/clip", content, error));
+  EXPECT_EQ(error, FileError::tooLarge);  // before anything is touched
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
+  ::munmap(pages, size);
 }
 
 TEST(WriteWholeFile, FollowsSymbolicLinks) {
