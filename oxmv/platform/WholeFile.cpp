@@ -1,9 +1,11 @@
 #include "oxmv/platform/WholeFile.h"
 
-#include <algorithm>
+#include <array>
 #include <cerrno>
+#include <climits>
 #include <random>
 #include <string>
+#include <string_view>
 #include <utility>
 
 #include <fcntl.h>
@@ -80,14 +82,17 @@ bool writeAll(int file, std::span<const std::uint8_t> content) {
 // The file that a chain of symbolic links leads to, whether it is there or not.
 std::filesystem::path followLinks(std::filesystem::path path, std::error_code& error) {
   constexpr int mostLinks = 40;  // as many as Linux itself follows
-  for (int links = 0; links < mostLinks; ++links) {
-    std::error_code notALink;
-    const std::filesystem::path target = std::filesystem::read_symlink(path, notALink);
-    if (notALink) return path;
-    path = path.parent_path() / target;  // an absolute target stands alone
+  for (int links = 0;; ++links) {
+    std::array<char, PATH_MAX> target;
+    const ssize_t size = ::readlink(path.c_str(), target.data(), target.size());
+    const bool isLink = size >= 0;
+    if (!isLink && errno != EINVAL && errno != ENOENT) error = lastError();
+    if (isLink && links == mostLinks)
+      error = make_error_code(std::errc::too_many_symbolic_link_levels);
+    if (!isLink || error) return path;
+    // An absolute target stands alone.
+    path = path.parent_path() / std::string_view(target.data(), static_cast<std::size_t>(size));
   }
-  error = make_error_code(std::errc::too_many_symbolic_link_levels);
-  return path;
 }
 
 std::string temporaryName() {

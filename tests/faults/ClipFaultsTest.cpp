@@ -29,6 +29,7 @@ namespace fs = std::filesystem;
 
 constexpr myGUID guid = {1, 2, 3, {4, 5, 6, 7, 8, 9, 10, 11}};
 const std::string fileName = "00000001-0002-0003-0405-060708090A0B.colr";
+const std::string linkedName = "elsewhere";  // of a file that it may be a link to
 
 const Bytes oldContent = StreamBuilder().record("REEL", 'c', "A001\0\0\0\0").bytes();
 const Bytes newContent = {'R', 'E', 'E', 'L', 8,   0,   0, 'c', 'B', '0', '0', '2', 0, 0,
@@ -111,7 +112,7 @@ Ending saveWithFault(std::size_t nth, const Fault& fault) {
 std::size_t leftoversIn(const Database& database) {
   std::size_t count = 0;
   for (const std::string& name : namesIn(database.folder())) {
-    if (name == fileName) continue;
+    if (name == fileName || name == linkedName) continue;
     EXPECT_TRUE(isTemporary(name)) << name;
     ++count;
   }
@@ -124,26 +125,38 @@ void removeLeftovers(const Database& database) {
   }
 }
 
-class ClipFaults : public testing::TestWithParam<bool> {
+// What stands where a clip is saved.
+enum class Old { none, file, link };
+
+class ClipFaults : public testing::TestWithParam<Old> {
  protected:
-  // Whether there is a clip that is replaced, or none.
-  static bool hasOld() { return GetParam(); }
+  static bool hasOld() { return GetParam() != Old::none; }
 
   void putOld() const {
     fs::remove(database.file());
+    if (GetParam() == Old::link) fs::create_symlink(linkedName, database.file());
     if (hasOld()) putFile(database.file(), oldContent);
   }
   bool isOld() const {
     return hasOld() ? getFile(database.file()) == oldContent : !fs::exists(database.file());
   }
-  bool isNew() const { return getFile(database.file()) == newContent; }
+  bool isNew() const {
+    return getFile(database.file()) == newContent &&
+           fs::is_symlink(database.file()) == (GetParam() == Old::link);
+  }
 
   Database database;
 };
 
-INSTANTIATE_TEST_SUITE_P(Save, ClipFaults, testing::Bool(), [](const auto& whether) {
-  return whether.param ? "ReplacingAClip" : "OfANewClip";
-});
+INSTANTIATE_TEST_SUITE_P(Save, ClipFaults, testing::Values(Old::none, Old::file, Old::link),
+                         [](const auto& old) {
+                           switch (old.param) {
+                             case Old::none: return "OfANewClip";
+                             case Old::file: return "ReplacingAClip";
+                             case Old::link: return "ThroughALink";
+                           }
+                           return "";
+                         });
 
 TEST_P(ClipFaults, KilledAtAnyCallLeavesTheOldFileOrTheNew) {
   for (const auto kind : {Fault::Kind::killBefore, Fault::Kind::killAfter}) {

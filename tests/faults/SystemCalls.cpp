@@ -116,6 +116,11 @@ ssize_t write(int file, const void* buffer, size_t size) {
   return pass("write", [&] { return next(file, buffer, piece); });
 }
 
+ssize_t readlink(const char* path, char* target, size_t size) noexcept {
+  static auto* const next = original<ssize_t(const char*, char*, size_t)>("readlink");
+  return pass("readlink", [&] { return next(path, target, size); });
+}
+
 int fstat(int file, struct stat* status) noexcept {
   static auto* const next = original<int(int, struct stat*)>("fstat");
   return pass("fstat", [&] { return next(file, status); });

@@ -292,6 +292,21 @@ TEST(WriteWholeFile, MakesTheFileThatALinkLeadsTo) {
   EXPECT_EQ(test::getFile(folder / "target"), newContent);
 }
 
+TEST(WriteWholeFile, FollowsAsManyLinksAsTheSystemDoes) {
+  const TempDir folder;
+  test::putFile(folder / "0", oldContent);
+  for (int link = 1; link <= 41; ++link)
+    fs::create_symlink(std::to_string(link - 1), folder / std::to_string(link));
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "40", newContent, error));
+  EXPECT_EQ(readWholeFile(folder / "40", error), newContent);
+  EXPECT_FALSE(writeWholeFile(folder / "41", oldContent, error));
+  EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(readWholeFile(folder / "41", error), std::nullopt);
+  EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(test::getFile(folder / "0"), newContent);
+}
+
 TEST(WriteWholeFile, RefusesLinksThatLeadInACircle) {
   const TempDir folder;
   fs::create_symlink("b", folder / "a");
