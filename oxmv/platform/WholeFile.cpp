@@ -122,6 +122,10 @@ class TemporaryFile {
   bool isTemporary_ = true;
 };
 
+std::filesystem::path folderOf(const std::filesystem::path& path) {
+  return path.has_parent_path() ? path.parent_path() : ".";
+}
+
 // Opened to be synchronised. A folder that may be written but not read cannot be, and that is no
 // error.
 Descriptor openFolder(const std::filesystem::path& folder, std::error_code& error) {
@@ -130,7 +134,7 @@ Descriptor openFolder(const std::filesystem::path& folder, std::error_code& erro
   return descriptor;
 }
 
-// Brings the folder's own record of a new name to the disk. Some file systems cannot do this, and
+// Brings the folder's own record of its names to the disk. Some file systems cannot do this, and
 // need not.
 bool syncFolder(const Descriptor& folder) {
   return !folder.isOpen() || ::fsync(folder.number()) == 0 || errno == EINVAL || errno == ENOTSUP;
@@ -220,7 +224,7 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
   if (!isThere && errno != ENOENT) return error = lastError(), false;
   if (isThere && (error = objectionToKind(replaced))) return false;
 
-  const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
+  const std::filesystem::path folder = folderOf(target);
   // Now, so that nothing but the synchronisation itself can fail once the file has its name.
   const Descriptor openedFolder = openFolder(folder, error);
   if (error) return false;
@@ -255,7 +259,10 @@ bool replaceWholeFile(const std::filesystem::path& path, const std::optional<Con
 
 bool removeFile(const std::filesystem::path& path, std::error_code& error) {
   error = objectionTo(path);
-  if (!error && ::unlink(path.c_str()) != 0) error = lastError();
+  if (error) return false;
+  const Descriptor folder = openFolder(folderOf(path), error);
+  if (error) return false;
+  if (::unlink(path.c_str()) != 0 || !syncFolder(folder)) error = lastError();
   return !error;
 }
 

@@ -67,7 +67,8 @@ std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::p
                                     std::span<const std::uint8_t> content, std::error_code& error);
 
 // Removes the file, or the symbolic link, of that name; never a folder. Answers false with the cause
-// in `error` when that fails, also when there is none.
+// in `error` when that fails, also when there is none. In one case it is gone already: when the system
+// fails to say that this has reached the disk.
 [[nodiscard]] bool removeFile(const std::filesystem::path& path, std::error_code& error);
 
 }  // namespace oxmv
