@@ -3,12 +3,12 @@
 #include <array>
 #include <cerrno>
 #include <climits>
-#include <random>
 #include <string>
 #include <string_view>
 #include <utility>
 
 #include <fcntl.h>
+#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -95,10 +95,15 @@ std::filesystem::path followLinks(std::filesystem::path path, std::error_code& e
   }
 }
 
-std::string temporaryName() {
-  std::random_device random;
+std::string temporaryName(std::error_code& error) {
+  std::array<std::uint8_t, 16> random{};
+  ssize_t count = 0;
+  do {
+    count = ::getrandom(random.data(), random.size(), 0);
+  } while (count < 0 && errno == EINTR);
+  if (count < 0) error = lastError();  // else all of them: so few never come in parts
   std::string name = ".oxmv-";
-  for (int i = 0; i < 16; ++i) name += "0123456789abcdef"[random() & 0xF];
+  for (const std::uint8_t byte : random) name += "0123456789abcdef"[byte & 0xF];
   return name + ".tmp";
 }
 
@@ -228,7 +233,8 @@ bool write(const std::filesystem::path& path, std::span<const std::uint8_t> cont
   // Now, so that nothing but the synchronisation itself can fail once the file has its name.
   const Descriptor openedFolder = openFolder(folder, error);
   if (error) return false;
-  const std::filesystem::path temporary = folder / temporaryName();
+  const std::filesystem::path temporary = folder / temporaryName(error);
+  if (error) return false;
   // Readable by nobody else until it has the permissions of the file that it replaces.
   const mode_t mode = isThere ? 0600 : 0666;
   Descriptor file(::open(temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));

@@ -8,6 +8,7 @@
 
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -119,6 +120,11 @@ ssize_t write(int file, const void* buffer, size_t size) {
 ssize_t readlink(const char* path, char* target, size_t size) noexcept {
   static auto* const next = original<ssize_t(const char*, char*, size_t)>("readlink");
   return pass("readlink", [&] { return next(path, target, size); });
+}
+
+ssize_t getrandom(void* buffer, size_t size, unsigned flags) {
+  static auto* const next = original<ssize_t(void*, size_t, unsigned)>("getrandom");
+  return pass("getrandom", [&] { return next(buffer, size, flags); });
 }
 
 int fstat(int file, struct stat* status) noexcept {
