@@ -44,11 +44,17 @@ std::error_code objectionToKind(const struct stat& status) noexcept {
   return {};
 }
 
-std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error) {
+std::optional<struct stat> regularStatus(const Descriptor& file, std::error_code& error) {
   struct stat status = {};
   if (::fstat(file.number(), &status) != 0) return error = lastError(), std::nullopt;
   if ((error = objectionToKind(status))) return std::nullopt;
-  return static_cast<std::uintmax_t>(status.st_size);
+  return status;
+}
+
+std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error) {
+  const auto status = regularStatus(file, error);
+  if (!status) return std::nullopt;
+  return static_cast<std::uintmax_t>(status->st_size);
 }
 
 std::optional<std::size_t> readInto(std::span<std::uint8_t> content, const Descriptor& file,

@@ -42,8 +42,16 @@ std::error_code objectionTo(const std::filesystem::path& path) {
 
 struct OpenFile {
   Descriptor file;
-  std::uintmax_t size;
+  struct stat status;
+
+  std::uintmax_t size() const { return static_cast<std::uintmax_t>(status.st_size); }
 };
+
+// Whether nobody has written to the file meanwhile, as far as the system tells.
+bool isSame(const struct stat& before, const struct stat& after) {
+  return before.st_size == after.st_size && before.st_mtim.tv_sec == after.st_mtim.tv_sec &&
+         before.st_mtim.tv_nsec == after.st_mtim.tv_nsec;
+}
 
 // Opened for reading if it is a regular file; else nothing, with the cause in `error`.
 std::optional<OpenFile> openFile(const std::filesystem::path& path, std::error_code& error) {
@@ -51,16 +59,16 @@ std::optional<OpenFile> openFile(const std::filesystem::path& path, std::error_c
   if (error) return std::nullopt;
   Descriptor file = openToRead(nullptr, path.c_str());
   if (!file.isOpen()) return error = lastError(), std::nullopt;
-  const auto size = regularSize(file, error);
-  if (!size) return std::nullopt;
-  return OpenFile{std::move(file), *size};
+  const auto status = regularStatus(file, error);
+  if (!status) return std::nullopt;
+  return OpenFile{std::move(file), *status};
 }
 
 // The content from where the first `start` bytes have been read.
 std::optional<Content> contentBehind(std::size_t start, const OpenFile& open,
                                      std::error_code& error) {
-  if (open.size > maxFileSize) return error = FileError::tooLarge, std::nullopt;
-  const auto whole = static_cast<std::size_t>(open.size);
+  if (open.size() > maxFileSize) return error = FileError::tooLarge, std::nullopt;
+  const auto whole = static_cast<std::size_t>(open.size());
   // One more, to meet the end in one go.
   Content content((whole > start ? whole - start : 0) + 1);
   const auto size = readToEnd(content, 0, open.file, error);
@@ -174,9 +182,17 @@ std::error_code make_error_code(FileError error) noexcept {
 
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error) {
-  const auto open = openFile(path, error);
-  if (!open) return std::nullopt;
-  return contentBehind(0, *open, error);
+  for (int attempt = 0; attempt < 2; ++attempt) {
+    const auto open = openFile(path, error);
+    if (!open) return std::nullopt;
+    auto content = contentBehind(0, *open, error);
+    if (!content) return std::nullopt;
+    const auto after = regularStatus(open->file, error);
+    if (!after) return std::nullopt;
+    if (isSame(open->status, *after)) return content;
+  }
+  error = FileError::changed;
+  return std::nullopt;
 }
 
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,

@@ -22,13 +22,15 @@ constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 enum class FileError {
   notRegular = 1,  // a pipe, a device ... (a folder gives std::errc::is_a_directory)
   tooLarge,        // more than maxFileSize
-  changed,         // it is not any more what its reader found
+  changed,         // it is not any more what its reader found, or is not while it is read
 };
 std::error_code make_error_code(FileError error) noexcept;
 
 // The content of a regular file. Answers nothing, with the cause in `error`, when there is no such
 // file, it cannot be read to its end, is not a regular file (a pipe never makes this wait) or is
-// larger than maxFileSize. A read that fails is never taken for the end of the file.
+// larger than maxFileSize. A read that fails is never taken for the end of the file. A file that is
+// written to in its place meanwhile is read once more; if that goes on, it is FileError::changed, for
+// what has been read may be a mixture. (Those that writeWholeFile() replaces never are.)
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error);
 

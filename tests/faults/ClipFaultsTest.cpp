@@ -1,6 +1,7 @@
 // Clips in a file system that fails, and in a process that is killed.
 
 #include <cerrno>
+#include <chrono>
 #include <csignal>
 #include <filesystem>
 #include <string>
@@ -246,7 +247,8 @@ TEST(ClipFault, FailureOfAnyCallWhileLoadingIsRemembered) {
     EXPECT_EQ(clip.loadError(), LoadError::unreadable);
     EXPECT_EQ(clip.loadErrorCode(), std::errc::io_error);
   }
-  EXPECT_EQ(failures, 4u);  // open, fstat, and two reads, of which the second finds the end
+  // open, fstat, two reads, of which the second finds the end, and fstat again
+  EXPECT_EQ(failures, 5u);
 }
 
 // As where the file system has no permissions of its own.
@@ -414,7 +416,47 @@ TEST(ClipFault, FileReplacedWhileItIsReadIsOneOfTheTwoWhole) {
     EXPECT_EQ(getFile(database.file()), newContent);
   }
   EXPECT_EQ(replaced, 1u);  // before it was opened
-  EXPECT_EQ(old, 4u);
+  EXPECT_EQ(old, 5u);
+}
+
+// By one who does not put a new file in its place, as the library does, but writes into the old one.
+TEST(ClipFault, FileRewrittenWhileItIsReadIsReadOnceMore) {
+  const Database database;
+  // Of one length, and too long for one read.
+  const Bytes old(100, 'o');
+  const Bytes rewritten(100, 'r');
+  std::size_t count = 0;
+  for (std::size_t nth = 1;; ++nth) {
+    ASSERT_LT(nth, 100u);
+    putFile(database.file(), old);
+    // Long ago: a file system may tell times by the hundredth of a second.
+    fs::last_write_time(database.file(), fs::file_time_type::clock::now() - std::chrono::hours(1));
+    armFault(nth, {.kind = Fault::Kind::meanwhile,
+                   .action = [&] { putFile(database.file(), rewritten); }});
+    std::error_code error;
+    const auto content = readWholeFile(database.file(), error);
+    disarmFault();
+    if (faultyFunction().empty()) break;
+    ++count;
+    EXPECT_FALSE(error);
+    EXPECT_EQ(content, faultyFunction() == "close" ? old : rewritten) << nth;
+  }
+  EXPECT_EQ(count, 6u);
+}
+
+TEST(ClipFault, FileThatIsRewrittenAgainAndAgainIsNotRead) {
+  const Database database;
+  putFile(database.file(), oldContent);
+  std::size_t size = 50;
+  armFault(1, {.kind = Fault::Kind::meanwhile,
+               .isLasting = true,
+               .action = [&] { putFile(database.file(), Bytes(++size, 'r')); },
+               .function = "read"});
+  const auto clip = MetadataDictionary::initFromGUID(guid);
+  disarmFault();
+  EXPECT_EQ(clip.loadError(), LoadError::unreadable);
+  EXPECT_EQ(clip.loadErrorCode(), FileError::changed);
+  EXPECT_FALSE(clip.haveMetadata());
 }
 
 // Whoever says what the file held when it was read does not overwrite what came since.

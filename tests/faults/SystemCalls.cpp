@@ -42,7 +42,7 @@ auto pass(std::string_view name, Call call) -> decltype(call()) {
     return -1;
   }
   if (isIt && currentFault.kind == Fault::Kind::killBefore) ::raise(SIGKILL);
-  if (isIt && currentFault.kind == Fault::Kind::meanwhile) {
+  if ((isIt || isLater) && currentFault.kind == Fault::Kind::meanwhile) {
     isArmed = false;
     currentFault.action();
     isArmed = true;

@@ -13,8 +13,8 @@ namespace oxmv::test {
 struct Fault {
   enum class Kind { fail, killBefore, killAfter, meanwhile };
   Kind kind;
-  int error = 0;                   // for `fail`: errno
-  bool isLasting = false;          // for `fail`: every later call of the same function fails, too
+  int error = 0;           // for `fail`: errno
+  bool isLasting = false;  // for `fail`, `meanwhile`: so at every later call of that function
   std::function<void()> action{};  // for `meanwhile`: what somebody else does right before the call
   std::string function{};          // unless empty, only calls of this function are counted
 };
