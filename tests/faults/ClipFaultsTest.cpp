@@ -4,8 +4,10 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <system_error>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -19,6 +21,7 @@
 #include "oxmv/platform/WholeFile.h"
 #include "oxmv/store/LastRecord.h"
 #include "tests/faults/SystemCalls.h"
+#include "tests/support/ChildProcess.h"
 #include "tests/support/FakeHost.h"
 #include "tests/support/Files.h"
 #include "tests/support/StreamBuilder.h"
@@ -54,7 +57,7 @@ bool isTemporary(const std::string& name) {
 // A database in a folder of the test's own.
 class Database {
  public:
-  Database() { place(dir_.path()); }
+  Database() : dir_(std::in_place) { place(dir_->path()); }
   explicit Database(const fs::path& folder) { place(folder); }
 
   const fs::path& folder() const { return folder_; }
@@ -67,7 +70,7 @@ class Database {
     host_->preferences[std::string(preferencesAppID)]["LUTsPath"] = folder.string();
   }
 
-  TempDir dir_;
+  std::optional<TempDir> dir_;
   fs::path folder_;
   InstalledFakeHost host_;
 };
@@ -82,8 +85,7 @@ struct Ending {
 Ending saveWithFault(std::size_t nth, const Fault& fault) {
   int pipes[2] = {};
   EXPECT_EQ(::pipe(pipes), 0);
-  const pid_t child = ::fork();
-  if (child == 0) {
+  const pid_t child = startChild([&] {
     const MetadataDictionary clip = newClip();
     std::error_code error;
     armFault(nth, fault);
@@ -93,8 +95,8 @@ Ending saveWithFault(std::size_t nth, const Fault& fault) {
     const bool isTold = ::write(pipes[1], function.data(), function.size()) >= 0;
     // A failure has a reason.
     const bool isGood = isTold && (hasSaved || error);
-    ::_exit(!isGood ? 2 : hasSaved ? 0 : 1);
-  }
+    return !isGood ? 2 : hasSaved ? 0 : 1;
+  });
   ::close(pipes[1]);
   Ending ending;
   char buffer[32];
@@ -268,7 +270,7 @@ TEST(ClipFault, PermissionsThatCannotBeGivenAreDoneWithout) {
       // The new file is the owner's to read and to write.
       EXPECT_EQ(hasSaved, error != EIO && mode != 0400) << error << ' ' << mode;
       EXPECT_EQ(getFile(database.file()), hasSaved ? newContent : oldContent);
-      if (!hasSaved) EXPECT_EQ(cause.value(), error);
+      EXPECT_EQ(cause.value(), hasSaved ? 0 : error);
       EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
     }
   }
@@ -318,24 +320,38 @@ TEST(ClipFault, RemovalThatFailsIsTold) {
     if (function.empty()) break;
     functions.push_back(function);
     EXPECT_EQ(hasSaved, function == "close");
-    if (!hasSaved) EXPECT_EQ(error, std::errc::read_only_file_system);
+    EXPECT_EQ(error.value(), hasSaved ? 0 : EROFS);
     EXPECT_EQ(fs::exists(file), function == "open" || function == "unlink");
   }
   // The folder is synchronised, so that the file does not come back after a crash.
   EXPECT_EQ(functions, (std::vector<std::string>{"open", "unlink", "fsync", "close"}));
 }
 
-// A file system of a few kilobytes, in a process that has it for itself.
+// Puts a file system of a few kilobytes at `folder`, which only this process sees.
+bool mountSmallDisk(const fs::path& folder) {
+  const uid_t user = ::geteuid();
+  const gid_t group = ::getegid();
+  if (user == 0) {
+    if (::unshare(CLONE_NEWNS) != 0) return false;
+  } else {
+    // Root in a world of its own, where it owns the files that it makes.
+    if (::unshare(CLONE_NEWUSER | CLONE_NEWNS) != 0) return false;
+    putFile("/proc/self/setgroups", bytesOf("deny"));
+    putFile("/proc/self/uid_map", bytesOf("0 " + std::to_string(user) + " 1"));
+    putFile("/proc/self/gid_map", bytesOf("0 " + std::to_string(group) + " 1"));
+  }
+  if (::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+      ::mount("tmpfs", folder.c_str(), "tmpfs", 0, "size=16k") != 0)
+    return false;
+  std::error_code error;
+  return fs::create_directory(folder / "db", error);
+}
+
 TEST(ClipFault, FullDiskLeavesTheOldFile) {
   const TempDir dir;
-  const pid_t child = ::fork();
   constexpr int cannotMount = 77;
-  if (child == 0) {
-    const bool isOwn = ::geteuid() == 0 ? ::unshare(CLONE_NEWNS) == 0
-                                        : ::unshare(CLONE_NEWUSER | CLONE_NEWNS) == 0;
-    if (!isOwn || ::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
-        ::mount("tmpfs", dir.path().c_str(), "tmpfs", 0, "size=16k") != 0)
-      ::_exit(cannotMount);
+  const pid_t child = startChild([&] {
+    if (!mountSmallDisk(dir.path())) return cannotMount;
     const Database database(dir.path());
     putFile(database.file(), oldContent);
     const fs::path filler = dir / "filler";
@@ -347,45 +363,31 @@ TEST(ClipFault, FullDiskLeavesTheOldFile) {
                        namesIn(database.folder()) == std::set<std::string>{fileName};
     fs::remove(filler);
     const bool isGoodAgain = newClip().writeToGUIDFile() && getFile(database.file()) == newContent;
-    ::_exit(isFull && isOld && isGoodAgain ? 0 : 1);
-  }
-  int status = 0;
-  ASSERT_EQ(::waitpid(child, &status, 0), child);
-  ASSERT_TRUE(WIFEXITED(status));
-  if (WEXITSTATUS(status) == cannotMount) GTEST_SKIP() << "this process may not mount";
-  EXPECT_EQ(WEXITSTATUS(status), 0);
+    return isFull && isOld && isGoodAgain ? 0 : 1;
+  });
+  const int status = exitStatusOf(child);
+  if (status == cannotMount) GTEST_SKIP() << "this process may not mount";
+  EXPECT_EQ(status, 0);
 }
 
 // Several processes at once.
 
-template <class Body>
-pid_t inAProcess(Body body) {
-  const pid_t child = ::fork();
-  if (child == 0) ::_exit(body() ? 0 : 1);
-  return child;
-}
-
-bool endsWell(pid_t child) {
-  int status = 1;
-  return ::waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
-}
-
-bool saveOften(const Value& reel, int count) {
+int saveOften(const Value& reel, int count) {
   auto clip = MetadataDictionary::initFromGUID(guid);
   clip.setMetadata(Dictionary{{"REEL", reel}});
   for (int i = 0; i < count; ++i) {
-    if (!clip.writeToGUIDFile()) return false;
+    if (!clip.writeToGUIDFile()) return 1;
   }
-  return true;
+  return 0;
 }
 
 TEST(ClipFault, ReadersSeeOneOfTwoWritersWhole) {
   const Database database;
   // Of different sizes: a file that is replaced while it is read must not come out as a mixture.
   const std::string longReel(200, 'L');
-  ASSERT_TRUE(saveOften("short", 1));
-  const pid_t one = inAProcess([&] { return saveOften("short", 300); });
-  const pid_t other = inAProcess([&] { return saveOften(longReel, 300); });
+  ASSERT_EQ(saveOften("short", 1), 0);
+  const pid_t one = startChild([&] { return saveOften("short", 300); });
+  const pid_t other = startChild([&] { return saveOften(longReel, 300); });
   int wrong = 0;
   for (int i = 0; i < 3000; ++i) {
     const auto clip = MetadataDictionary::initFromGUID(guid);
@@ -393,8 +395,8 @@ TEST(ClipFault, ReadersSeeOneOfTwoWritersWhole) {
     if (clip.loadError() != LoadError::none || (reel != "short" && reel != longReel)) ++wrong;
   }
   EXPECT_EQ(wrong, 0);
-  EXPECT_TRUE(endsWell(one));
-  EXPECT_TRUE(endsWell(other));
+  EXPECT_EQ(exitStatusOf(one), 0);
+  EXPECT_EQ(exitStatusOf(other), 0);
   EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
 }
 

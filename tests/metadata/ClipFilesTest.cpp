@@ -331,14 +331,15 @@ TEST_F(ClipFiles, SavingOverAFolderFails) {
 TEST_F(ClipFiles, SavingWithoutPermissionFailsAndLeavesTheFile) {
   putFile(combined(), takeThree);
   fs::permissions(database().parent_path(), fs::perms::all);
-  fs::permissions(database(),
-                  fs::perms::owner_all | fs::perms::others_read | fs::perms::others_exec);
+  fs::permissions(database(), fs::perms::owner_read | fs::perms::owner_exec |
+                                  fs::perms::others_read | fs::perms::others_exec);
   EXPECT_TRUE(asOrdinaryUser([] {
     auto clip = MetadataDictionary::initFromGUID(guid);
     clip.removeObject("TAKE");
     std::error_code error;
     return !clip.writeToGUIDFile(&error) && error == std::errc::permission_denied;
   }));
+  fs::permissions(database(), fs::perms::owner_all);
   EXPECT_EQ(getFile(combined()), takeThree);
 }
 
