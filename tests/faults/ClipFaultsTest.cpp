@@ -10,6 +10,7 @@
 #include <utility>
 #include <vector>
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sched.h>
 #include <sys/mount.h>
@@ -276,6 +277,57 @@ TEST(ClipFault, PermissionsThatCannotBeGivenAreDoneWithout) {
   }
 }
 
+TEST(ClipFault, ReplacingAClipTakesTheseCallsInThisOrder) {
+  const Database database;
+  putFile(database.file(), oldContent);
+  ASSERT_EQ(::chmod(database.file().c_str(), 0640), 0);
+  const MetadataDictionary clip = newClip();
+  armFault(0, {});
+  const bool hasSaved = clip.writeToGUIDFile();
+  disarmFault();
+  EXPECT_TRUE(hasSaved);
+  std::vector<SystemCall> expected = {
+      {.function = "readlink"},
+      {.function = "lstat"},
+      {.function = "open", .flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC},
+      {.function = "getrandom"},
+      {.function = "open", .flags = O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, .mode = 0600}};
+  expected.insert(expected.end(), (newContent.size() + 2) / 3, {.function = "write"});
+  for (const SystemCall& call :
+       std::vector<SystemCall>{{.function = "fchown"},  // the group, then the owner
+                               {.function = "fchown"},
+                               {.function = "fchmod", .mode = 0640},
+                               {.function = "fsync"},
+                               {.function = "close"},
+                               {.function = "rename"},
+                               {.function = "fsync"},  // the folder
+                               {.function = "close"}})
+    expected.push_back(call);
+  const auto namesOf = [](const std::vector<SystemCall>& calls) {
+    std::string names;
+    for (const SystemCall& call : calls) names += call.function + ' ';
+    return names;
+  };
+  EXPECT_EQ(namesOf(systemCalls()), namesOf(expected));
+  EXPECT_TRUE(systemCalls() == expected);
+}
+
+TEST(ClipFault, FolderThatCannotBeSynchronisedIsDoneWithout) {
+  const Database database;
+  for (const int error : {EINVAL, ENOTSUP, EIO}) {
+    putFile(database.file(), oldContent);
+    const MetadataDictionary clip = newClip();
+    std::error_code cause;
+    armFault(2, {.kind = Fault::Kind::fail, .error = error, .function = "fsync"});
+    const bool hasSaved = clip.writeToGUIDFile(&cause);
+    disarmFault();
+    EXPECT_EQ(faultyFunction(), "fsync");
+    EXPECT_EQ(hasSaved, error != EIO);
+    EXPECT_EQ(cause.value(), hasSaved ? 0 : EIO);
+    EXPECT_EQ(getFile(database.file()), newContent);
+  }
+}
+
 // The head of the "last" file is read first, and stays.
 TEST(ClipFault, FailureBehindTheGuidOfTheLastFileKeepsTheGuid) {
   const Database database;
@@ -449,10 +501,14 @@ TEST(ClipFault, FileRewrittenWhileItIsReadIsReadOnceMore) {
 TEST(ClipFault, FileThatIsRewrittenAgainAndAgainIsNotRead) {
   const Database database;
   putFile(database.file(), oldContent);
-  std::size_t size = 50;
+  auto time = fs::file_time_type::clock::now();
   armFault(1, {.kind = Fault::Kind::meanwhile,
                .isLasting = true,
-               .action = [&] { putFile(database.file(), Bytes(++size, 'r')); },
+               .action =
+                   [&] {
+                     putFile(database.file(), newContent);
+                     fs::last_write_time(database.file(), time += std::chrono::seconds(1));
+                   },
                .function = "read"});
   const auto clip = MetadataDictionary::initFromGUID(guid);
   disarmFault();

@@ -21,6 +21,7 @@ std::size_t calls = 0;
 std::size_t faultyCall = 0;
 Fault currentFault{};
 std::string_view faulty;
+std::vector<SystemCall> made;
 
 // The function of that name in the C library.
 template <class Function>
@@ -30,7 +31,8 @@ Function* original(const char* name) {
 
 // Makes a call, or what has been armed for it.
 template <class Call>
-auto pass(std::string_view name, Call call) -> decltype(call()) {
+auto pass(std::string_view name, Call call, int flags = 0, mode_t mode = 0) -> decltype(call()) {
+  if (isArmed) made.push_back({std::string(name), flags, mode});
   if (!isArmed || (!currentFault.function.empty() && currentFault.function != name)) return call();
   const bool isIt = ++calls == faultyCall;
   if (isIt) faulty = name;
@@ -59,6 +61,7 @@ void armFault(std::size_t nth, const Fault& fault) {
   faultyCall = nth;
   currentFault = fault;
   faulty = {};
+  made.clear();
   isArmed = true;
 }
 
@@ -66,6 +69,8 @@ std::size_t disarmFault() {
   isArmed = false;
   return calls;
 }
+
+std::vector<SystemCall> systemCalls() { return made; }
 
 std::string faultyFunction() { return std::string(faulty); }
 
@@ -85,7 +90,8 @@ int open(const char* path, int flags, ...) {
     mode = va_arg(arguments, mode_t);
     va_end(arguments);
   }
-  return pass("open", [&] { return next(path, flags, mode); });
+  return pass(
+      "open", [&] { return next(path, flags, mode); }, flags, mode);
 }
 
 int openat(int folder, const char* path, int flags, ...) {
@@ -97,7 +103,8 @@ int openat(int folder, const char* path, int flags, ...) {
     mode = va_arg(arguments, mode_t);
     va_end(arguments);
   }
-  return pass("openat", [&] { return next(folder, path, flags, mode); });
+  return pass(
+      "openat", [&] { return next(folder, path, flags, mode); }, flags, mode);
 }
 
 int close(int file) {
@@ -144,7 +151,8 @@ int fchown(int file, uid_t owner, gid_t group) noexcept {
 
 int fchmod(int file, mode_t mode) noexcept {
   static auto* const next = original<int(int, mode_t)>("fchmod");
-  return pass("fchmod", [&] { return next(file, mode); });
+  return pass(
+      "fchmod", [&] { return next(file, mode); }, 0, mode);
 }
 
 int fsync(int file) {

@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace oxmv::test {
 
@@ -21,6 +22,18 @@ struct Fault {
 
 // Arms the n-th call from now on, counted from 1. With 0 none: the calls are counted only.
 void armFault(std::size_t nth, const Fault& fault);
+
+// A call as it was made.
+struct SystemCall {
+  std::string function;
+  int flags = 0;      // of open
+  unsigned mode = 0;  // of open and fchmod
+
+  bool operator==(const SystemCall&) const = default;
+};
+
+// The calls since the last fault was armed, also those that were not counted.
+std::vector<SystemCall> systemCalls();
 
 // How many calls there were since then; and the function of the faulty one, empty if it was not
 // reached. Nothing is armed and counted any more.

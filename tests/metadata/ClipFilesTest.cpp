@@ -443,6 +443,38 @@ TEST_F(ClipFiles, KeepsAnEmptyOverrideFile) {
   EXPECT_EQ(fs::file_size(overrideFile()), 0u);
 }
 
+// Of every allocation. The path is made before the tags are encoded, and want of memory for those is
+// not told.
+TEST_F(ClipFiles, OverrideWithoutMemoryStaysAndNothingIsSaid) {
+  putFile(overrideFile(), takeThree);
+  MetadataDictionary clip;
+  clip.setMetadata(Dictionary{{"REEL", "A001"}});
+  std::size_t refusals = 0;
+  for (std::size_t granted = 0;; ++granted) {
+    ASSERT_LT(granted, 1000u);
+    host->questions.clear();
+    std::error_code error = FileError::tooLarge;
+    bool isWritten = false;
+    bool isThrown = false;
+    {
+      const MemoryShortage shortage(granted);
+      try {
+        isWritten = clip.writeToOverride(&error);
+      } catch (const std::bad_alloc&) {
+        isThrown = true;
+      }
+    }
+    EXPECT_EQ(error, FileError::tooLarge);
+    if (isWritten) break;
+    EXPECT_EQ(getFile(overrideFile()), takeThree);
+    if (isThrown) continue;
+    ++refusals;
+    EXPECT_EQ(host->questions, std::vector<std::string>{"get OverridePath"});
+  }
+  EXPECT_GT(refusals, 0u);
+  EXPECT_NE(getFile(overrideFile()), takeThree);
+}
+
 TEST_F(ClipFiles, OverrideWithoutAFolderFails) {
   fs::remove(overrideFile().parent_path());
   std::error_code error;

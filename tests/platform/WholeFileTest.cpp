@@ -1,3 +1,4 @@
+#include <algorithm>
 #include <csignal>
 #include <cstdio>
 #include <filesystem>
@@ -90,6 +91,17 @@ TEST(ReadWholeFile, WaitsForAFileThatAnotherProcessHasForItself) {
   std::error_code error;
   EXPECT_EQ(readWholeFile(folder / "clip", error), newContent);
   EXPECT_FALSE(error);
+}
+
+TEST(ReadWholeFile, ReadsAsMuchAsTheLimit) {
+  const TempDir folder;
+  test::putFile(folder / "large", newContent);
+  fs::resize_file(folder / "large", maxFileSize);  // sparse
+  std::error_code error;
+  const auto content = readWholeFile(folder / "large", error);
+  ASSERT_TRUE(content);
+  EXPECT_EQ(content->size(), maxFileSize);
+  EXPECT_TRUE(std::equal(newContent.begin(), newContent.end(), content->begin()));
 }
 
 TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
@@ -229,6 +241,45 @@ TEST(WriteWholeFile, ReplacesAFileAndKeepsItsPermissions) {
   EXPECT_TRUE(writeWholeFile(folder / "clip", newContent, error));
   EXPECT_EQ(test::getFile(folder / "clip"), newContent);
   EXPECT_EQ(modeOf(folder / "clip"), 0604u);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
+}
+
+TEST(WriteWholeFile, KeepsTheOwnerWhereTheSystemAllows) {
+  if (::geteuid() != 0) GTEST_SKIP() << "files can be given to others by root only";
+  const TempDir folder;
+  const fs::path clip = folder / "clip";
+  test::putFile(clip, oldContent);
+  ASSERT_EQ(::chown(clip.c_str(), 1234, 4321), 0);
+  ASSERT_EQ(::chmod(clip.c_str(), 06775), 0);  // after the owner: that takes such bits away
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(clip, newContent, error));
+  struct stat status = {};
+  ASSERT_EQ(::stat(clip.c_str(), &status), 0);
+  EXPECT_EQ(status.st_uid, 1234u);
+  EXPECT_EQ(status.st_gid, 4321u);
+  EXPECT_EQ(modeOf(clip), 06775u);
+
+  // Somebody who may not give it away lets nobody run it as himself, nor his group use it.
+  fs::permissions(folder.path(), fs::perms::all);
+  EXPECT_TRUE(asOrdinaryUser([&] { return writeWholeFile(clip, oldContent, error); }));
+  ASSERT_EQ(::stat(clip.c_str(), &status), 0);
+  EXPECT_EQ(status.st_uid, 65534u);
+  EXPECT_EQ(status.st_gid, 65534u);
+  EXPECT_EQ(modeOf(clip), 0705u);
+}
+
+TEST(WriteWholeFile, NeedsNotReadTheFolder) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  fs::permissions(folder / "clip", fs::perms::owner_read | fs::perms::others_read);
+  fs::permissions(folder.path(), fs::perms::owner_write | fs::perms::owner_exec |
+                                     fs::perms::others_write | fs::perms::others_exec);
+  EXPECT_TRUE(asOrdinaryUser([&] {
+    std::error_code error;
+    return writeWholeFile(folder / "clip", newContent, error);
+  }));
+  fs::permissions(folder.path(), fs::perms::owner_all);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
   EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
