@@ -126,8 +126,8 @@ class MetadataDictionary {
   //
   // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
   // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
-  // there still, as it is when std::bad_alloc leaves for want of memory to make the path or to write;
-  // but for the one case, named there, of a name that may not last.
+  // there still, but for the one case that writeWholeFile() and removeFile() name. std::bad_alloc may
+  // leave, for want of memory to make the path or to write, and leaves the old file, too.
   [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
 
   // The same for the override file, which is never removed: an object without tags leaves it empty.
