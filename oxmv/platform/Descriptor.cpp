@@ -19,10 +19,10 @@ bool Descriptor::close() { return ::close(std::exchange(number_, -1)) == 0; }
 
 Descriptor openToRead(const Descriptor* folder, const char* name) {
   constexpr int flags = O_RDONLY | O_CLOEXEC | O_NOCTTY;
+  const int at = folder == nullptr ? AT_FDCWD : folder->number();
   // Non-blocking, so that a pipe without a writer answers at once. It means nothing to a regular
   // file, unless another process holds a lease on it: then the system asks for it back, and the file
   // can be opened after a while.
-  const int at = folder == nullptr ? AT_FDCWD : folder->number();
   const int number = ::openat(at, name, flags | O_NONBLOCK);
   if (number >= 0 || errno != EWOULDBLOCK) return Descriptor(number);
   struct stat status = {};

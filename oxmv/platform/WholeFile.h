@@ -13,8 +13,8 @@
 
 namespace oxmv {
 
-// The largest file that is read and written. Clips take kilobytes and the largest looks some megabytes; what is
-// larger is no file of ours, and must not fill the host's memory.
+// The largest file that is read or written. Clips take kilobytes and the largest looks some megabytes;
+// what is larger is no file of ours, and must not fill the host's memory.
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 
 // Why a file is none of ours to read or replace. Everything else comes as the
