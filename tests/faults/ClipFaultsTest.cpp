@@ -258,7 +258,7 @@ TEST(ClipFault, FailureOfAnyCallWhileLoadingIsRemembered) {
 TEST(ClipFault, PermissionsThatCannotBeGivenAreDoneWithout) {
   const Database database;
   for (const int error : {EPERM, ENOTSUP, EIO}) {
-    for (const mode_t mode : {0666, 0600, 0400}) {
+    for (const mode_t mode : {0666u, 0600u, 0400u}) {
       fs::remove(database.file());
       putFile(database.file(), oldContent);
       ASSERT_EQ(::chmod(database.file().c_str(), mode), 0);
@@ -269,7 +269,7 @@ TEST(ClipFault, PermissionsThatCannotBeGivenAreDoneWithout) {
       disarmFault();
       ASSERT_EQ(faultyFunction(), "fchmod");
       // The new file is the owner's to read and to write.
-      EXPECT_EQ(hasSaved, error != EIO && mode != 0400) << error << ' ' << mode;
+      EXPECT_EQ(hasSaved, error != EIO && mode != 0400u) << error << ' ' << mode;
       EXPECT_EQ(getFile(database.file()), hasSaved ? newContent : oldContent);
       EXPECT_EQ(cause.value(), hasSaved ? 0 : error);
       EXPECT_EQ(namesIn(database.folder()), std::set<std::string>{fileName});
