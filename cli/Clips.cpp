@@ -50,13 +50,12 @@ Decoded decode(const ClipName& name, const ClipStream& stream) {
 
 std::variant<ClipStream, FileProblem> readLast(const ClipName& name) {
   std::error_code error;
-  const LastRecord last = readLastRecord(name.path, error);
+  LastRecord last = readLastRecord(name.path, error);
   if (error) return problemOf(error);
-  const auto stream = last.stream();
-  if (!stream)
+  if (!last.stream)
     return FileProblem{"too-short", fmt::format("{} are too few for the GUID that it begins with",
-                                                counted(last.content.size(), "byte"))};
-  return ClipStream{{stream->begin(), stream->end()}, last.guid, sizeof(myGUID)};
+                                                counted(last.guidSize, "byte"))};
+  return ClipStream{*std::move(last.stream), last.guid, sizeof(myGUID)};
 }
 
 }  // namespace

@@ -11,7 +11,7 @@ int main() {
     std::cerr << clip.fileURL().string() << ": not loaded\n";
     return 1;
   }
-  clip.addObject(oxmv::Array::of(1.0f, 1.25f, 1.0f, 1.5f), "WBAL");
+  if (!clip.addObject(oxmv::Array::of(1.0f, 1.25f, 1.0f, 1.5f), "WBAL")) return 1;
   std::error_code error;
   if (!clip.writeToGUIDFile(&error)) {
     std::cerr << clip.fileURL().string() << ": not saved: " << error.message() << '\n';

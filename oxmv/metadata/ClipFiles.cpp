@@ -1,5 +1,7 @@
 // What MetadataDictionary has to do with files.
 
+#include <new>
+
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/platform/WholeFile.h"
@@ -29,33 +31,48 @@ void MetadataDictionary::setLoadError(std::error_code error) {
   loadErrorCode_ = error;
 }
 
-void MetadataDictionary::load(const std::filesystem::path& path) {
-  std::error_code error;
-  const auto content = readWholeFile(path, error);
-  if (!content) return setLoadError(error);
-  initWithData(*content);
-  if (!content->empty() && content->size() < shortestData) loadError_ = LoadError::tooShort;
+// Those who load are never told of a failure, so want of memory is one more reason for no tags.
+template <class Read>
+void MetadataDictionary::load(Read read) try {
+  read();
+} catch (const std::bad_alloc&) {
+  _simpleTags.reset();
+  setLoadError(make_error_code(std::errc::not_enough_memory));
+}
+
+template <class MakePath>
+void MetadataDictionary::loadStream(MakePath makePath, bool mayBeEmpty) {
+  load([&] {
+    std::error_code error;
+    const auto content = readWholeFile(makePath(), error);
+    if (!content) return setLoadError(error);
+    initWithData(*content);
+    if (content->size() < shortestData && !(content->empty() && mayBeEmpty))
+      loadError_ = LoadError::tooShort;
+  });
 }
 
 MetadataDictionary MetadataDictionary::initFromOverride() {
   MetadataDictionary object;
-  object.load(overrideFilePath(object._appID));
+  object.loadStream([&] { return overrideFilePath(object._appID); }, true);
   return object;
 }
 
 MetadataDictionary MetadataDictionary::initFromLast() {
   MetadataDictionary object;
-  std::error_code error;
-  const LastRecord last = readLastRecord(lastFilePath(object._appID), error);
-  object._guid = last.guid;
-  if (error) {
-    object.setLoadError(error);
-  } else if (const auto stream = last.stream()) {
-    // maxFileSize is far below what the length can say.
-    object.initWithBytes(*stream, static_cast<std::int32_t>(stream->size()));
-  } else {
-    object.loadError_ = LoadError::tooShort;
-  }
+  object.load([&] {
+    std::error_code error;
+    const LastRecord last = readLastRecord(lastFilePath(object._appID), error);
+    object._guid = last.guid;
+    if (error) {
+      object.setLoadError(error);
+    } else if (last.stream) {
+      // maxFileSize is far below what the length can say.
+      object.initWithBytes(*last.stream, static_cast<std::int32_t>(last.stream->size()));
+    } else {
+      object.loadError_ = LoadError::tooShort;
+    }
+  });
   return object;
 }
 
@@ -69,7 +86,7 @@ MetadataDictionary MetadataDictionary::initFromGUIDForRightEye(const myGUID& gui
   if (rightEye) return initFromGUIDForSingleEye(guid, 1);
   MetadataDictionary object;
   object._guid = guid;
-  object.load(object.fileURL());
+  object.loadStream([&] { return object.fileURL(); }, true);
   object._guid = guid;  // a GUID record in the file does not change which clip this is
   return object;
 }
@@ -78,7 +95,7 @@ MetadataDictionary MetadataDictionary::initFromGUIDForSingleEye(const myGUID& gu
                                                                 std::size_t eye) {
   MetadataDictionary object;
   object._guid = guid;
-  object.load(object.fileURLS(eye));
+  object.loadStream([&] { return object.fileURLS(eye); }, false);
   object._isSingle = true;
   object._eye = eye;
   // Kept on purpose: here a GUID record in the file does change which clip this is.

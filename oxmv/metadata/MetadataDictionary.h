@@ -11,6 +11,7 @@
 #include <string>
 #include <string_view>
 #include <system_error>
+#include <utility>
 #include <vector>
 
 #include "oxmv/metadata/StreamObserver.h"
@@ -26,12 +27,14 @@ class CameraTables;
 // The identifier under which the library's preferences are kept.
 constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
-// Why an object that was to be loaded from a file has no tags.
+// Why an object that was to be loaded from a file has no tags. A file of no bytes at all is what
+// saving an object without tags leaves, and is no failure; but an eye's file is removed then, so that
+// one of no bytes is too short.
 enum class LoadError {
-  none,        // it was loaded; a file of no bytes at all is a clip without tags
+  none,        // it was loaded
   missing,     // there is no such file
   unreadable,  // the system's reason is in MetadataDictionary::loadErrorCode()
-  tooShort,    // 1 to 11 bytes hold no stream; a "last" file needs its GUID
+  tooShort,    // 1 to 11 bytes are not decoded; a "last" file needs its GUID
 };
 
 // One clip's metadata as a dictionary keyed by four-character tags, the clip's GUID and, for a
@@ -54,13 +57,14 @@ class MetadataDictionary {
   // table of labels, for all objects: the next translateTag() makes it anew. Kept on purpose, and
   // without effect on labels handed out.
   MetadataDictionary& init() &;
+  MetadataDictionary init() && { return std::move(init()); }
 
   // Takes the tags from a stream; see processBytes(). Everything else stays as it was.
   MetadataDictionary& initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
                                     StreamObserver* observer = nullptr) &;
   MetadataDictionary initWithBytes(std::span<const std::uint8_t> bytes, std::int32_t length,
                                    StreamObserver* observer = nullptr) && {
-    return initWithBytes(bytes, length, observer);
+    return std::move(initWithBytes(bytes, length, observer));
   }
 
   // The same for a whole stream. Fewer than 12 bytes, the shortest record with a value, change
@@ -70,12 +74,12 @@ class MetadataDictionary {
                                    StreamObserver* observer = nullptr) &;
   MetadataDictionary initWithData(std::span<const std::uint8_t> data,
                                   StreamObserver* observer = nullptr) && {
-    return initWithData(data, observer);
+    return std::move(initWithData(data, observer));
   }
 
-  // The initialisers below load a file. They never fail: without a file that can be read the object
-  // has no tags, and loadError() says why. Ask it before saving such an object: over a file that
-  // could not be read just now, saving would lose everything in it.
+  // The initialisers below load a file. They never fail: without a file that can be read, or memory
+  // for it, the object has no tags, and loadError() says why. Ask it before saving such an object:
+  // over a file that could not be read just now, saving would lose everything in it.
 
   // A combined object with the tags of the override file.
   static MetadataDictionary initFromOverride();
@@ -84,7 +88,8 @@ class MetadataDictionary {
   // GUID record in its stream replaces the GUID that the file begins with.
   static MetadataDictionary initFromLast();
 
-  // The GUID at the head of the "last" file; zero in every byte that is not there.
+  // The GUID at the head of the "last" file; zero in every byte that is not there. std::bad_alloc
+  // may leave it, as it may leave the paths below.
   static myGUID lastGUID();
 
   // A clip of the database: the combined object of that GUID.
@@ -121,7 +126,8 @@ class MetadataDictionary {
   //
   // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
   // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
-  // there still.
+  // there still, but for the one case that writeWholeFile() and removeFile() name. std::bad_alloc may
+  // leave, for want of memory to make the path or to write, and leaves the old file, too.
   [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
 
   // The same for the override file, which is never removed: an object without tags leaves it empty.
@@ -195,7 +201,11 @@ class MetadataDictionary {
   std::size_t eye() const { return _eye; }
 
  private:
-  void load(const std::filesystem::path& path);
+  // Calls `read`, which loads a file by a path of its own making.
+  template <class Read>
+  void load(Read read);
+  template <class MakePath>
+  void loadStream(MakePath makePath, bool mayBeEmpty);
   void setLoadError(std::error_code error);
 
   std::optional<Dictionary> _simpleTags;  // none until something is loaded or set

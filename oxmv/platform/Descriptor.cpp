@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cerrno>
 
+#include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -16,6 +17,25 @@ Descriptor::~Descriptor() {
 
 bool Descriptor::close() { return ::close(std::exchange(number_, -1)) == 0; }
 
+Descriptor openToRead(const Descriptor* folder, const char* name) {
+  constexpr int flags = O_RDONLY | O_CLOEXEC | O_NOCTTY;
+  const int at = folder == nullptr ? AT_FDCWD : folder->number();
+  // Non-blocking, so that a pipe without a writer answers at once. It means nothing to a regular
+  // file, unless another process holds a lease on it: then the system asks for it back, and the file
+  // can be opened after a while.
+  const int number = ::openat(at, name, flags | O_NONBLOCK);
+  if (number >= 0 || errno != EWOULDBLOCK) return Descriptor(number);
+  struct stat status = {};
+  if (::fstatat(at, name, &status, 0) == 0 && !S_ISREG(status.st_mode)) {
+    errno = EWOULDBLOCK;
+    return Descriptor(-1);
+  }
+  for (;;) {
+    const int waited = ::openat(at, name, flags);
+    if (waited >= 0 || errno != EINTR) return Descriptor(waited);
+  }
+}
+
 std::error_code lastError() noexcept { return {errno, std::generic_category()}; }
 
 std::error_code objectionToKind(const struct stat& status) noexcept {
@@ -24,11 +44,17 @@ std::error_code objectionToKind(const struct stat& status) noexcept {
   return {};
 }
 
-std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error) {
+std::optional<struct stat> regularStatus(const Descriptor& file, std::error_code& error) {
   struct stat status = {};
   if (::fstat(file.number(), &status) != 0) return error = lastError(), std::nullopt;
   if ((error = objectionToKind(status))) return std::nullopt;
-  return static_cast<std::uintmax_t>(status.st_size);
+  return status;
+}
+
+std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error) {
+  const auto status = regularStatus(file, error);
+  if (!status) return std::nullopt;
+  return static_cast<std::uintmax_t>(status->st_size);
 }
 
 std::optional<std::size_t> readInto(std::span<std::uint8_t> content, const Descriptor& file,

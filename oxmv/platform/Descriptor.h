@@ -31,13 +31,21 @@ class Descriptor {
   int number_;
 };
 
+// Opens a file for reading, whose name is one in `folder` or, if that is null, a path. A pipe without
+// a writer never makes this wait. Not open when that fails; see lastError().
+Descriptor openToRead(const Descriptor* folder, const char* name);
+
 // Of the system call that failed last.
 std::error_code lastError() noexcept;
 
 // What keeps a file of this kind from being ours; none when nothing does.
 std::error_code objectionToKind(const struct stat& status) noexcept;
 
-// The size of an open file. Nothing, with the cause in `error`, when it is no regular file.
+// What the system says of an open file. Nothing, with the cause in `error`, when it is no regular
+// file.
+std::optional<struct stat> regularStatus(const Descriptor& file, std::error_code& error);
+
+// Its size alone.
 std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error);
 
 // Reads until `content` is full or the file ends. Answers how many bytes that were; nothing, with the

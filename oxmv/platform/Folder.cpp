@@ -68,10 +68,8 @@ bool Folder::forEachEntry(const std::function<void(std::string_view, EntryKind)>
 std::optional<std::span<const std::uint8_t>> Folder::read(const std::string& name, EntryKind kind,
                                                           std::vector<std::uint8_t>& buffer,
                                                           std::error_code& error) const {
-  // Non-blocking as in readWholeFile().
   error.clear();
-  Descriptor file(
-      ::openat(folder_.number(), name.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  const Descriptor file = openToRead(&folder_, name.c_str());
   if (!file.isOpen()) return error = lastError(), std::nullopt;
   if (kind != EntryKind::regular && !regularSize(file, error)) return std::nullopt;
   if (buffer.size() < ordinaryBuffer) buffer.resize(ordinaryBuffer);

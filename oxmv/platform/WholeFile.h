@@ -13,8 +13,8 @@
 
 namespace oxmv {
 
-// The largest file that is read. Clips take kilobytes and the largest looks some megabytes; what is
-// larger is no file of ours, and must not fill the host's memory.
+// The largest file that is read or written. Clips take kilobytes and the largest looks some megabytes;
+// what is larger is no file of ours, and must not fill the host's memory.
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 
 // Why a file is none of ours to read or replace. Everything else comes as the
@@ -22,13 +22,15 @@ constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 enum class FileError {
   notRegular = 1,  // a pipe, a device ... (a folder gives std::errc::is_a_directory)
   tooLarge,        // more than maxFileSize
-  changed,         // it is not any more what its reader found
+  changed,         // it is not any more what its reader found, or is not while it is read
 };
 std::error_code make_error_code(FileError error) noexcept;
 
 // The content of a regular file. Answers nothing, with the cause in `error`, when there is no such
 // file, it cannot be read to its end, is not a regular file (a pipe never makes this wait) or is
-// larger than maxFileSize. A read that fails is never taken for the end of the file.
+// larger than maxFileSize. A read that fails is never taken for the end of the file. A file that is
+// written to in its place meanwhile is read once more; if that goes on, it is FileError::changed, for
+// what has been read may be a mixture. (Those that writeWholeFile() replaces never are.)
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error);
 
@@ -39,11 +41,19 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
                                                        std::size_t count, std::error_code& error,
                                                        bool* isOpened = nullptr);
 
+// The content of such a file behind a head of fixed size, which is read first and cut to the bytes of
+// it that are there: they are in `head` whatever becomes of the rest, also when std::bad_alloc leaves.
+// Answers nothing, without an error, when the file ends within the head.
+std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::path& path,
+                                                        std::span<std::uint8_t>& head,
+                                                        std::error_code& error);
+
 // Puts a file with this content at `path`, in place of the regular file that may be there: whoever
 // opens it finds the old content or the new, whole, also after a crash. The content goes to a
 // temporary file of random name in the same folder (".oxmv-<16 digits>.tmp"), which then takes the
 // place of the old one and has its permissions and, where the system allows, its owner. A symbolic
-// link is followed: the file it leads to is replaced. Folders are not made.
+// link is followed: the file it leads to is replaced. Folders are not made. Content of more than
+// maxFileSize, which could not be read again, is FileError::tooLarge.
 //
 // Answers false with the cause in `error` when that fails; then what was there is there still, and
 // nothing else. In one case the new file is there already: when the system fails to say that its name
@@ -59,7 +69,8 @@ std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::pa
                                     std::span<const std::uint8_t> content, std::error_code& error);
 
 // Removes the file, or the symbolic link, of that name; never a folder. Answers false with the cause
-// in `error` when that fails, also when there is none.
+// in `error` when that fails, also when there is none. In one case it is gone already: when the system
+// fails to say that this has reached the disk.
 [[nodiscard]] bool removeFile(const std::filesystem::path& path, std::error_code& error);
 
 // writeWholeFile() where nothing has that name, neither file nor folder nor a symbolic link, wherever

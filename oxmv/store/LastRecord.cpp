@@ -1,8 +1,8 @@
 #include "oxmv/store/LastRecord.h"
 
-#include <cstddef>
+#include <array>
 #include <new>
-#include <utility>
+#include <span>
 
 #include "oxmv/platform/WholeFile.h"
 #include "oxmv/values/Text.h"
@@ -17,24 +17,22 @@ bool canBeOpened(const std::string& path) { return isAscii(path); }
 
 }  // namespace
 
-std::optional<std::span<const std::uint8_t>> LastRecord::stream() const {
-  if (content.size() < guidSize) return std::nullopt;
-  return std::span(content).subspan(guidSize);
-}
-
-LastRecord readLastRecord(const std::string& path, std::error_code& error) try {
+LastRecord readLastRecord(const std::string& path, std::error_code& error) {
+  LastRecord last;
   if (!canBeOpened(path)) {
     error = make_error_code(std::errc::no_such_file_or_directory);
-    return {};
+    return last;
   }
-  auto content = readWholeFile(path, error);
-  if (!content) return {error == FileError::tooLarge ? readLastGUID(path) : myGUID(), {}};
-  LastRecord last{{}, *std::move(content)};
-  copyOverImage(last.guid, last.content);
+  std::array<std::uint8_t, guidSize> record{};
+  std::span<std::uint8_t> head = record;
+  try {
+    last.stream = readBehindHead(path, head, error);
+  } catch (const std::bad_alloc&) {
+    error = make_error_code(std::errc::not_enough_memory);
+  }
+  copyOverImage(last.guid, head);
+  last.guidSize = head.size();
   return last;
-} catch (const std::bad_alloc&) {
-  error = make_error_code(std::errc::not_enough_memory);
-  return {readLastGUID(path), {}};
 }
 
 myGUID readLastGUID(const std::string& path) {

@@ -8,9 +8,9 @@
 
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <optional>
-#include <span>
 #include <string>
 #include <system_error>
 #include <vector>
@@ -20,16 +20,15 @@
 namespace oxmv {
 
 struct LastRecord {
-  myGUID guid;                        // zero in every byte that is not there
-  std::vector<std::uint8_t> content;  // of the whole file
-
-  // Points into `content`. None when the file is too short for the GUID.
-  std::optional<std::span<const std::uint8_t>> stream() const;
+  myGUID guid;               // zero in every byte that is not there
+  std::size_t guidSize = 0;  // how many bytes of it are there
+  // None when the file is too short for the GUID, or what follows it could not be read.
+  std::optional<std::vector<std::uint8_t>> stream;
 };
 
-// Reads the "last" file. A file that is missing or cannot be read gives a zero GUID and no content,
-// with the cause in `error`; one that does not fit into memory keeps its GUID. Only ASCII paths can
-// be opened; any other counts as missing.
+// Reads the "last" file: the GUID first, which stays whatever becomes of the rest. The cause of a
+// failure is in `error`, also that there is no memory. Only ASCII paths can be opened; any other
+// counts as missing.
 LastRecord readLastRecord(const std::string& path, std::error_code& error);
 
 // Its GUID alone; zero in every byte that is not there.

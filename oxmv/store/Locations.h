@@ -56,7 +56,7 @@ Setting lookUp(const SettingRow& row, Host& host, std::string_view appID);
 // preference takes effect on the next call. Nothing is checked or trimmed, nothing on the disk looked
 // at or made.
 
-// The override file. The first call stores the default of the folder as a preference, and
+// The override file. A call stores the default of the folder as a preference, and
 // synchronises, if there is no such preference or it is no text.
 std::string overrideFilePath(std::string_view appID);
 

@@ -8,6 +8,7 @@
 
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -20,6 +21,7 @@ std::size_t calls = 0;
 std::size_t faultyCall = 0;
 Fault currentFault{};
 std::string_view faulty;
+std::vector<SystemCall> made;
 
 // The function of that name in the C library.
 template <class Function>
@@ -29,8 +31,9 @@ Function* original(const char* name) {
 
 // Makes a call, or what has been armed for it.
 template <class Call>
-auto pass(std::string_view name, Call call) -> decltype(call()) {
-  if (!isArmed) return call();
+auto pass(std::string_view name, Call call, int flags = 0, mode_t mode = 0) -> decltype(call()) {
+  if (isArmed) made.push_back({std::string(name), flags, mode});
+  if (!isArmed || (!currentFault.function.empty() && currentFault.function != name)) return call();
   const bool isIt = ++calls == faultyCall;
   if (isIt) faulty = name;
   const bool isLater = currentFault.isLasting && faulty == name;
@@ -41,7 +44,7 @@ auto pass(std::string_view name, Call call) -> decltype(call()) {
     return -1;
   }
   if (isIt && currentFault.kind == Fault::Kind::killBefore) ::raise(SIGKILL);
-  if (isIt && currentFault.kind == Fault::Kind::meanwhile) {
+  if ((isIt || isLater) && currentFault.kind == Fault::Kind::meanwhile) {
     isArmed = false;
     currentFault.action();
     isArmed = true;
@@ -58,6 +61,7 @@ void armFault(std::size_t nth, const Fault& fault) {
   faultyCall = nth;
   currentFault = fault;
   faulty = {};
+  made.clear();
   isArmed = true;
 }
 
@@ -65,6 +69,8 @@ std::size_t disarmFault() {
   isArmed = false;
   return calls;
 }
+
+std::vector<SystemCall> systemCalls() { return made; }
 
 std::string faultyFunction() { return std::string(faulty); }
 
@@ -84,7 +90,21 @@ int open(const char* path, int flags, ...) {
     mode = va_arg(arguments, mode_t);
     va_end(arguments);
   }
-  return pass("open", [&] { return next(path, flags, mode); });
+  return pass(
+      "open", [&] { return next(path, flags, mode); }, flags, mode);
+}
+
+int openat(int folder, const char* path, int flags, ...) {
+  static auto* const next = original<int(int, const char*, int, ...)>("openat");
+  mode_t mode = 0;
+  if ((flags & O_CREAT) != 0) {
+    va_list arguments;
+    va_start(arguments, flags);
+    mode = va_arg(arguments, mode_t);
+    va_end(arguments);
+  }
+  return pass(
+      "openat", [&] { return next(folder, path, flags, mode); }, flags, mode);
 }
 
 int close(int file) {
@@ -104,6 +124,16 @@ ssize_t write(int file, const void* buffer, size_t size) {
   return pass("write", [&] { return next(file, buffer, piece); });
 }
 
+ssize_t readlink(const char* path, char* target, size_t size) noexcept {
+  static auto* const next = original<ssize_t(const char*, char*, size_t)>("readlink");
+  return pass("readlink", [&] { return next(path, target, size); });
+}
+
+ssize_t getrandom(void* buffer, size_t size, unsigned flags) {
+  static auto* const next = original<ssize_t(void*, size_t, unsigned)>("getrandom");
+  return pass("getrandom", [&] { return next(buffer, size, flags); });
+}
+
 int fstat(int file, struct stat* status) noexcept {
   static auto* const next = original<int(int, struct stat*)>("fstat");
   return pass("fstat", [&] { return next(file, status); });
@@ -121,7 +151,8 @@ int fchown(int file, uid_t owner, gid_t group) noexcept {
 
 int fchmod(int file, mode_t mode) noexcept {
   static auto* const next = original<int(int, mode_t)>("fchmod");
-  return pass("fchmod", [&] { return next(file, mode); });
+  return pass(
+      "fchmod", [&] { return next(file, mode); }, 0, mode);
 }
 
 int fsync(int file) {

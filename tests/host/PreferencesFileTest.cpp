@@ -220,12 +220,14 @@ TEST(UpdatePreferencesFile, LeavesAFileThatMayNotBeReadOrReplaced) {
   put(dir / "a.toml", "a = 1\n");
   put(dir / "secret.toml", "a = 1\n");
   fs::permissions(dir / "secret.toml", fs::perms::none);
-  fs::permissions(dir.path(), fs::perms(0755));
+  fs::permissions(dir.path(), fs::perms(0555));
   EXPECT_TRUE(test::asOrdinaryUser([&] {
     return update(dir / "a.toml", {{"a", 2}}) == std::errc::permission_denied &&
            update(dir / "secret.toml", {{"a", 2}}) == std::errc::permission_denied &&
            !update(dir / "a.toml", {{"a", 1}});  // nothing to write
   }));
+  fs::permissions(dir.path(), fs::perms(0755));
+  fs::permissions(dir / "secret.toml", fs::perms(0600));
   EXPECT_EQ(get(dir / "a.toml"), "a = 1\n");
   EXPECT_EQ(get(dir / "secret.toml"), "a = 1\n");
 }

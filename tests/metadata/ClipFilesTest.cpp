@@ -134,6 +134,17 @@ TEST_F(ClipFiles, FileOfNoBytesIsAClipWithoutTags) {
   expectNoTags(MetadataDictionary::initFromGUID(guid), LoadError::none);
 }
 
+TEST_F(ClipFiles, OverrideOfNoBytesIsOneWithoutTags) {
+  putFile(overrideFile(), {});
+  expectNoTags(MetadataDictionary::initFromOverride(), LoadError::none);
+}
+
+// Saving an eye without tags removes its file, so one of no bytes has lost them.
+TEST_F(ClipFiles, EyeFileOfNoBytesIsTooShort) {
+  putFile(left(), {});
+  expectNoTags(MetadataDictionary::initFromGUIDForSingleEye(guid, 0), LoadError::tooShort);
+}
+
 TEST_F(ClipFiles, LoadErrorEndsWhenTheObjectIsGivenTags) {
   auto clip = MetadataDictionary::initFromGUID(guid);
   EXPECT_EQ(clip.loadError(), LoadError::missing);
@@ -320,14 +331,15 @@ TEST_F(ClipFiles, SavingOverAFolderFails) {
 TEST_F(ClipFiles, SavingWithoutPermissionFailsAndLeavesTheFile) {
   putFile(combined(), takeThree);
   fs::permissions(database().parent_path(), fs::perms::all);
-  fs::permissions(database(),
-                  fs::perms::owner_all | fs::perms::others_read | fs::perms::others_exec);
+  fs::permissions(database(), fs::perms::owner_read | fs::perms::owner_exec |
+                                  fs::perms::others_read | fs::perms::others_exec);
   EXPECT_TRUE(asOrdinaryUser([] {
     auto clip = MetadataDictionary::initFromGUID(guid);
     clip.removeObject("TAKE");
     std::error_code error;
     return !clip.writeToGUIDFile(&error) && error == std::errc::permission_denied;
   }));
+  fs::permissions(database(), fs::perms::owner_all);
   EXPECT_EQ(getFile(combined()), takeThree);
 }
 
@@ -344,6 +356,49 @@ TEST_F(ClipFiles, WithoutMemoryNothingIsWrittenAndNothingSaid) {
   EXPECT_FALSE(isWritten);
   EXPECT_EQ(error, FileError::tooLarge);
   EXPECT_EQ(getFile(combined()), takeThree);
+}
+
+// Loads with memory for no allocation, for one and so on, until it is enough. What could not be
+// loaded says so; answers how often the GUID was there all the same.
+std::size_t guidsWithoutMemory(MetadataDictionary (*load)(), const myGUID& wanted) {
+  std::size_t guids = 0;
+  for (std::size_t granted = 0; granted < 1000; ++granted) {
+    std::optional<MetadataDictionary> object;
+    bool wasFelt = false;
+    {
+      const MemoryShortage shortage(granted);
+      object = load();
+      wasFelt = shortage.wasFelt();
+    }
+    if (!wasFelt) {
+      EXPECT_EQ(object->metadata(), three);
+      EXPECT_EQ(object->loadError(), LoadError::none);
+      return guids;
+    }
+    expectNoTags(*object, LoadError::unreadable);
+    EXPECT_EQ(object->loadErrorCode(), std::errc::not_enough_memory);
+    if (object->GUID() == wanted) ++guids;
+  }
+  ADD_FAILURE() << "never enough";
+  return 0;
+}
+
+TEST_F(ClipFiles, WithoutMemoryNoTagsAreLoaded) {
+  putFile(combined(), takeThree);
+  putFile(left(), takeThree);
+  putFile(overrideFile(), takeThree);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromGUID(guid); }, guid), 5u);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromGUIDForSingleEye(guid, 0); },
+                               guid),
+            5u);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromOverride(); }, {}), 5u);
+}
+
+TEST_F(ClipFiles, WithoutMemoryForItsStreamTheLastFileGivesItsGuid) {
+  Bytes content = imageOf(9);
+  content.insert(content.end(), takeThree.begin(), takeThree.end());
+  putFile(lastFile(), content);
+  EXPECT_GT(guidsWithoutMemory([] { return MetadataDictionary::initFromLast(); }, guidOf(9)), 0u);
 }
 
 // The override file.
@@ -386,6 +441,38 @@ TEST_F(ClipFiles, KeepsAnEmptyOverrideFile) {
   EXPECT_TRUE(MetadataDictionary::initFromGUIDForSingleEye(guid, 1).writeToOverride());
   EXPECT_TRUE(fs::is_regular_file(overrideFile()));
   EXPECT_EQ(fs::file_size(overrideFile()), 0u);
+}
+
+// Of every allocation. The path is made before the tags are encoded, and want of memory for those is
+// not told.
+TEST_F(ClipFiles, OverrideWithoutMemoryStaysAndNothingIsSaid) {
+  putFile(overrideFile(), takeThree);
+  MetadataDictionary clip;
+  clip.setMetadata(Dictionary{{"REEL", "A001"}});
+  std::size_t refusals = 0;
+  for (std::size_t granted = 0;; ++granted) {
+    ASSERT_LT(granted, 1000u);
+    host->questions.clear();
+    std::error_code error = FileError::tooLarge;
+    bool isWritten = false;
+    bool isThrown = false;
+    {
+      const MemoryShortage shortage(granted);
+      try {
+        isWritten = clip.writeToOverride(&error);
+      } catch (const std::bad_alloc&) {
+        isThrown = true;
+      }
+    }
+    EXPECT_EQ(error, FileError::tooLarge);
+    if (isWritten) break;
+    EXPECT_EQ(getFile(overrideFile()), takeThree);
+    if (isThrown) continue;
+    ++refusals;
+    EXPECT_EQ(host->questions, std::vector<std::string>{"get OverridePath"});
+  }
+  EXPECT_GT(refusals, 0u);
+  EXPECT_NE(getFile(overrideFile()), takeThree);
 }
 
 TEST_F(ClipFiles, OverrideWithoutAFolderFails) {

@@ -1,6 +1,7 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 #include <gtest/gtest.h>
 #include <sys/mman.h>
@@ -158,6 +159,14 @@ TEST(MetadataDictionary, ProcessedGuidRecordIsTheIdentityToo) {
 }
 
 // init.
+
+TEST(MetadataDictionary, InitOfATemporaryGivesItByValue) {
+  const auto loaded = [] { return MetadataDictionary().initWithData(guidStream(0x42)); };
+  const MetadataDictionary clip = loaded().init();
+  EXPECT_FALSE(clip.haveMetadata());
+  EXPECT_EQ(clip.GUID(), loaded().GUID());
+  static_assert(std::is_same_v<decltype(MetadataDictionary().init()), MetadataDictionary>);
+}
 
 TEST(MetadataDictionary, InitTakesAwayTheTags) {
   MetadataDictionary clip;

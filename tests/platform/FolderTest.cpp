@@ -10,6 +10,7 @@
 #include "oxmv/platform/Folder.h"
 #include "oxmv/platform/WholeFile.h"
 #include "tests/support/Files.h"
+#include "tests/support/LeasedFile.h"
 #include "tests/support/TempDir.h"
 
 namespace oxmv {
@@ -125,6 +126,13 @@ TEST_F(OpenFolder, FindsOutWhatHasTakenThePlaceOfAFile) {
   EXPECT_EQ(error, std::errc::is_a_directory);
   read("gone", EntryKind::regular);
   EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+}
+
+TEST_F(OpenFolder, WaitsForAFileThatAnotherProcessHasForItself) {
+  test::putFile(root / "clip", {1, 2, 3});
+  const test::LeasedFile lease(root / "clip");
+  if (!lease.isHeld()) GTEST_SKIP() << "no leases here";
+  EXPECT_EQ(read("clip"), (Bytes{1, 2, 3}));
 }
 
 TEST_F(OpenFolder, RefusesFilesThatAreTooLarge) {

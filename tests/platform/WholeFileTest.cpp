@@ -1,18 +1,23 @@
+#include <algorithm>
 #include <csignal>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <new>
 #include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 
 #include "oxmv/platform/WholeFile.h"
 #include "tests/support/ChildProcess.h"
 #include "tests/support/Files.h"
+#include "tests/support/LeasedFile.h"
+#include "tests/support/Memory.h"
 #include "tests/support/TempDir.h"
 
 namespace oxmv {
@@ -76,6 +81,27 @@ TEST(ReadWholeFile, RefusesAPipeWithoutWaitingForIt) {
   EXPECT_FALSE(readWholeFile(folder / "pipe", error));
   EXPECT_EQ(error, FileError::notRegular);
   EXPECT_EQ(error.message(), "Not a regular file");
+}
+
+TEST(ReadWholeFile, WaitsForAFileThatAnotherProcessHasForItself) {
+  const TempDir folder;
+  test::putFile(folder / "clip", newContent);
+  const test::LeasedFile lease(folder / "clip");
+  if (!lease.isHeld()) GTEST_SKIP() << "no leases here";
+  std::error_code error;
+  EXPECT_EQ(readWholeFile(folder / "clip", error), newContent);
+  EXPECT_FALSE(error);
+}
+
+TEST(ReadWholeFile, ReadsAsMuchAsTheLimit) {
+  const TempDir folder;
+  test::putFile(folder / "large", newContent);
+  fs::resize_file(folder / "large", maxFileSize);  // sparse
+  std::error_code error;
+  const auto content = readWholeFile(folder / "large", error);
+  ASSERT_TRUE(content);
+  EXPECT_EQ(content->size(), maxFileSize);
+  EXPECT_TRUE(std::equal(newContent.begin(), newContent.end(), content->begin()));
 }
 
 TEST(ReadWholeFile, RefusesMoreThanTheLimit) {
@@ -144,6 +170,57 @@ TEST(ReadFileStart, SaysWhyThereIsNothingToRead) {
   EXPECT_EQ(error, std::errc::is_a_directory);
 }
 
+TEST(ReadBehindHead, GivesHeadAndRest) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  Bytes buffer(3);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error = FileError::tooLarge;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), (Bytes{0, 0xFF}));
+  EXPECT_FALSE(error);
+  EXPECT_EQ(head.size(), 3u);
+  EXPECT_EQ(buffer, (Bytes{'n', 'e', 'w'}));
+  buffer.resize(5);
+  head = buffer;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), Bytes());
+  EXPECT_EQ(buffer, newContent);
+}
+
+TEST(ReadBehindHead, CutsAHeadThatIsNotWhole) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  Bytes buffer(6, 7);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_FALSE(error);
+  EXPECT_EQ(head.size(), 5u);
+  EXPECT_EQ(buffer, (Bytes{'n', 'e', 'w', 0, 0xFF, 7}));
+}
+
+TEST(ReadBehindHead, HasTheHeadOfAFileThatIsTooLarge) {
+  const TempDir dir;
+  test::putFile(dir / "clip", newContent);
+  fs::resize_file(dir / "clip", maxFileSize + 1);  // sparse
+  Bytes buffer(5);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_EQ(head.size(), 5u);
+  EXPECT_EQ(buffer, newContent);
+}
+
+TEST(ReadBehindHead, HasNoHeadOfAFileThatIsNotThere) {
+  const TempDir dir;
+  Bytes buffer(5);
+  std::span<std::uint8_t> head = buffer;
+  std::error_code error;
+  EXPECT_EQ(readBehindHead(dir / "clip", head, error), std::nullopt);
+  EXPECT_EQ(error, std::errc::no_such_file_or_directory);
+  EXPECT_TRUE(head.empty());
+}
+
 TEST(WriteWholeFile, MakesANewFile) {
   const TempDir folder;
   const mode_t mask = ::umask(027);
@@ -167,6 +244,45 @@ TEST(WriteWholeFile, ReplacesAFileAndKeepsItsPermissions) {
   EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
+TEST(WriteWholeFile, KeepsTheOwnerWhereTheSystemAllows) {
+  if (::geteuid() != 0) GTEST_SKIP() << "files can be given to others by root only";
+  const TempDir folder;
+  const fs::path clip = folder / "clip";
+  test::putFile(clip, oldContent);
+  ASSERT_EQ(::chown(clip.c_str(), 1234, 4321), 0);
+  ASSERT_EQ(::chmod(clip.c_str(), 06775), 0);  // after the owner: that takes such bits away
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(clip, newContent, error));
+  struct stat status = {};
+  ASSERT_EQ(::stat(clip.c_str(), &status), 0);
+  EXPECT_EQ(status.st_uid, 1234u);
+  EXPECT_EQ(status.st_gid, 4321u);
+  EXPECT_EQ(modeOf(clip), 06775u);
+
+  // Somebody who may not give it away lets nobody run it as himself, nor his group use it.
+  fs::permissions(folder.path(), fs::perms::all);
+  EXPECT_TRUE(asOrdinaryUser([&] { return writeWholeFile(clip, oldContent, error); }));
+  ASSERT_EQ(::stat(clip.c_str(), &status), 0);
+  EXPECT_EQ(status.st_uid, 65534u);
+  EXPECT_EQ(status.st_gid, 65534u);
+  EXPECT_EQ(modeOf(clip), 0705u);
+}
+
+TEST(WriteWholeFile, NeedsNotReadTheFolder) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  fs::permissions(folder / "clip", fs::perms::owner_read | fs::perms::others_read);
+  fs::permissions(folder.path(), fs::perms::owner_write | fs::perms::owner_exec |
+                                     fs::perms::others_write | fs::perms::others_exec);
+  EXPECT_TRUE(asOrdinaryUser([&] {
+    std::error_code error;
+    return writeWholeFile(folder / "clip", newContent, error);
+  }));
+  fs::permissions(folder.path(), fs::perms::owner_all);
+  EXPECT_EQ(test::getFile(folder / "clip"), newContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
+}
+
 TEST(WriteWholeFile, LeavesTheOldContentToThoseWhoHaveItOpen) {
   const TempDir folder;
   test::putFile(folder / "clip", oldContent);
@@ -182,6 +298,27 @@ TEST(WriteWholeFile, WritesAnEmptyFile) {
   std::error_code error;
   EXPECT_TRUE(writeWholeFile(folder / "clip", {}, error));
   EXPECT_EQ(fs::file_size(folder / "clip"), 0u);
+}
+
+TEST(WriteWholeFile, RefusesMoreThanCanBeReadAgain) {
+  const TempDir folder;
+  test::putFile(folder / "clip", oldContent);
+  // Pages that nobody looks at take no memory.
+  constexpr std::size_t size = maxFileSize + 1;
+  void* const pages =
+      ::mmap(nullptr, size, PROT_READ, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0);
+  ASSERT_NE(pages, MAP_FAILED);
+  const std::span content(static_cast<const std::uint8_t*>(pages), size);
+  std::error_code error;
+  EXPECT_FALSE(writeWholeFile(folder / "clip", content, error));
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_FALSE(replaceWholeFile(folder / "clip", oldContent, content, error));
+  EXPECT_EQ(error, FileError::tooLarge);
+  EXPECT_FALSE(writeWholeFile(folder / "absent/clip", content, error));
+  EXPECT_EQ(error, FileError::tooLarge);  // before anything is touched
+  EXPECT_EQ(test::getFile(folder / "clip"), oldContent);
+  EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
+  ::munmap(pages, size);
 }
 
 TEST(WriteWholeFile, FollowsSymbolicLinks) {
@@ -204,6 +341,21 @@ TEST(WriteWholeFile, MakesTheFileThatALinkLeadsTo) {
   EXPECT_TRUE(writeWholeFile(folder / "link", newContent, error));
   EXPECT_TRUE(fs::is_symlink(folder / "link"));
   EXPECT_EQ(test::getFile(folder / "target"), newContent);
+}
+
+TEST(WriteWholeFile, FollowsAsManyLinksAsTheSystemDoes) {
+  const TempDir folder;
+  test::putFile(folder / "0", oldContent);
+  for (int link = 1; link <= 41; ++link)
+    fs::create_symlink(std::to_string(link - 1), folder / std::to_string(link));
+  std::error_code error;
+  EXPECT_TRUE(writeWholeFile(folder / "40", newContent, error));
+  EXPECT_EQ(readWholeFile(folder / "40", error), newContent);
+  EXPECT_FALSE(writeWholeFile(folder / "41", oldContent, error));
+  EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(readWholeFile(folder / "41", error), std::nullopt);
+  EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(test::getFile(folder / "0"), newContent);
 }
 
 TEST(WriteWholeFile, RefusesLinksThatLeadInACircle) {
@@ -420,6 +572,50 @@ TEST(WriteNewFile, SaysWhyItCouldNot) {
   EXPECT_EQ(error, std::errc::not_a_directory);
   EXPECT_FALSE(writeNewFile(folder / std::string("a\0b", 3), newContent, error));
   EXPECT_EQ(error, std::errc::invalid_argument);
+}
+
+// Runs a writer with memory for no allocation, for one and so on; answers how often it ran out.
+template <class Writer>
+std::size_t shortagesOf(const TempDir& folder, Writer write) {
+  for (std::size_t granted = 0; granted < 100; ++granted) {
+    test::putFile(folder / "clip", oldContent);
+    const fs::path path = folder / "clip";
+    bool isWritten = false;
+    bool wasFelt = false;
+    {
+      const test::MemoryShortage shortage(granted);
+      try {
+        isWritten = write(path);
+      } catch (const std::bad_alloc&) {
+      }
+      wasFelt = shortage.wasFelt();
+    }
+    EXPECT_EQ(test::getFile(path), isWritten ? newContent : oldContent) << granted;
+    EXPECT_EQ(test::namesIn(folder.path()), std::set<std::string>{"clip"}) << granted;
+    if (!wasFelt) return isWritten ? granted : 0;
+  }
+  return 0;
+}
+
+TEST(WriteWholeFile, WithoutMemoryLeavesTheOldFileAndNothingElse) {
+  const TempDir folder;
+  EXPECT_GT(shortagesOf(folder,
+                        [](const fs::path& path) {
+                          std::error_code error;
+                          return writeWholeFile(path, newContent, error);
+                        }),
+            0u);
+}
+
+TEST(ReplaceWholeFile, WithoutMemoryLeavesTheOldFileAndNothingElse) {
+  const TempDir folder;
+  const std::optional<Bytes> old = oldContent;
+  EXPECT_GT(shortagesOf(folder,
+                        [&](const fs::path& path) {
+                          std::error_code error;
+                          return replaceWholeFile(path, old, newContent, error);
+                        }),
+            0u);
 }
 
 }  // namespace

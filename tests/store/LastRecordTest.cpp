@@ -5,6 +5,7 @@
 #include "oxmv/platform/WholeFile.h"
 #include "oxmv/store/LastRecord.h"
 #include "tests/support/Files.h"
+#include "tests/support/Memory.h"
 #include "tests/support/TempDir.h"
 #include "tests/support/WideLong.h"
 
@@ -28,11 +29,7 @@ Bytes operator+(Bytes a, const Bytes& b) {
   return a;
 }
 
-Bytes streamOf(const LastRecord& last) {
-  const auto bytes = last.stream();
-  if (!bytes) return bytesOf("no stream");
-  return {bytes->begin(), bytes->end()};
-}
+Bytes streamOf(const LastRecord& last) { return last.stream ? *last.stream : bytesOf("no stream"); }
 
 TEST(LastRecord, IsAGuidAndAStream) {
   const TempDir dir;
@@ -70,7 +67,8 @@ TEST(LastRecord, TooShortForItsGuidKeepsTheBytesThatAreThere) {
     const LastRecord last = readLastRecord(dir / "last", error);
     EXPECT_FALSE(error);
     EXPECT_EQ(last.guid, expected);
-    EXPECT_EQ(last.stream(), std::nullopt) << size;
+    EXPECT_EQ(last.guidSize, size);
+    EXPECT_EQ(last.stream, std::nullopt) << size;
     EXPECT_EQ(readLastGUID(dir / "last"), expected);
   }
 }
@@ -87,7 +85,7 @@ TEST(LastRecord, ThatIsMissingIsZero) {
   const LastRecord last = readLastRecord(dir / "last", error);
   EXPECT_EQ(error, std::errc::no_such_file_or_directory);
   EXPECT_EQ(last.guid, myGUID());
-  EXPECT_EQ(last.stream(), std::nullopt);
+  EXPECT_EQ(last.stream, std::nullopt);
   EXPECT_EQ(readLastGUID(dir / "last"), myGUID());
 }
 
@@ -108,8 +106,33 @@ TEST(LastRecord, TooLargeForMemoryKeepsItsGuid) {
   const LastRecord last = readLastRecord(dir / "last", error);
   EXPECT_EQ(error, FileError::tooLarge);
   EXPECT_EQ(last.guid, guid);
-  EXPECT_EQ(last.stream(), std::nullopt);
+  EXPECT_EQ(last.stream, std::nullopt);
   EXPECT_EQ(readLastGUID(dir / "last"), guid);
+}
+
+// Of every allocation; the GUID is read before most of them.
+TEST(LastRecord, WithoutMemoryKeepsItsGuid) {
+  const TempDir dir;
+  putFile(dir / "last", record + stream);
+  const std::string path = dir / "last";
+  std::size_t guids = 0;
+  for (std::size_t granted = 0;; ++granted) {
+    ASSERT_LT(granted, 100u);
+    std::error_code error;
+    LastRecord last;
+    bool wasFelt = false;
+    {
+      const MemoryShortage shortage(granted);
+      last = readLastRecord(path, error);
+      wasFelt = shortage.wasFelt();
+    }
+    if (!wasFelt) break;
+    EXPECT_EQ(error, std::errc::not_enough_memory);
+    EXPECT_EQ(last.stream, std::nullopt);
+    EXPECT_TRUE(last.guid == guid || last.guid == myGUID());
+    if (last.guid == guid) ++guids;
+  }
+  EXPECT_GT(guids, 0u);
 }
 
 TEST(LastRecord, KeepsCountingAsMissingUnderAPathThatIsNotAscii) {

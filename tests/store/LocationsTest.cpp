@@ -1,5 +1,6 @@
 #include <limits>
 #include <string>
+#include <vector>
 
 #include <gtest/gtest.h>
 
@@ -143,12 +144,33 @@ TEST_F(Locations, TemplateThatAsksForTooMuchIsHarmless) {
   EXPECT_EQ(clipFilePath(guid, appID), "/%n%slooks%14$d");
 }
 
+TEST_F(Locations, OfClipsAskForTheTemplateThenTheLooksThenTheDatabase) {
+  clipFilePath(guid, appID);
+  EXPECT_EQ(host->questions,
+            (std::vector<std::string>{"string OXMVGUIDPathTemplate", "get LUTsPath",
+                                      "string OXMVLutsPath", "get CurrentDBPath"}));
+  host->questions.clear();
+  preferences()["LUTsPath"] = "/looks";
+  eyeFilePath(guid, 0, appID);
+  EXPECT_EQ(host->questions, (std::vector<std::string>{"string OXMVGUIDPathTemplateR",
+                                                       "get LUTsPath", "get CurrentDBPath"}));
+}
+
 // The override folder.
 
 TEST_F(Locations, KeepsStoringTheDefaultOfTheOverrideFolder) {
   EXPECT_EQ(overrideFilePath(appID), "/Library/Application Support/Ombrix/override.colr");
   EXPECT_EQ(preferences(), (FakeHost::Preferences{{"OverridePath", defaultFolder}}));
   EXPECT_EQ(host->synchronisations, std::vector<std::string>{std::string(appID)});
+}
+
+TEST_F(Locations, DefaultOfTheOverrideFolderIsSetBeforeItIsSynchronised) {
+  const std::vector<std::string> stored = {"get OverridePath", "set OverridePath", "synchronise"};
+  overrideFilePath(appID);
+  EXPECT_EQ(host->questions, stored);
+  host->questions.clear();
+  overrideFilePath(appID);
+  EXPECT_EQ(host->questions, std::vector<std::string>{"get OverridePath"});
 }
 
 TEST_F(Locations, LastFileStoresTheDefaultToo) {

@@ -24,14 +24,18 @@ class FakeHost final : public Host {
   std::vector<std::string> logLines;
   // The application identifiers of the synchronisations, in order.
   std::vector<std::string> synchronisations;
+  // What it was asked for, in order: "get KEY", "set KEY", "synchronise", "string KEY".
+  std::vector<std::string> questions;
 
   Value copyPreference(std::string_view key, std::string_view appID) override {
+    questions.push_back("get " + std::string(key));
     const auto domain = preferences.find(appID);
     if (domain == preferences.end()) return {};
     const auto found = domain->second.find(key);
     return found == domain->second.end() ? Value() : found->second;
   }
   void setPreference(std::string_view key, const Value& value, std::string_view appID) override {
+    questions.push_back("set " + std::string(key));
     Preferences& domain = preferences[std::string(appID)];
     if (value.isNothing()) {
       domain.erase(std::string(key));
@@ -40,10 +44,12 @@ class FakeHost final : public Host {
     }
   }
   bool synchronizePreferences(std::string_view appID, std::error_code*) override {
+    questions.emplace_back("synchronise");
     synchronisations.emplace_back(appID);
     return true;
   }
   std::string localizedString(std::string_view key, std::string_view builtIn) override {
+    questions.push_back("string " + std::string(key));
     const auto found = strings.find(key);
     return found == strings.end() ? std::string(builtIn) : found->second;
   }
