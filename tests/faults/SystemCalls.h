@@ -26,4 +26,7 @@ void armFault(std::size_t nth, const Fault& fault);
 std::size_t disarmFault();
 std::string faultyFunction();
 
+// Whether files tell when they were created; some file systems do not remember it.
+void hideCreationTimes(bool areHidden);
+
 }  // namespace oxmv::test
