@@ -27,14 +27,20 @@ bool mayGetClip(Call& call, const ClipName& output) {
   return false;
 }
 
-void putClip(Call& call, const ClipName& output, const Bytes& stream) {
+std::optional<FileProblem> putClip(Call& call, const ClipName& output, const Bytes& stream) {
   const std::string size = counted(stream.size(), "byte");
-  if (call.arguments.has(Flag::dryRun))
-    return call.messages.note(output.word, fmt::format("would get {}", size));
-  if (output.kind == ClipName::Kind::standardStream) return call.output.write(asText(stream));
+  if (call.arguments.has(Flag::dryRun)) {
+    call.messages.note(output.word, fmt::format("would get {}", size));
+    return std::nullopt;
+  }
+  if (output.kind == ClipName::Kind::standardStream) {
+    call.output.write(asText(stream));
+    return std::nullopt;
+  }
   std::error_code error;
   if (!writeClip(output, stream, error)) return sayWriteFailed(call, output, error);
   call.messages.note(output.word, fmt::format("got {}", size));
+  return std::nullopt;
 }
 
 }  // namespace oxmv::cli

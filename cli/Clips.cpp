@@ -91,12 +91,15 @@ bool writeClip(const ClipName& name, const Bytes& stream, std::error_code& error
   return removeFile(name.path, error) || error == std::errc::no_such_file_or_directory;
 }
 
-void sayWriteFailed(Call& call, const ClipName& name, const std::error_code& error) {
+FileProblem sayWriteFailed(Call& call, const ClipName& name, const std::error_code& error) {
   const std::string way =
       error == std::errc::no_such_file_or_directory ? wayToFolder(name) : std::string();
-  call.messages.error(name.word,
-                      way.empty() ? error.message() : fmt::format("{}; {}", error.message(), way),
-                      "write-failed");
+  FileProblem problem = {
+      "write-failed",
+      way.empty() ? error.message() : fmt::format("{}; {}", error.message(), way),
+  };
+  call.messages.error(name.word, problem.message, problem.code);
+  return problem;
 }
 
 void warnOfLosses(Call& call, const ClipName& name, const Clip& clip) {

@@ -50,7 +50,7 @@ void warnOfLosses(Call& call, const ClipName& name, const Clip& clip);
 // no file, so an empty stream removes it, if it is there; any other clip leaves an empty file.
 [[nodiscard]] bool writeClip(const ClipName& name, const Bytes& stream, std::error_code& error);
 
-// Says why a clip was not written, and the way out.
-void sayWriteFailed(Call& call, const ClipName& name, const std::error_code& error);
+// Says why a clip was not written, and the way out; answers what was said.
+FileProblem sayWriteFailed(Call& call, const ClipName& name, const std::error_code& error);
 
 }  // namespace oxmv::cli

@@ -9,6 +9,7 @@
 #include <fmt/format.h>
 
 #include "cli/TagPaths.h"
+#include "oxmv/import/CameraStill.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
 #include "oxmv/values/Characters.h"
@@ -26,6 +27,9 @@ struct Line {
 // A name that is longer moves its own label and value, not those of all others.
 constexpr std::size_t widestName = 28;
 
+// No row of the table of tags: it lives in dictionaries only.
+constexpr std::string_view fieldOfViewLabel = "Field of view, not in clips";
+
 class TableWriter {
  public:
   TableWriter(const Style& style, Extent extent) : style_(style), extent_(extent) {}
@@ -35,7 +39,8 @@ class TableWriter {
     for (const auto& [key, value] : dictionary) {
       const TagRow* row = hasLabels ? findTagRow(key) : nullptr;
       if (row == nullptr) {
-        addValue(textInLine(key, extent_), {}, value, depth, true);
+        addValue(textInLine(key, extent_), key == fieldOfViewKey ? fieldOfViewLabel : "", value,
+                 depth, true);
       } else {
         addValue(key, row->label, value, depth, !isGroup(*row));
       }

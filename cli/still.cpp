@@ -21,6 +21,7 @@
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/platform/CreationTime.h"
+#include "oxmv/values/Array.h"
 #include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
@@ -73,8 +74,9 @@ Harvest harvest(Call& call, const std::string& name) {
   return tagsOf(call, name, std::get<CameraTables>(tables));
 }
 
-void showAsJson(Call& call, const std::string& name, const Harvest& harvest) {
-  const auto* tags = std::get_if<Dictionary>(&harvest);
+// Null tags: they are not known.
+void showAsJson(Call& call, const std::string& name, const Dictionary* tags,
+                const FileProblem* problem) {
   JsonResults results(call);
   results.add([&](JsonWriter& json) {
     beginResult(json, "oxmv.still/1", name);
@@ -84,32 +86,50 @@ void showAsJson(Call& call, const std::string& name, const Harvest& harvest) {
     } else {
       writeTagJson(json, *tags);
     }
-    endResult(json, std::get_if<FileProblem>(&harvest));
+    endResult(json, problem);
   });
   results.finish();
 }
 
-// The field of view is in every still of use, and in no stream: that is told, not refused.
-std::vector<Loss> lossesBesideFieldOfView(Call& call, const std::string& name,
-                                          const Dictionary& tags, Layout layout) {
-  std::vector<Loss> losses = findLosses(tags, layout);
-  const auto isFieldOfView = [](const Loss& loss) { return loss.path == fieldOfViewKey; };
-  for (const Loss& loss : losses) {
-    if (isFieldOfView(loss))
-      call.messages.warning(name,
-                            "the field of view (FOV) is not stored: streams have no tag for it",
-                            codeOf(loss.code));
-  }
-  losses.erase(std::remove_if(losses.begin(), losses.end(), isFieldOfView), losses.end());
-  return losses;
+bool isAllowed(const Loss& loss, const std::vector<LossCode>& allowed) {
+  return std::find(allowed.begin(), allowed.end(), loss.code) != allowed.end();
 }
 
-void store(Call& call, const std::string& name, const Dictionary& tags, Layout layout,
-           const std::vector<LossCode>& allowed, const ClipName& output) {
-  if (!passes(call, name, lossesBesideFieldOfView(call, name, tags, layout), allowed)) return;
+// The field of view is in every still of use, and in no stream: that is told, not refused.
+void takeOutFieldOfView(Call& call, const std::string& name, const Dictionary& tags,
+                        std::vector<Loss>& losses, const std::vector<LossCode>& allowed) {
+  const auto loss = std::find_if(losses.begin(), losses.end(), [](const Loss& candidate) {
+    return candidate.path == fieldOfViewKey;
+  });
+  if (loss == losses.end()) return;
+  const int letter = tags[fieldOfViewKey].array()[0].intValue();
+  if (!isAllowed(*loss, allowed))
+    call.messages.warning(
+        name,
+        fmt::format("the field of view, FOV {} ({}), is not stored: streams have no tag for it",
+                    letter, static_cast<char>(letter)),
+        codeOf(loss->code));
+  losses.erase(loss);
+}
+
+// What keeps the clip from being stored is said, and answered.
+std::optional<FileProblem> store(Call& call, const std::string& name, const Dictionary& tags,
+                                 Layout layout, const std::vector<LossCode>& allowed,
+                                 const ClipName& output) {
+  std::vector<Loss> losses = findLosses(tags, layout);
+  takeOutFieldOfView(call, name, tags, losses, allowed);
+  if (!passes(call, name, losses, allowed)) {
+    const auto loss = std::find_if(losses.begin(), losses.end(), [&](const Loss& candidate) {
+      return !isAllowed(candidate, allowed);
+    });
+    return FileProblem{codeOf(loss->code),
+                       fmt::format("{} {}; nothing written", loss->path, loss->message)};
+  }
   const auto stream = encodeStream(tags, layout);
-  if (!stream) return call.messages.error(name, "not enough memory", "no-memory");
-  putClip(call, output, *stream);
+  if (!stream) return said(call, name, {"no-memory", "not enough memory"});
+  auto problem = putClip(call, output, *stream);
+  if (problem) problem->message = fmt::format("{}: {}", output.word, problem->message);
+  return problem;
 }
 
 void checkFlags(const Call& call, const std::string& name) {
@@ -136,12 +156,16 @@ void run(Call& call) {
   }
 
   const Harvest harvested = harvest(call, name);
-  if (wantsJson(call)) showAsJson(call, name, harvested);
   const auto* tags = std::get_if<Dictionary>(&harvested);
-  if (tags == nullptr) return;
-  if (output) {
-    store(call, name, *tags, layout, allowed, *output);
-  } else if (!wantsJson(call)) {
+  std::optional<FileProblem> problem;
+  if (tags == nullptr) {
+    problem = std::get<FileProblem>(harvested);
+  } else if (output) {
+    problem = store(call, name, *tags, layout, allowed, *output);
+  }
+  if (wantsJson(call)) {
+    showAsJson(call, name, tags, problem ? &*problem : nullptr);
+  } else if (tags != nullptr && !output) {
     writeTagsAsTable(call.output, *tags, call.style, Extent::whole);
   }
 }
@@ -164,8 +188,9 @@ const Verb stillVerb = {
         "Times come from when the file was created, if its file system remembers that; model\n"
         "and firmware from the texts in the file, by the tables of cameras; the field of view\n"
         "from the focal length. With --output the tags go into a clip, all but the field of\n"
-        "view, for which streams have no tag. A file that is there is replaced, whole or not at\n"
-        "all. Tags that would not read back are refused; --allow CODE lets them through.\n",
+        "view, for which streams have no tag: a warning says so, unless unknown-tag is allowed. A\n"
+        "file that is there is replaced, whole or not at all. Other tags that would not read back\n"
+        "are refused; --allow CODE lets them through.\n",
     .flags = flags,
     .fewestWords = 1,
     .mostWords = 1,

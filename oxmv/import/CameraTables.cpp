@@ -105,8 +105,8 @@ std::optional<Problem> readTable(const Dictionary& document, const std::string& 
                                  std::array<Row, count>& rows, Row (*read)(RowReader&)) {
   const Array table = document[name].array();
   if (table.size() != count)
-    return Problem{name + " has " + std::to_string(table.size()) + " rows, not " +
-                   std::to_string(count)};
+    return Problem{name + " has " + std::to_string(table.size()) +
+                   (table.size() == 1 ? " row, not " : " rows, not ") + std::to_string(count)};
   for (std::size_t i = 0; i < count; ++i) {
     RowReader row(name + ", row " + std::to_string(i + 1), table[i]);
     rows[i] = read(row);

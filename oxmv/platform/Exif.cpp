@@ -76,8 +76,6 @@ ExifProperties readExif(std::span<const std::uint8_t> segment) {
   if (!reduced) return {};
   const std::unique_ptr<ExifData, Unref> data(::exif_data_new());
   if (data == nullptr) throw std::bad_alloc();
-  // Would give entries of a wrong type the right one, and add those that a picture must have.
-  ::exif_data_unset_option(data.get(), EXIF_DATA_OPTION_FOLLOW_SPECIFICATION);
   // A segment is shorter than 64 KiB; of more bytes the library would not look at the rest either.
   constexpr std::size_t most = 0xFFFF;
   ::exif_data_load_data(data.get(), reduced->data(),

@@ -1,6 +1,6 @@
 #include "oxmv/platform/ExifDirectories.h"
 
-#include <algorithm>
+#include <array>
 #include <cstddef>
 #include <utility>
 
@@ -9,21 +9,55 @@
 namespace oxmv {
 namespace {
 
-using Bytes = std::span<std::uint8_t>;
+using Bytes = std::span<const std::uint8_t>;
 
 // file      := ("II" | "MM")  42:u16  first directory's offset:u32 ...    -- offsets count from here
 // directory := count:u16  entry[count]  next directory's offset:u32
-// entry     := tag:u16  type:u16  count:u32  value or its offset:u32
+// entry     := tag:u16  type:u16  count:u32  value, or its offset:u32 if it has more than 4 bytes
 constexpr std::size_t headerSize = 8;
 constexpr std::size_t entrySize = 12;
-constexpr std::uint8_t unknownTagByte = 0xFF;  // of a tag, both
+constexpr std::size_t entryHeadSize = 8;
+constexpr std::size_t directorySize(std::size_t entries) { return 2 + entries * entrySize + 4; }
 
-// The bytes behind the mark, in their own order. Offsets must be inside.
-class Words {
+// Of one value, by its type: BYTE, ASCII, SHORT, LONG, RATIONAL, and so on (TIFF 6.0, section 2).
+constexpr auto typeSizes = std::to_array<std::size_t>({0, 1, 1, 2, 4, 8, 1, 1, 2, 4, 8, 4, 8});
+
+struct Entry {
+  Bytes head;   // tag, type and count
+  Bytes value;  // not empty
+};
+
+// The directories behind the mark. Reads within the bytes only; there must be a header.
+class Directories {
  public:
-  explicit Words(Bytes bytes) : bytes_(bytes), isLittle_(bytes[0] == 'I') {}
+  explicit Directories(Bytes bytes) : bytes_(bytes), isLittle_(bytes[0] == 'I') {}
 
-  std::size_t size() const { return bytes_.size(); }
+  bool isLittle() const { return isLittle_; }
+  std::size_t first() const { return word32(4); }
+
+  // Of several the first one with a value that is there.
+  std::optional<Entry> find(std::size_t directory, ExifTagNumber tag) const {
+    std::optional<Entry> found;
+    findAt(directory, tag, [&](std::size_t at) {
+      const Bytes value = valueAt(at);
+      if (!value.empty()) found = Entry{bytes_.subspan(at, entryHeadSize), value};
+      return found.has_value();
+    });
+    return found;
+  }
+
+  // What an entry names, of whatever type it says to be. Of several the first one that is there.
+  std::optional<std::size_t> findDirectory(std::size_t directory, ExifTagNumber tag) const {
+    std::optional<std::size_t> found;
+    findAt(directory, tag, [&](std::size_t at) {
+      const std::size_t offset = word32(at + entryHeadSize);
+      if (isInside(offset, 2)) found = offset;
+      return found.has_value();
+    });
+    return found;
+  }
+
+ private:
   std::uint16_t word16(std::size_t at) const {
     const std::size_t low = isLittle_ ? at : at + 1;
     const std::size_t high = isLittle_ ? at + 1 : at;
@@ -34,85 +68,125 @@ class Words {
     const std::uint32_t high = word16(isLittle_ ? at + 2 : at);
     return high << 16 | low;
   }
-  // Answers whether that changed anything.
-  bool fill(std::size_t at, std::size_t count, std::uint8_t byte) {
-    const Bytes bytes = bytes_.subspan(at, count);
-    const bool isChange =
-        std::any_of(bytes.begin(), bytes.end(), [&](std::uint8_t old) { return old != byte; });
-    std::fill(bytes.begin(), bytes.end(), byte);
-    return isChange;
+  bool isInside(std::size_t offset, std::uint64_t size) const {
+    return offset <= bytes_.size() && size <= bytes_.size() - offset;
   }
 
- private:
+  // Offers the entries with that tag until one is taken. A directory may claim more than there are.
+  template <class Take>
+  void findAt(std::size_t directory, ExifTagNumber tag, Take take) const {
+    if (!isInside(directory, 2)) return;
+    std::size_t at = directory + 2;
+    for (std::size_t left = word16(directory); left > 0 && isInside(at, entrySize); --left) {
+      if (ExifTagNumber{word16(at)} == tag && take(at)) return;
+      at += entrySize;
+    }
+  }
+
+  // Empty if some of it is not there.
+  Bytes valueAt(std::size_t entry) const {
+    const std::size_t type = word16(entry + 2);
+    if (type >= typeSizes.size()) return {};
+    const std::uint64_t size = std::uint64_t{typeSizes[type]} * word32(entry + 4);
+    const std::size_t place = entry + entryHeadSize;
+    const std::size_t offset = size <= 4 ? place : word32(place);
+    return isInside(offset, size) ? bytes_.subspan(offset, size) : Bytes();
+  }
+
   Bytes bytes_;
   bool isLittle_;
 };
 
-// Takes entries out of one directory and cuts it off from the next one.
-class Directory {
+// Behind its directory; an offset is even.
+std::size_t roomFor(Bytes value) { return value.size() <= 4 ? 0 : (value.size() + 1) / 2 * 2; }
+
+// Writes directories one after the other, each with the values behind it that it has no room for.
+class SegmentWriter {
  public:
-  Directory(Words& words, std::size_t offset) : words_(words) {
-    if (words.size() < 2 || offset > words.size() - 2) return;
-    count_ = words.word16(offset);
-    first_ = offset + 2;
+  // `head`: the bytes up to the offset of the first directory, which will follow.
+  SegmentWriter(Bytes head, bool isLittle) : isLittle_(isLittle) {
+    bytes(head);
+    word32(headerSize);
   }
 
-  // Every entry but those that `isKept` knows by tag and value. Answers whether that changed
-  // anything.
-  template <class IsKept>
-  bool reduce(IsKept isKept) {
-    if (first_ == 0) return false;
-    const std::size_t rest = words_.size() - first_;
-    bool isChange = false;
-    for (std::size_t i = 0; i < std::min(count_, rest / entrySize); ++i) {
-      const std::size_t entry = first_ + i * entrySize;
-      if (!isKept(ExifTagNumber{words_.word16(entry)}, words_.word32(entry + 8)))
-        isChange |= words_.fill(entry, 2, unknownTagByte);
-    }
-    if (rest >= 4 && count_ <= (rest - 4) / entrySize)
-      isChange |= words_.fill(first_ + count_ * entrySize, 4, 0);
-    return isChange;
+  void beginDirectory(std::size_t entries) {
+    valuesOffset_ = bytes_.size() - exifMark.size() + directorySize(entries);
+    word16(entries);
   }
+  void entry(const Entry& entry) {
+    bytes(entry.head);
+    if (entry.value.size() <= 4) {
+      bytes(entry.value);
+      bytes_.resize(bytes_.size() + 4 - entry.value.size());
+    } else {
+      word32(valuesOffset_ + values_.size());
+      values_.insert(values_.end(), entry.value.begin(), entry.value.end());
+      values_.resize(values_.size() + roomFor(entry.value) - entry.value.size());
+    }
+  }
+  void entry(ExifTagNumber tag, std::size_t directoryOffset) {
+    constexpr std::size_t typeLong = 4;
+    word16(static_cast<std::size_t>(tag));
+    word16(typeLong);
+    word32(1);
+    word32(directoryOffset);
+  }
+  void endDirectory() {
+    word32(0);  // no further one
+    bytes(values_);
+    values_.clear();
+  }
+
+  std::vector<std::uint8_t> finish() { return std::move(bytes_); }
 
  private:
-  Words& words_;
-  std::size_t first_ = 0;  // entry; 0: there is no directory
-  std::size_t count_ = 0;  // of entries, as it says
-};
+  void bytes(Bytes bytes) { bytes_.insert(bytes_.end(), bytes.begin(), bytes.end()); }
+  void word16(std::size_t word) { put(word, 2); }
+  void word32(std::size_t word) { put(word, 4); }
+  void put(std::size_t word, std::size_t width) {
+    for (std::size_t i = 0; i < width; ++i)
+      bytes_.push_back(static_cast<std::uint8_t>(word >> 8 * (isLittle_ ? i : width - 1 - i)));
+  }
 
-// Of several entries with the same tag the first one stays, as readers have it.
-bool reduce(Words words) {
-  const std::size_t first = words.word32(4);
-  std::optional<std::size_t> second;
-  bool hasModel = false;
-  bool hasSoftware = false;
-  bool isChange = Directory(words, first).reduce([&](ExifTagNumber tag, std::uint32_t value) {
-    if (tag == ExifTagNumber::model) return !std::exchange(hasModel, true);
-    if (tag == ExifTagNumber::software) return !std::exchange(hasSoftware, true);
-    if (tag != ExifTagNumber::exifDirectory || second || value == first) return false;
-    second = value;
-    return true;
-  });
-  if (!second) return isChange;
-  bool hasFocalLength = false;
-  isChange |= Directory(words, *second).reduce([&](ExifTagNumber tag, std::uint32_t) {
-    return tag == ExifTagNumber::focalLength && !std::exchange(hasFocalLength, true);
-  });
-  return isChange;
-}
+  bool isLittle_;
+  std::size_t valuesOffset_ = 0;  // of the directory that has begun
+  std::vector<std::uint8_t> bytes_;
+  std::vector<std::uint8_t> values_;
+};
 
 }  // namespace
 
 std::optional<std::vector<std::uint8_t>> reducedExif(std::span<const std::uint8_t> segment) {
   if (segment.size() < exifMark.size() + headerSize) return std::nullopt;
-  std::vector<std::uint8_t> copy(segment.begin(), segment.end());
-  const Bytes bytes = Bytes(copy).subspan(exifMark.size());
+  const Bytes bytes = segment.subspan(exifMark.size());
   if (bytes[0] != bytes[1] || (bytes[0] != 'I' && bytes[0] != 'M')) return std::nullopt;
-  // What is written into one of two directories that overlap also changes the other. If that made
-  // anything of it that would have to go as well, the copy is not to be trusted.
-  reduce(Words(bytes));
-  if (reduce(Words(bytes))) return std::nullopt;
-  return copy;
+
+  const Directories directories(bytes);
+  std::vector<Entry> image;
+  for (const auto tag : {ExifTagNumber::model, ExifTagNumber::software}) {
+    if (const auto entry = directories.find(directories.first(), tag)) image.push_back(*entry);
+  }
+  std::optional<Entry> focalLength;
+  if (const auto exif =
+          directories.findDirectory(directories.first(), ExifTagNumber::exifDirectory))
+    focalLength = directories.find(*exif, ExifTagNumber::focalLength);
+
+  const std::size_t imageEntries = image.size() + (focalLength ? 1 : 0);
+  std::size_t exifOffset = headerSize + directorySize(imageEntries);
+  for (const Entry& entry : image) exifOffset += roomFor(entry.value);
+
+  // Whoever reads it judges the number 42.
+  SegmentWriter writer(segment.first(exifMark.size() + 4), directories.isLittle());
+  writer.beginDirectory(imageEntries);
+  for (const Entry& entry : image) writer.entry(entry);
+  if (focalLength) writer.entry(ExifTagNumber::exifDirectory, exifOffset);
+  writer.endDirectory();
+  if (focalLength) {
+    writer.beginDirectory(1);
+    writer.entry(*focalLength);
+    writer.endDirectory();
+  }
+  return writer.finish();
 }
 
 }  // namespace oxmv

@@ -33,18 +33,18 @@ const std::string undated =
     "oxmv: warning: standard input: it is not known when it was created; without STIM, SDAT and"
     " TIMC (no-creation-date)\n";
 const std::string notStored =
-    "oxmv: warning: standard input: the field of view (FOV) is not stored: streams have no tag for"
-    " it (unknown-tag)\n";
+    "oxmv: warning: standard input: the field of view, FOV 87 (W), is not stored: streams have no"
+    " tag for it (unknown-tag)\n";
 
 TEST(Still, ShowsItsTagsAsATable) {
   const Outcome outcome = still(exampleStill(), {"--reel", "A001"});
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_EQ(outcome.out,
-            "TIMB          Timecode Base  30\n"
-            "REEL          Reel name      A001\n"
-            "CMDL                         QX Gamma\n"
-            "FOV (+1 NUL)                 87\n"
-            "FIRM                         QX3.01.02.00\n");
+            "TIMB          Timecode Base                30\n"
+            "REEL          Reel name                    A001\n"
+            "CMDL                                       QX Gamma\n"
+            "FOV (+1 NUL)  Field of view, not in clips  87\n"
+            "FIRM                                       QX3.01.02.00\n");
   EXPECT_EQ(outcome.err, undated);
 }
 
@@ -90,6 +90,41 @@ TEST(Still, GivesJsonBesideTheClip) {
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_EQ(outcome.out, still(exampleStill(), {"-q", "--json"}).out);
   EXPECT_TRUE(std::filesystem::exists(folder / "clip.colr"));
+}
+
+TEST(Still, SaysInJsonWhyThereIsNoClip) {
+  const TempDir folder;
+  const Outcome refused =
+      still(exampleStill(), {"-q", "--ndjson", "--reel", "Café", "-o", folder / "clip.colr"});
+  EXPECT_EQ(refused.exitCode, 4);
+  EXPECT_NE(refused.out.find(R"("FIRM":"QX3.01.02.00"},"error":{"code":"text-nonascii","message":)"
+                             R"("REEL \"Café\" would be written as zeros: only ASCII is stored;)"
+                             R"( nothing written"}})"),
+            std::string::npos)
+      << refused.out;
+  EXPECT_FALSE(std::filesystem::exists(folder / "clip.colr"));
+
+  const std::string nowhere = (folder / "none/clip.colr").string();
+  const Outcome failed = still(exampleStill(), {"-q", "--ndjson", "-o", nowhere});
+  EXPECT_EQ(failed.exitCode, 3);
+  EXPECT_EQ(
+      failed.out,
+      R"({"schema":"oxmv.still/1","file":"-","tags":{"TIMB":30,"CMDL":"QX Gamma",)"
+      R"("FOV\u0000":[87],"FIRM":"QX3.01.02.00"},"error":{"code":"write-failed","message":")" +
+          nowhere + ": No such file or directory\"}}\n");
+}
+
+TEST(Still, KeepsQuietAboutTheFieldOfViewWhenItMayBeLost) {
+  const TempDir folder;
+  const std::string clip = (folder / "clip.colr").string();
+  EXPECT_EQ(still(exampleStill(), {"-o", clip, "--allow", "unknown-tag"}).err, undated);
+  std::filesystem::copy_file(example, folder / "still.jpg");
+  const std::string file = (folder / "still.jpg").string();
+  // Some file systems do not know when a file was created, which is a warning as well.
+  const bool isDated = run({"still", file, "--strict"}).exitCode == 0;
+  EXPECT_EQ(run({"still", file, "-q", "--strict", "-o", clip}).exitCode, 1);
+  EXPECT_EQ(run({"still", file, "-q", "--strict", "-o", clip, "--allow", "unknown-tag"}).exitCode,
+            isDated ? 0 : 1);
 }
 
 TEST(Still, ReplacesAFileWholeOrNotAtAll) {

@@ -22,6 +22,7 @@ std::size_t faultyCall = 0;
 Fault currentFault{};
 std::string_view faulty;
 std::vector<SystemCall> made;
+bool hasNoCreationTimes = false;
 
 // The function of that name in the C library.
 template <class Function>
@@ -73,6 +74,8 @@ std::size_t disarmFault() {
 std::vector<SystemCall> systemCalls() { return made; }
 
 std::string faultyFunction() { return std::string(faulty); }
+
+void hideCreationTimes(bool areHidden) { hasNoCreationTimes = areHidden; }
 
 }  // namespace oxmv::test
 
@@ -142,6 +145,13 @@ int fstat(int file, struct stat* status) noexcept {
 int lstat(const char* path, struct stat* status) noexcept {
   static auto* const next = original<int(const char*, struct stat*)>("lstat");
   return pass("lstat", [&] { return next(path, status); });
+}
+
+int statx(int folder, const char* path, int flags, unsigned mask, struct statx* status) noexcept {
+  static auto* const next = original<int(int, const char*, int, unsigned, struct statx*)>("statx");
+  const int result = next(folder, path, flags, mask, status);
+  if (oxmv::test::hasNoCreationTimes) status->stx_mask &= ~STATX_BTIME;
+  return result;
 }
 
 int fchown(int file, uid_t owner, gid_t group) noexcept {

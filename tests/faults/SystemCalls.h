@@ -40,4 +40,7 @@ std::vector<SystemCall> systemCalls();
 std::size_t disarmFault();
 std::string faultyFunction();
 
+// Whether files tell when they were created; some file systems do not remember it.
+void hideCreationTimes(bool areHidden);
+
 }  // namespace oxmv::test

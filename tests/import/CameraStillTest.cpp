@@ -210,6 +210,21 @@ TEST_F(CameraStill, FocalLengthGivesTheFieldOfView) {
     EXPECT_EQ(of(narrow), (Dictionary{{fieldOfViewKey, fieldOfView(78)}})) << narrow;
 }
 
+// As a fraction of hundredths of a millimetre.
+TEST_F(CameraStill, FractionsOfAMillimetreDecideTheFieldOfView) {
+  for (const ByteOrder order : {ByteOrder::little, ByteOrder::big}) {
+    const auto of = [&](std::uint32_t hundredths) {
+      Exif exif(order);
+      exif.exifEntry(Exif::focalLengthTag, Exif::rationalType, 1, exif.words({hundredths, 100}, 4));
+      return cameraTagsOf(anothers().exif(exif));
+    };
+    EXPECT_EQ(of(1815), (Dictionary{{fieldOfViewKey, fieldOfView(87)}}));
+    EXPECT_EQ(of(1816), (Dictionary{{fieldOfViewKey, fieldOfView(77)}}));
+    EXPECT_EQ(of(3089), (Dictionary{{fieldOfViewKey, fieldOfView(77)}}));
+    EXPECT_EQ(of(3090), (Dictionary{{fieldOfViewKey, fieldOfView(78)}}));
+  }
+}
+
 TEST_F(CameraStill, NoFieldOfViewComesOfAFocalLengthOfNoUse) {
   const auto of = [&](std::uint16_t type, const std::vector<std::uint32_t>& words) {
     Exif exif;
@@ -230,6 +245,12 @@ TEST_F(CameraStill, KeepsTheLineInTheLog) {
   tagsOf(makers().exif(Exif().software("QX1.02")).bytes());
   EXPECT_TRUE(host_->logLines.empty());
   tagsOf(makers().exif(Exif().focalLength(35)).bytes());
+  EXPECT_EQ(host_->logLines, (Names{"FOV SET, BABY!!!!!"}));
+}
+
+TEST_F(CameraStill, ItsLineIsWrittenBeforeTheFirmwareTextIsFoundTooShort) {
+  EXPECT_THROW(tagsOf(anothers().exif(Exif().software("QX").focalLength(35)).bytes()),
+               std::out_of_range);
   EXPECT_EQ(host_->logLines, (Names{"FOV SET, BABY!!!!!"}));
 }
 

@@ -91,7 +91,7 @@ TEST(CameraTables, ATableWithOtherRowsIsRefused) {
   EXPECT_EQ(problemOf(""), "short-prefixes has 0 rows, not 2");
   EXPECT_EQ(problemOf("short-prefixes = 2"), "short-prefixes has 0 rows, not 2");
   EXPECT_EQ(problemOf(with("  {prefix = \"QX2\", name = \"QX Beta\"},\n", "")),
-            "short-prefixes has 1 rows, not 2");
+            "short-prefixes has 1 row, not 2");
   EXPECT_EQ(problemOf(with("  {prefix = \"QZ1.01\", name = \"QZ Lambda\"},\n", "")),
             "long-prefixes has 13 rows, not 14");
   EXPECT_EQ(
@@ -106,6 +106,10 @@ TEST(CameraTables, ARowOfTheWrongShapeIsNamed) {
             "long-prefixes, row 2: prefix is missing, or is no text");
   EXPECT_EQ(problemOf(with("prefix = \"QX3.02\"", "prefix = 3.02")),
             "long-prefixes, row 2: prefix is missing, or is no text");
+  for (const char* noText : {"true", "false", "1979-05-27", "1979-05-27T07:32:00Z", "07:32:00"}) {
+    EXPECT_EQ(problemOf(with("name = \"QX Delta\"", std::string("name = ") + noText)),
+              "long-prefixes, row 3: name is missing, or is no text");
+  }
   EXPECT_EQ(problemOf(with("name = \"QX Delta\"", "name = \"\"")),
             "long-prefixes, row 3: name is missing, or is no text");
   EXPECT_EQ(problemOf(with("name = \"QX Delta\"", "name = \"QX Delta\", note = \"\"")),

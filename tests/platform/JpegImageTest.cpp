@@ -43,6 +43,21 @@ TEST(JpegImage, HeadersThatAreCutAreNone) {
   }
 }
 
+// Of three components, one with three times as many columns and one with twice as many rows as the
+// others: the library has no name for it, but decodes it.
+TEST(JpegImage, UnusualSamplingIsOneAllTheSame) {
+  Bytes bytes = picture();
+  const auto replaceSegment = [&](const Bytes& segment) {
+    const auto at = std::search(bytes.begin(), bytes.end(), segment.begin(), segment.begin() + 2);
+    ASSERT_NE(at, bytes.end());
+    const auto end = at + 2 + (at[2] << 8 | at[3]);
+    bytes.insert(bytes.erase(at, end), segment.begin(), segment.end());
+  };
+  replaceSegment({0xFF, 0xC0, 0, 17, 8, 0, 48, 0, 64, 3, 1, 0x31, 0, 2, 0x11, 0, 3, 0x12, 0});
+  replaceSegment({0xFF, 0xDA, 0, 12, 3, 1, 0, 2, 0, 3, 0, 0, 63, 0});
+  EXPECT_TRUE(isJpegImage(bytes));
+}
+
 // The pixels are nobody's business here.
 TEST(JpegImage, PixelsThatAreCutDoNotMatter) {
   Bytes bytes = picture();

@@ -113,9 +113,9 @@ Bytes ExifBuilder::words(const std::vector<std::uint32_t>& words, std::size_t wi
 Bytes ExifBuilder::directory(std::vector<Entry> entries, std::size_t offset) const {
   std::stable_sort(entries.begin(), entries.end(),
                    [](const Entry& a, const Entry& b) { return a.tag < b.tag; });
-  Bytes bytes = words({static_cast<std::uint32_t>(entries.size())}, 2);
+  Bytes bytes = words({static_cast<std::uint32_t>(entries.size()) + surplus_}, 2);
   Bytes values;
-  const std::size_t valuesOffset = offset + 2 + entries.size() * 12 + 4;
+  const std::size_t valuesOffset = offset + 2 + entries.size() * 12 + (hasLinks_ ? 4 : 0);
   for (const Entry& entry : entries) {
     append(bytes, words({entry.tag, entry.type}, 2));
     append(bytes, words({entry.count}, 4));
@@ -128,7 +128,7 @@ Bytes ExifBuilder::directory(std::vector<Entry> entries, std::size_t offset) con
       if (values.size() % 2 != 0) values.push_back(0);
     }
   }
-  append(bytes, words({0}, 4));
+  if (hasLinks_) append(bytes, words({0}, 4));
   append(bytes, values);
   return bytes;
 }

@@ -47,6 +47,11 @@ class ExifBuilder {
   ExifBuilder& exifEntry(std::uint16_t tag, std::uint16_t type, std::uint32_t count, Bytes value);
   Bytes words(const std::vector<std::uint32_t>& words, std::size_t width) const;
 
+  // What careless writers do: no offset of a next directory stands behind the entries, of either
+  // directory; each says to have so many entries more than it has.
+  ExifBuilder& withoutLinks() { return hasLinks_ = false, *this; }
+  ExifBuilder& withSurplusCount(std::uint16_t surplus) { return surplus_ = surplus, *this; }
+
   Bytes bytes() const;
 
  private:
@@ -61,6 +66,8 @@ class ExifBuilder {
   Bytes directory(std::vector<Entry> entries, std::size_t offset) const;
 
   ByteOrder order_;
+  bool hasLinks_ = true;
+  std::uint16_t surplus_ = 0;
   std::vector<Entry> image_;
   std::vector<Entry> exif_;
 };
