@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <optional>
 
 #include "oxmv/metadata/TagStreamFormat.h"
@@ -75,9 +76,14 @@ bool isList(Read rule) {
          rule == Read::controlPoint;
 }
 
-bool isMarker(const std::uint8_t* bytes) {
-  return bytes[0] == markerBytes[0] && bytes[1] == markerBytes[1];
+// Whether the first bytes of a record are those of a marker.
+bool isMarker(Tag tag) {
+  constexpr auto marker = static_cast<std::uint32_t>(tagOf({markerBytes[0], markerBytes[1], 0, 0}));
+  return (static_cast<std::uint32_t>(tag) & 0xFFFF) == marker;
 }
+
+// A dictionary has at most an entry for each row, whose index is its id, and that of a control point.
+static_assert(BlockBuilder::mostEntries >= detail::noRow);
 
 std::uint8_t indexOf(const TagRow& row) {
   return static_cast<std::uint8_t>(&row - tagRows().data());
@@ -152,7 +158,7 @@ class Decoder {
     giveUp(names.reg, stream, level);
   }
 
-  // The same, with nobody listening, for as long as each record is whole, at least 12 bytes are
+  // The same with nobody listening, for as long as each record is whole, at least 12 bytes are
   // there and no length wraps: what a clip's stream is from beginning to end. Answers how many bytes
   // it has taken, all of them or up to a record or marker that the walk has to look at.
   std::int64_t readWholeRecords(Extent stream, std::int64_t length, int level,
@@ -172,7 +178,7 @@ class Decoder {
       const detail::PlainRule& rule = detail::plainRules[row];
       if (rule.tag == tag && size - rule.least <= rule.range) {
         builder_.put(row, keyOf(tag), plainSlot(rule, size, at + recordHeaderSize));
-      } else if (size > longestRecord || (at != stream.begin && isMarker(header))) {
+      } else if (size > longestRecord || (at != stream.begin && isMarker(tag))) {
         break;
       } else if (rule.tag == tag && !readText(row, size, at + recordHeaderSize, names)) {
         interpret(recordAt(stream, at, level), stream, names);
@@ -207,8 +213,22 @@ class Decoder {
         if (type == recordType::integerL) return false;
         putNamed("REG "_tag, names.reg, text);
         return true;
-      default: return false;
+      case Read::none:
+      case Read::text:
+      case Read::int32:
+      case Read::uint8:
+      case Read::uint16:
+      case Read::float32:
+      case Read::floats:
+      case Read::integers:
+      case Read::data:
+      case Read::guid:
+      case Read::nested:
+      case Read::ints:
+      case Read::nestedList:
+      case Read::controlPoint: break;
     }
+    return false;
   }
 
   static std::size_t bytesLeft(Extent stream, std::size_t at) {
@@ -219,7 +239,7 @@ class Decoder {
   // cut off.
   bool stepOverMarker(Extent stream, std::size_t& at, std::int64_t& limit, int level) {
     const std::size_t left = bytesLeft(stream, at);
-    if (left < 2 || !isMarker(&bytes_[at])) return true;
+    if (left < 2 || bytes_[at] != markerBytes[0] || bytes_[at + 1] != markerBytes[1]) return true;
     if (left < markerSize) {
       stop(stream, at, level, SkipReason::cutMarker, nullptr);
       return false;
@@ -311,8 +331,15 @@ class Decoder {
 
   // A text without the NULs at its end.
   Slot withoutPadding(Slot text) const {
+    const std::uint8_t* const bytes = bytes_.data() + text.body;
     std::uint32_t size = text.size();
-    while (size > 0 && bytes_[text.body + size - 1] == 0) --size;
+    // By the word: names end with 0 to 3 of them, which no processor foresees.
+    while (size >= 4) {
+      const std::uint32_t last = loadLe32(bytes + size - 4);
+      size -= static_cast<std::uint32_t>(std::countl_zero(last)) / 8;
+      if (last != 0) break;
+    }
+    while (size > 0 && bytes[size - 1] == 0) --size;
     return Slot::place(Form::text, size, text.body);
   }
 

@@ -84,55 +84,63 @@ void BlockBuilder::putGroups() {
     const std::uint32_t place = named_[i].place;
     Slot& group = open_.slots[place - 1];
     if (group.form() != Form::nothing) continue;  // put with its first entry
-    group_.shrink(0);
-    for (const Named& entry : named_.from(i)) {
-      if (entry.place == place) group_.push(entry);
+    const std::span<const Named> entries = named_.from(i);
+    if (entries.size() <= searchedInLine) {
+      mergeFew(entries, place);
+    } else {
+      mergeMany(entries, place);
     }
     group = putGroup();
   }
 }
 
 Slot BlockBuilder::putGroup() {
-  if (group_.size() <= searchedInLine) {
-    mergeFew();
-  } else {
-    mergeMany();
-  }
-  const std::size_t count = group_.size();
-  const bool isSorted = count > searchedInLine;
-  const Slot dictionary = putHeader(Form::dictionary, count, isSorted);
-  for (const Named& entry : group_.from(0)) slots_.push(entry.value);
-  for (const Named& entry : group_.from(0)) keys_.push(keyOf(entry.name));
+  const std::span<const Named> entries = group_.from(0);
+  const bool isSorted = entries.size() > searchedInLine;
+  const Slot dictionary = putHeader(Form::dictionary, entries.size(), isSorted);
+  Slot* value = slots_.extend(entries.size());
+  for (const Named& entry : entries) *value++ = entry.value;
+  Key* key = keys_.extend(entries.size());
+  for (const Named& entry : entries) *key++ = keyOf(entry.name);
   if (isSorted) putOrder(Header::of(slots_[dictionary.body]));
   return dictionary;
 }
 
 // Leaves in group_ one entry a name, in the order in which the names first came, each with its last
 // value.
-void BlockBuilder::mergeFew() {
-  std::uint64_t seen = 0;  // a bit for some names each; names whose bit is new are
-  std::size_t kept = 0;
-  for (const Named& entry : group_.from(0)) {
+void BlockBuilder::mergeFew(std::span<const Named> entries, std::uint32_t place) {
+  std::uint64_t seen = 0;  // a bit for some names each: a name whose bit is new is new
+  group_.shrink(0);
+  for (const Named& entry : entries) {
+    if (entry.place != place) continue;
     const std::string_view name = textOf(entry.name);
     const auto last = static_cast<std::uint8_t>(name.empty() ? '\0' : name.back());
     const std::uint64_t bit = std::uint64_t{1} << (name.size() * 29 + last) % 64;
-    Named* const end = group_.data() + kept;
-    Named* same = end;
-    if ((seen & bit) != 0)
-      same = std::find_if(group_.data(), end,
-                          [&](const Named& other) { return textOf(other.name) == name; });
+    Named* same = nullptr;
+    if ((seen & bit) != 0) same = findNamed(name);
     seen |= bit;
-    if (same != end) {
+    if (same != nullptr) {
       same->value = entry.value;
     } else {
-      group_[kept++] = entry;
+      group_.push(entry);
     }
   }
-  group_.shrink(kept);
+}
+
+// The entry in group_; null when there is none.
+BlockBuilder::Named* BlockBuilder::findNamed(std::string_view name) {
+  for (Named& entry : group_.from(0)) {
+    if (textOf(entry.name) == name) return &entry;
+  }
+  return nullptr;
 }
 
 // The same by sorting, which no choice of names makes slow.
-void BlockBuilder::mergeMany() {
+void BlockBuilder::mergeMany(std::span<const Named> all, std::uint32_t place) {
+  group_.shrink(0);
+  for (const Named& entry : all) {
+    if (entry.place == place) group_.push(entry);
+  }
   const std::span<Named> entries = group_.from(0);
   std::sort(entries.begin(), entries.end(), [&](const Named& a, const Named& b) {
     const auto order = textOf(a.name) <=> textOf(b.name);

@@ -92,16 +92,25 @@ class BlockBuilder {
   Slot close(const Open& outer);
 
   // The value of a key. Of several the last one counts, in the place of the first.
-  void put(Id id, Key key, Slot value) { slotOf(id, key) = value; }
+  void put(Id id, Key key, Slot value) {
+    std::uint8_t& place = open_.placeOfId[id];
+    if (place == 0) {
+      putOnce(key, value);
+      place = static_cast<std::uint8_t>(open_.count);
+    } else {
+      open_.slots[place - 1u] = value;
+    }
+  }
   // One more element of the list that is the key's value.
   void append(Id id, Key key, Slot element) {
-    ++slotOf(id, key).body;
-    elements_.push({element, open_.placeOfId[id]});
+    const std::uint32_t place = gatheredAt(id, key);
+    ++open_.slots[place - 1].body;
+    elements_.push({element, place});
   }
   // An entry of the group that is the key's value. `name` is in UTF-8.
   void putNamed(Id id, Key key, Slot name, Slot value) {
-    slotOf(id, key);
-    named_.push({name, value, named_.size(), open_.placeOfId[id]});
+    const auto index = static_cast<std::uint32_t>(named_.size());
+    named_.push({name, value, index, gatheredAt(id, key)});
   }
   // An entry under a key that no id stands for.
   void putOnce(Key key, Slot value) {
@@ -127,18 +136,14 @@ class BlockBuilder {
   };
   struct Named {
     Slot name, value;
-    std::size_t index;  // in named_
+    std::uint32_t index;  // in named_
     std::uint32_t place;
   };
 
-  // The slot of a key's value; that of a new key is all zeros.
-  Slot& slotOf(Id id, Key key) {
-    std::uint8_t& place = open_.placeOfId[id];
-    if (place == 0) {
-      putOnce(key, {});
-      place = static_cast<std::uint8_t>(open_.count);
-    }
-    return open_.slots[place - 1u];
+  // Where the entry of a list or group stands. Its slot is no value until the dictionary is closed.
+  std::uint32_t gatheredAt(Id id, Key key) {
+    if (open_.placeOfId[id] == 0) put(id, key, {});
+    return open_.placeOfId[id];
   }
 
   void findOpen();
@@ -146,8 +151,9 @@ class BlockBuilder {
   void putLists();
   void putGroups();
   Slot putGroup();
-  void mergeFew();
-  void mergeMany();
+  void mergeFew(std::span<const Named> entries, std::uint32_t place);
+  void mergeMany(std::span<const Named> entries, std::uint32_t place);
+  Named* findNamed(std::string_view name);
   void putOrder(Header dictionary);
   std::string_view textOf(Slot place) const;
 
