@@ -3,6 +3,7 @@
 #pragma once
 
 #include <array>
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <string_view>
@@ -21,6 +22,9 @@ constexpr Tag tagOf(std::array<std::uint8_t, 4> bytes) {
 
 // The characters of a tag, in reading order; they need not be ASCII.
 constexpr std::array<char, 4> charactersOf(Tag tag) {
+  // What the loop gives here, which compilers do not see.
+  if constexpr (std::endian::native == std::endian::little)
+    return std::bit_cast<std::array<char, 4>>(tag);
   std::array<char, 4> characters{};
   for (std::size_t i = 0; i < 4; ++i)
     characters[i] = static_cast<char>(static_cast<std::uint32_t>(tag) >> (8 * i) & 0xFF);

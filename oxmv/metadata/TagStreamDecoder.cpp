@@ -2,21 +2,18 @@
 
 #include <algorithm>
 #include <array>
-#include <memory_resource>
-#include <new>
+#include <bit>
 #include <optional>
-#include <string>
-#include <vector>
 
 #include "oxmv/metadata/TagStreamFormat.h"
+#include "oxmv/values/BlockBuilder.h"
 #include "oxmv/values/LittleEndian.h"
-#include "oxmv/values/Text.h"
 
 namespace oxmv {
 
 using detail::Block;
+using detail::BlockBuilder;
 using detail::Form;
-using detail::Header;
 using detail::Key;
 using detail::Slot;
 
@@ -36,25 +33,18 @@ struct Place {
       available;  // bytes from there to the end of the stream, its own payload and what follows
 };
 
-// The names that wait for their values: each walk has its own.
+// A name that waits for its value, and where its record stands.
+struct PendingName {
+  std::optional<Slot> name;
+  std::size_t record = 0;
+};
+
+// Each walk has its own.
 struct PendingNames {
-  std::optional<Slot> tag, reg;
-  Record tagRecord, regRecord;  // for the observer
+  PendingName tag, reg;
 };
-
-// Something that a walk has read, not yet put in its place in the dictionary.
-struct Reading {
-  std::uint8_t row;  // index into tagRows()
-  Slot slot;         // in a group: the name; its value is the reading behind it
-};
-
-// Bytes of converted names that a block can hold behind the stream's own: offsets have 32 bits.
-constexpr std::size_t maxExtra = 0x7FFFFFFF;
 
 constexpr std::size_t maxStream = 0x7FFFFFFF;
-
-// With more keys than this a group's keys are followed by their order.
-constexpr std::size_t searchedInLine = 16;
 
 bool takesWholePayload(const Record& record) {
   switch (record.row->read) {
@@ -86,10 +76,22 @@ bool isList(Read rule) {
          rule == Read::controlPoint;
 }
 
-bool isGroup(Write rule) { return rule == Write::tagGroup || rule == Write::regGroup; }
+// Whether the first bytes of a record are those of a marker.
+bool isMarker(Tag tag) {
+  constexpr auto marker = static_cast<std::uint32_t>(tagOf({markerBytes[0], markerBytes[1], 0, 0}));
+  return (static_cast<std::uint32_t>(tag) & 0xFFFF) == marker;
+}
+
+// A dictionary has at most an entry for each row, whose index is its id, and that of a control point.
+static_assert(BlockBuilder::mostEntries >= detail::noRow);
 
 std::uint8_t indexOf(const TagRow& row) {
   return static_cast<std::uint8_t>(&row - tagRows().data());
+}
+
+Key keyOf(Tag tag) {
+  const std::array<char, 4> characters = charactersOf(tag);
+  return Key::tag({characters.data(), characters.size()});
 }
 
 class Decoder {
@@ -98,39 +100,34 @@ class Decoder {
       : bytes_(bytes.first(std::min(bytes.size(), maxStream))),
         guid_(guid),
         observer_(observer),
-        overlapLeft_(bytes_.size()) {
-    readings_.reserve(192);
-    slots_.reserve(256);
-    keys_.reserve(256);
-  }
+        overlapLeft_(bytes_.size()),
+        builder_(bytes_) {}
 
   Dictionary decode(std::int32_t length) {
     const Slot root = decodeExtent({0, bytes_.size()}, length, 0, nullptr);
-    if (Header::of(slots_[root.body]).count == 0) return {};
-    const auto block = Block::make(bytes_, extra_, slots_, keys_);
-    return Value::in(*block, root).dictionary();
+    if (builder_.isEmpty(root)) return {};
+    return Value::in(*builder_.block(), root).dictionary();
   }
 
  private:
   // One stream: the slot of its dictionary. `controlPoint`, if not null, is one more value in it.
   Slot decodeExtent(Extent stream, std::int64_t length, int level, const Slot* controlPoint) {
-    const std::size_t first = readings_.size();
+    const BlockBuilder::Open outer = builder_.open();
     walk(stream, length, level);
-    const Slot dictionary = putDictionary(first, controlPoint);
-    readings_.erase(readings_.begin() + static_cast<std::ptrdiff_t>(first), readings_.end());
-    return dictionary;
+    if (controlPoint != nullptr) builder_.putOnce(keyOfControlPoint(), *controlPoint);
+    return builder_.close(outer);
   }
 
-  // The walk over the records of one stream; appends what it reads to readings_.
+  // The walk over the records of one stream. The first record is read whatever its size; those
+  // behind it only if they end within the limit.
   void walk(Extent stream, std::int64_t length, int level) {
-    if (length <= 0) return;
     PendingNames names;
-    std::int64_t consumed = 0;  // markers are not counted
     std::int64_t limit = length;
-    std::size_t at = stream.begin;
-    // The first record is read whatever its size; those behind it only if they end within the
-    // limit.
-    for (bool isFirst = true;; isFirst = false) {
+    std::int64_t consumed = 0;  // markers are not counted
+    if (observer_ == nullptr) consumed = readWholeRecords(stream, length, level, names);
+    std::size_t at = stream.begin + static_cast<std::size_t>(consumed);
+    while (consumed < limit) {
+      const bool isFirst = consumed == 0;
       if (!isFirst && !stepOverMarker(stream, at, limit, level)) break;
       if (bytesLeft(stream, at) < recordHeaderSize) {
         stop(stream, at, level, SkipReason::cutHeader, nullptr);
@@ -146,7 +143,7 @@ class Decoder {
         break;
       }
       if (observer_ != nullptr) observer_->onRecord(record);
-      if (!interpret(record, {at + recordHeaderSize, stream.end - at - recordHeaderSize}, names)) {
+      if (!interpret(record, stream, names)) {
         stop(stream, at, level, SkipReason::incompleteRecord, &record);
         break;
       }
@@ -156,10 +153,82 @@ class Decoder {
       }
       consumed += record.length;
       at += record.length;
-      if (consumed >= limit) break;
     }
-    if (names.tag) skip(names.tagRecord, SkipReason::nameWithoutValue);
-    if (names.reg) skip(names.regRecord, SkipReason::nameWithoutValue);
+    giveUp(names.tag, stream, level);
+    giveUp(names.reg, stream, level);
+  }
+
+  // The same with nobody listening, for as long as each record is whole, at least 12 bytes are
+  // there and no length wraps: what a clip's stream is from beginning to end. Answers how many bytes
+  // it has taken, all of them or up to a record or marker that the walk has to look at.
+  std::int64_t readWholeRecords(Extent stream, std::int64_t length, int level,
+                                PendingNames& names) {
+    const std::size_t there = stream.end - stream.begin;
+    const std::size_t end =
+        length < static_cast<std::int64_t>(there)
+            ? stream.begin + static_cast<std::size_t>(std::max<std::int64_t>(length, 0))
+            : stream.end;
+    std::size_t at = stream.begin;
+    while (at + shortestData <= end) {
+      const std::uint8_t* header = bytes_.data() + at;
+      const Tag tag{loadLe32(header)};
+      const std::uint32_t size = loadLe32(header + 4) & maxRecordSize;
+      if (size > end - at - recordHeaderSize) break;
+      const std::uint8_t row = detail::likelyRow(tag);
+      const detail::PlainRule& rule = detail::plainRules[row];
+      if (rule.tag == tag && size - rule.least <= rule.range) {
+        builder_.put(row, keyOf(tag), plainSlot(rule, size, at + recordHeaderSize));
+      } else if (size > longestRecord || (at != stream.begin && isMarker(tag))) {
+        break;
+      } else if (rule.tag == tag && !readText(row, size, at + recordHeaderSize, names)) {
+        interpret(recordAt(stream, at, level), stream, names);
+      }
+      at += recordLength(size);
+    }
+    return static_cast<std::int64_t>(at - stream.begin);
+  }
+
+  Slot plainSlot(const detail::PlainRule& rule, std::uint32_t size, std::size_t payload) const {
+    const std::uint32_t word = loadLe32(bytes_.data() + payload);
+    const auto offset = static_cast<std::uint32_t>(payload);
+    return {static_cast<std::uint32_t>(rule.form) | (size << Slot::formBits & rule.placeMask),
+            (word & rule.numberMask) | (offset & rule.placeMask)};
+  }
+
+  // Of whole records that are not plain, those that come by the dozen: texts of lists, names and
+  // texts of groups. Answers false for any other.
+  bool readText(std::uint8_t row, std::uint32_t size, std::size_t payload, PendingNames& names) {
+    const detail::PlainRule& rule = detail::plainRules[row];
+    const std::uint8_t type = bytes_[payload - 1];
+    const Slot text = Slot::place(Form::text, size, static_cast<std::uint32_t>(payload));
+    switch (rule.read) {
+      case Read::texts: builder_.append(row, keyOf(rule.tag), text); return true;
+      case Read::tagName: names.tag.name = builder_.asUtf8(withoutPadding(text)); return true;
+      case Read::regName: names.reg.name = builder_.asUtf8(text); return true;
+      case Read::tagValue:
+        if (type != recordType::text) return false;
+        putNamed("TAG "_tag, names.tag, withoutPadding(text));
+        return true;
+      case Read::regValue:
+        if (type == recordType::integerL) return false;
+        putNamed("REG "_tag, names.reg, text);
+        return true;
+      case Read::none:
+      case Read::text:
+      case Read::int32:
+      case Read::uint8:
+      case Read::uint16:
+      case Read::float32:
+      case Read::floats:
+      case Read::integers:
+      case Read::data:
+      case Read::guid:
+      case Read::nested:
+      case Read::ints:
+      case Read::nestedList:
+      case Read::controlPoint: break;
+    }
+    return false;
   }
 
   static std::size_t bytesLeft(Extent stream, std::size_t at) {
@@ -211,12 +280,14 @@ class Decoder {
 
   // Reads a record by the rule of its tag. Answers false when it needs bytes that are not there: it
   // is left out, and the walk ends.
-  bool interpret(const Record& record, Place place, PendingNames& names) {
+  bool interpret(const Record& record, Extent stream, PendingNames& names) {
     if (record.row == nullptr || record.row->read == Read::none) {
       skip(record, SkipReason::unknownTag);
       return true;
     }
     if (takesWholePayload(record) && record.payload.size() < record.size) return false;
+    const std::size_t payload = record.offset + recordHeaderSize;
+    const Place place{payload, stream.end - payload};
     switch (record.row->read) {
       case Read::none: break;
       case Read::text: store(record, payloadAs(Form::textToNul, record, place)); break;
@@ -242,10 +313,10 @@ class Decoder {
       case Read::nestedList:
       case Read::controlPoint: interpretNested(record, place); break;
       case Read::tagName:
-        takeName(record, withoutPadding(record, place), names.tag, names.tagRecord);
+        takeName(record, stream, withoutPadding(payloadAs(Form::text, record, place)), names.tag);
         break;
       case Read::regName:
-        takeName(record, payloadAs(Form::text, record, place), names.reg, names.regRecord);
+        takeName(record, stream, payloadAs(Form::text, record, place), names.reg);
         break;
       case Read::tagValue: interpretValue(record, place, "TAG "_tag, names.tag); break;
       case Read::regValue: interpretValue(record, place, "REG "_tag, names.reg); break;
@@ -258,12 +329,18 @@ class Decoder {
                        static_cast<std::uint32_t>(place.payload));
   }
 
-  // The payload as text, without the NULs at its end.
-  static Slot withoutPadding(const Record& record, Place place) {
-    std::size_t size = record.payload.size();
-    while (size > 0 && record.payload[size - 1] == 0) --size;
-    return Slot::place(Form::text, static_cast<std::uint32_t>(size),
-                       static_cast<std::uint32_t>(place.payload));
+  // A text without the NULs at its end.
+  Slot withoutPadding(Slot text) const {
+    const std::uint8_t* const bytes = bytes_.data() + text.body;
+    std::uint32_t size = text.size();
+    // By the word: names end with 0 to 3 of them, which no processor foresees.
+    while (size >= 4) {
+      const std::uint32_t last = loadLe32(bytes + size - 4);
+      size -= static_cast<std::uint32_t>(std::countl_zero(last)) / 8;
+      if (last != 0) break;
+    }
+    while (size > 0 && bytes[size - 1] == 0) --size;
+    return Slot::place(Form::text, size, text.body);
   }
 
   // A number takes its own bytes whatever the record's size, also from behind the payload, while
@@ -303,188 +380,61 @@ class Decoder {
         Slot::place(Form::integers, controlPointSize, static_cast<std::uint32_t>(place.payload));
     const Slot nested =
         decodeExtent(stream, length, record.level + 1, isControlPoint ? &point : nullptr);
-    readings_.push_back({indexOf(*record.row), nested});
+    put(record, nested);
   }
 
   // A name that is still waiting is given up for the new one.
-  void takeName(const Record& record, Slot name, std::optional<Slot>& pending,
-                Record& pendingRecord) {
-    if (pending) skip(pendingRecord, SkipReason::nameWithoutValue);
-    pending = asUtf8(name);
-    pendingRecord = record;
+  void takeName(const Record& record, Extent stream, Slot name, PendingName& pending) {
+    giveUp(pending, stream, record.level);
+    pending = {builder_.asUtf8(name), record.offset};
     announce(record, name);
   }
 
-  void interpretValue(const Record& record, Place place, Tag group, std::optional<Slot>& name) {
-    if (!name) return skip(record, SkipReason::valueWithoutName);
+  void giveUp(const PendingName& pending, Extent stream, int level) {
+    if (observer_ == nullptr || !pending.name) return;
+    skip(recordAt(stream, pending.record, level), SkipReason::nameWithoutValue);
+  }
+
+  void interpretValue(const Record& record, Place place, Tag group, PendingName& pending) {
+    if (!pending.name) return skip(record, SkipReason::valueWithoutName);
     std::optional<Slot> value;
     if (!takesWholePayload(record)) {
       value = readNumber(record, place);
     } else if (record.row->read == Read::tagValue) {
-      value = withoutPadding(record, place);
+      value = withoutPadding(payloadAs(Form::text, record, place));
     } else {
       value = payloadAs(Form::text, record, place);
     }
     if (!value) return;
     announce(record, *value);
-    const std::uint8_t row = indexOf(*findTagRow(group));
-    readings_.push_back({row, *name});
-    readings_.push_back({row, *value});
-    name.reset();
+    putNamed(group, pending, *value);
+  }
+
+  // A value without a name is left out.
+  void putNamed(Tag group, PendingName& pending, Slot value) {
+    if (!pending.name) return;
+    builder_.putNamed(detail::likelyRow(group), keyOf(group), *pending.name, value);
+    pending.name.reset();
   }
 
   void store(const Record& record, Slot slot) {
     announce(record, slot);
-    readings_.push_back({indexOf(*record.row), slot});
+    put(record, slot);
   }
 
-  // The same name in UTF-8: where it is not, a converted copy behind the stream's own bytes.
-  Slot asUtf8(Slot name) {
-    const std::string_view raw = textOf(name);
-    if (isUtf8(raw)) return name;
-    const std::string converted = utf8FromLatin1(raw);
-    return putExtra(converted);
-  }
-
-  Slot putExtra(std::string_view text) {
-    static_assert(2 * maxRecordSize <= Slot::maxSize, "each byte of a name becomes at most two");
-    if (text.size() > maxExtra - extra_.size()) throw std::bad_alloc();
-    const auto offset = static_cast<std::uint32_t>(bytes_.size() + extra_.size());
-    extra_ += text;
-    return Slot::place(Form::text, static_cast<std::uint32_t>(text.size()), offset);
-  }
-
-  std::string_view textOf(Slot place) const {
-    if (place.body >= bytes_.size())
-      return std::string_view(extra_).substr(place.body - bytes_.size(), place.size());
-    return {reinterpret_cast<const char*>(bytes_.data()) + place.body, place.size()};
-  }
-
-  // Puts the readings from `first` on in their places: one entry a tag, in the order in which the
-  // tags first came. A list takes all its tag's readings, a group makes a dictionary of them, any
-  // other tag keeps the last.
-  Slot putDictionary(std::size_t first, const Slot* controlPoint) {
-    placeOfRow_.fill(0);
-    std::size_t count = 0;
-    for (std::size_t i = first; i < readings_.size(); ++i) {
-      const Reading& reading = readings_[i];
-      std::uint8_t& place = placeOfRow_[reading.row];
-      if (place == 0) {
-        items_[count] = {reading.row, {}};
-        place = static_cast<std::uint8_t>(++count);
-      }
-      items_[place - 1u].slot = reading.slot;
+  void put(const Record& record, Slot slot) {
+    const std::uint8_t row = indexOf(*record.row);
+    if (isList(record.row->read)) {
+      builder_.append(row, keyOf(record.tag), slot);
+    } else {
+      builder_.put(row, keyOf(record.tag), slot);
     }
-    for (Item& item : std::span(items_).first(count)) {
-      const TagRow& row = tagRows()[item.row];
-      if (isList(row.read)) item.slot = putList(first, item.row);
-      if (isGroup(row.write)) item.slot = putGroup(first, item.row);
-    }
-    std::optional<Key> pointKey;
-    if (controlPoint != nullptr) pointKey = keyOfControlPoint();
-
-    const Slot dictionary = putHeader(Form::dictionary, count + (pointKey ? 1 : 0), false);
-    for (const Item& item : std::span(items_).first(count)) {
-      slots_.push_back(item.slot);
-      const std::array<char, 4> characters = charactersOf(tagRows()[item.row].tag);
-      keys_.push_back(Key::tag({characters.data(), characters.size()}));
-    }
-    if (pointKey) {
-      slots_.push_back(*controlPoint);
-      keys_.push_back(*pointKey);
-    }
-    return dictionary;
-  }
-
-  Slot putHeader(Form form, std::size_t count, bool sorted) {
-    const auto index = static_cast<std::uint32_t>(slots_.size());
-    slots_.push_back(
-        Header{static_cast<std::uint32_t>(count), sorted, static_cast<std::uint32_t>(keys_.size())}
-            .slot());
-    return Slot::scalar(form, index);
-  }
-
-  Slot putList(std::size_t first, std::uint8_t row) {
-    const Slot list = putHeader(Form::list, 0, false);
-    const std::size_t elements = slots_.size();
-    for (std::size_t i = first; i < readings_.size(); ++i) {
-      if (readings_[i].row == row) slots_.push_back(readings_[i].slot);
-    }
-    slots_[list.body] =
-        Header{static_cast<std::uint32_t>(slots_.size() - elements), false, 0}.slot();
-    return list;
-  }
-
-  // A group's entry: its name first stood at `name`, its value stands at `value` (both in
-  // readings_).
-  struct GroupEntry {
-    std::size_t name, value;
-  };
-
-  Slot putGroup(std::size_t first, std::uint8_t row) {
-    gatherGroup(first, row);
-    const bool sorted = group_.size() > searchedInLine;
-    std::vector<Key> names;
-    names.reserve(group_.size());
-    for (const GroupEntry& entry : group_) names.push_back(keyOf(readings_[entry.name].slot));
-
-    const Slot dictionary = putHeader(Form::dictionary, group_.size(), sorted);
-    keys_.insert(keys_.end(), names.begin(), names.end());
-    for (const GroupEntry& entry : group_) slots_.push_back(readings_[entry.value].slot);
-    if (sorted) putOrder(Header::of(slots_[dictionary.body]));
-    return dictionary;
-  }
-
-  // Fills group_: one entry a name, in the order in which the names first came, each with its last
-  // value. By sorting, which no choice of names makes slow.
-  void gatherGroup(std::size_t first, std::uint8_t row) {
-    const auto nameOf = [&](const GroupEntry& entry) { return textOf(readings_[entry.name].slot); };
-    group_.clear();
-    for (std::size_t i = first; i < readings_.size(); ++i) {
-      if (readings_[i].row != row) continue;
-      group_.push_back({i, i + 1});
-      ++i;
-    }
-    std::stable_sort(group_.begin(), group_.end(), [&](const GroupEntry& a, const GroupEntry& b) {
-      return nameOf(a) < nameOf(b);
-    });
-    std::size_t kept = 0;
-    for (const GroupEntry& entry : group_) {
-      if (kept > 0 && nameOf(group_[kept - 1]) == nameOf(entry)) {
-        group_[kept - 1].value = entry.value;
-      } else {
-        group_[kept++] = entry;
-      }
-    }
-    group_.resize(kept);
-    std::sort(group_.begin(), group_.end(),
-              [](const GroupEntry& a, const GroupEntry& b) { return a.name < b.name; });
-  }
-
-  // Behind the keys of a dictionary: their order by text.
-  void putOrder(Header dictionary) {
-    const auto textOfKey = [&](Key place) {
-      const Key& key = keys_[dictionary.firstKey + place.slot()];
-      return key.isTag() ? key.tagText() : textOf(slots_[key.slot()]);
-    };
-    std::vector<Key> order;
-    order.reserve(dictionary.count);
-    for (std::uint32_t i = 0; i < dictionary.count; ++i) order.push_back(Key::textAt(i));
-    std::sort(order.begin(), order.end(),
-              [&](Key a, Key b) { return textOfKey(a) < textOfKey(b); });
-    keys_.insert(keys_.end(), order.begin(), order.end());
-  }
-
-  Key keyOf(Slot name) {
-    if (const std::string_view text = textOf(name); Key::fits(text)) return Key::tag(text);
-    slots_.push_back(name);
-    return Key::textAt(static_cast<std::uint32_t>(slots_.size() - 1));
   }
 
   // One name for all control points.
   Key keyOfControlPoint() {
-    if (!nameOfControlPoint_) nameOfControlPoint_ = keyOf(putExtra(controlPointKey));
-    return *nameOfControlPoint_;
+    if (!keyOfControlPoint_) keyOfControlPoint_ = builder_.keyOf(builder_.addText(controlPointKey));
+    return *keyOfControlPoint_;
   }
 
   // The observer.
@@ -510,29 +460,8 @@ class Decoder {
   myGUID* const guid_;
   StreamObserver* const observer_;
   std::size_t overlapLeft_;
-
-  // Streams of ordinary size are gathered on the stack, so that their block is the only allocation.
-  // Larger ones are not, for this memory never takes back what a vector has outgrown.
-  static constexpr std::size_t ordinarySize = 4 * 1024;
-  std::array<std::byte, 8 * 1024> arena_;
-  std::pmr::monotonic_buffer_resource memory_{arena_.data(), arena_.size()};
-  std::pmr::memory_resource* const resource_ =
-      bytes_.size() <= ordinarySize ? &memory_ : std::pmr::new_delete_resource();
-  std::pmr::vector<Reading> readings_{
-      resource_};  // of the streams being walked, inner ones behind outer ones
-  std::pmr::vector<Slot> slots_{resource_};  // of the block to be
-  std::pmr::vector<Key> keys_{resource_};    // of the block to be
-  std::string extra_;                        // bytes behind those of the stream: converted names
-  std::vector<GroupEntry> group_;            // scratch of gatherGroup
-  std::optional<Key> nameOfControlPoint_;
-
-  // Scratch of putDictionary. Not on its stack, which would be there once for every level.
-  struct Item {
-    std::uint8_t row;
-    Slot slot;
-  };
-  std::array<Item, 256> items_;
-  std::array<std::uint8_t, 256> placeOfRow_;  // in items_, counted from 1
+  BlockBuilder builder_;
+  std::optional<Key> keyOfControlPoint_;
 };
 
 }  // namespace

@@ -31,6 +31,11 @@ constexpr std::uint32_t paddedToFour(std::uint32_t size) { return (size + 3) & ~
 // `size` has 24 bits, so nothing overflows before the mask.
 constexpr std::uint32_t recordLength(std::uint32_t size) { return (size + 11) & 0xFFFFFC; }
 
+// The greatest size whose record's length does not wrap.
+constexpr std::uint32_t longestRecord = 0xFFFFF4;
+static_assert(recordLength(longestRecord) == recordHeaderSize + longestRecord);
+static_assert(recordLength(longestRecord + 1) == 0);
+
 // The stream goes on for 4 x count bytes behind its given length; the marker's own bytes are
 // counted nowhere.
 constexpr std::size_t markerSize = 4;

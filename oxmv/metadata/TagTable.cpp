@@ -4,7 +4,13 @@
 #include <array>
 #include <cstddef>
 
+#include "oxmv/metadata/TagStreamFormat.h"
+#include "oxmv/values/Block.h"
+
 namespace oxmv {
+
+using detail::Form;
+
 namespace {
 
 // clang-format off
@@ -286,36 +292,74 @@ static_assert(rowsThat([](const TagRow& row) {
                 return (row.count != 0) != (row.read == Read::floats);
               }) == 0);
 
-// Look-up: one multiplication spreads the tags over the slots so that no two meet (found by trying;
-// checked below).
-constexpr std::size_t slotCount = 2048;
-constexpr std::uint8_t noRow = 0xFF;
-static_assert(rows.size() < noRow);
-
-constexpr std::size_t slotOf(Tag tag) {
-  return (static_cast<std::uint32_t>(tag) * 0x94BC4E1Bu) >> 21;
+constexpr detail::PlainRule number(const TagRow& row, Form form, std::uint32_t mask) {
+  return {row.tag, row.read, form, 4, longestRecord - 4, mask, 0};
 }
 
-constexpr std::array<std::uint8_t, slotCount> slots = [] {
-  std::array<std::uint8_t, slotCount> table{};
+constexpr detail::PlainRule place(const TagRow& row, Form form, std::uint32_t least,
+                                  std::uint32_t most) {
+  return {row.tag, row.read, form, least, most - least, 0, 0xFFFFFFFF};
+}
+
+// Numbers with fewer than four bytes are not plain: they take some from behind their payload.
+constexpr detail::PlainRule plainRuleOf(const TagRow& row) {
+  const std::uint32_t listSize = row.count * 4u;
+  switch (row.read) {
+    case Read::int32: return number(row, Form::integer, 0xFFFFFFFF);
+    case Read::uint16: return number(row, Form::integer, 0xFFFF);
+    case Read::uint8: return number(row, Form::integer, 0xFF);
+    case Read::float32: return number(row, Form::float32, 0xFFFFFFFF);
+    case Read::text: return place(row, Form::textToNul, 0, longestRecord);
+    case Read::floats: return place(row, Form::floats, listSize, listSize);
+    case Read::integers: return place(row, Form::integers, 0, longestRecord);
+    case Read::data: return place(row, Form::data, 0, longestRecord);
+    case Read::none:
+    case Read::guid:
+    case Read::nested:
+    case Read::texts:
+    case Read::ints:
+    case Read::nestedList:
+    case Read::controlPoint:
+    case Read::tagName:
+    case Read::tagValue:
+    case Read::regName:
+    case Read::regValue: break;
+  }
+  return {row.tag, row.read};
+}
+
+}  // namespace
+
+namespace detail {
+
+static_assert(rows.size() < noRow);
+
+constexpr std::array<std::uint8_t, tagSlotCount> rowOfSlot = [] {
+  std::array<std::uint8_t, tagSlotCount> table{};
   table.fill(noRow);
   for (std::size_t i = 0; i < rows.size(); ++i)
-    table[slotOf(rows[i].tag)] = static_cast<std::uint8_t>(i);
+    table[slotOfTag(rows[i].tag)] = static_cast<std::uint8_t>(i);
   return table;
 }();
 
-static_assert(slotOf(Tag{0xFFFFFFFFu}) < slotCount);
-static_assert(static_cast<std::size_t>(std::count(slots.begin(), slots.end(), noRow)) ==
-                  slotCount - rows.size(),
+static_assert(slotOfTag(Tag{0xFFFFFFFFu}) < tagSlotCount);
+static_assert(static_cast<std::size_t>(std::count(rowOfSlot.begin(), rowOfSlot.end(), noRow)) ==
+                  tagSlotCount - rows.size(),
               "no two tags in one slot");
 
-}  // namespace
+constexpr std::array<PlainRule, noRow + 1> plainRules = [] {
+  std::array<PlainRule, noRow + 1> table{};
+  std::transform(rows.begin(), rows.end(), table.begin(), plainRuleOf);
+  return table;
+}();
+
+}  // namespace detail
 
 std::span<const TagRow> tagRows() noexcept { return rows; }
 
 const TagRow* findTagRow(Tag tag) noexcept {
-  const std::uint8_t index = slots[slotOf(tag)];
-  return index != noRow && rows[index].tag == tag ? &rows[index] : nullptr;
+  const std::uint8_t index = detail::likelyRow(tag);
+  return index != detail::noRow && rows[index].tag == tag ? &rows[index] : nullptr;
 }
 
 const TagRow* findTagRow(std::string_view key) noexcept {

@@ -2,12 +2,15 @@
 
 #pragma once
 
+#include <array>
+#include <cstddef>
 #include <cstdint>
 #include <span>
 #include <string>
 #include <string_view>
 
 #include "oxmv/metadata/Tag.h"
+#include "oxmv/values/Block.h"
 
 namespace oxmv {
 
@@ -91,6 +94,39 @@ std::span<const TagRow> tagRows() noexcept;
 
 // The row of a tag; null when there is none.
 const TagRow* findTagRow(Tag tag) noexcept;
+
+namespace detail {
+
+// How a record becomes a slot, as numbers to calculate with: where a record of `tag` has a size from
+// `least` to `least + range`, and all of its payload is there, the masks and the form make it. Of
+// tags whose records need more than that no size is in the range.
+struct PlainRule {
+  Tag tag{};
+  Read read = Read::none;
+  Form form = Form::nothing;
+  std::uint32_t least = 0xFFFFFFFF;
+  std::uint32_t range = 0;
+  std::uint32_t numberMask = 0;  // what counts of the payload's first four bytes; of a place, none
+  std::uint32_t placeMask = 0;   // of a place, all bits of its offset and size
+};
+
+// By the tag's slot, which is another one for each tag: the index of its row; noRow = of no tag.
+constexpr std::size_t tagSlotCount = 2048;
+constexpr std::uint8_t noRow = 0xFF;
+extern const std::array<std::uint8_t, tagSlotCount> rowOfSlot;
+// By the index of a row; at noRow, the rule of no tag.
+extern const std::array<PlainRule, noRow + 1> plainRules;
+
+// One multiplication spreads the tags over the slots so that no two meet (found by trying; checked
+// where the table is).
+constexpr std::size_t slotOfTag(Tag tag) {
+  return (static_cast<std::uint32_t>(tag) * 0x94BC4E1Bu) >> 21;
+}
+
+// The index of the row of `tag`, if it has one. Of any other tag it is that of some row or noRow.
+inline std::uint8_t likelyRow(Tag tag) { return rowOfSlot[slotOfTag(tag)]; }
+
+}  // namespace detail
 
 // The row of a dictionary key; null when it is not one of the tags.
 const TagRow* findTagRow(std::string_view key) noexcept;

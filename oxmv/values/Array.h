@@ -3,10 +3,12 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <iterator>
 #include <utility>
 #include <vector>
 
+#include "oxmv/values/LittleEndian.h"
 #include "oxmv/values/Value.h"
 
 namespace oxmv {
@@ -28,10 +30,19 @@ class Array {
     return Array(std::move(values));
   }
 
-  std::size_t size() const noexcept;
+  std::size_t size() const noexcept {
+    return isWords() ? value_.slot_.size() / wordSize : sizeOfValues();
+  }
   bool empty() const noexcept { return size() == 0; }
   // `index` must be below size().
-  Value operator[](std::size_t index) const;
+  Value operator[](std::size_t index) const {
+    if (!isWords()) return valueAt(index);
+    const detail::Block& block = value_.block();
+    const detail::Form form =
+        value_.slot_.form() == detail::Form::floats ? detail::Form::float32 : detail::Form::integer;
+    const std::uint8_t* words = block.bytes(value_.slot_).data();
+    return Value::in(block, detail::Slot::scalar(form, loadLe32(words + index * wordSize)));
+  }
 
   Iterator begin() const noexcept;
   Iterator end() const noexcept;
@@ -41,6 +52,15 @@ class Array {
  private:
   friend class Value;
   explicit Array(Value value) noexcept : value_(std::move(value)) {}
+
+  static constexpr std::size_t wordSize = 4;  // of a float or integer in a block
+  bool isWords() const noexcept {
+    const detail::Form form = value_.slot_.form();
+    return form == detail::Form::floats || form == detail::Form::integers;
+  }
+  // Of lists and boxes.
+  std::size_t sizeOfValues() const noexcept;
+  Value valueAt(std::size_t index) const;
 
   Value value_;  // nothing, or of an array's form
 };

@@ -177,22 +177,16 @@ std::size_t Dictionary::size() const noexcept {
   return places();
 }
 
-std::size_t Dictionary::places() const noexcept {
-  if (isTable()) return table() == nullptr ? 0 : table()->places();
-  return value_.isNothing() ? 0 : value_.block().header(value_.slot_.body).count;
+std::size_t Dictionary::placesOfTable() const noexcept {
+  return table() == nullptr ? 0 : table()->places();
 }
 
-bool Dictionary::isVacant(std::size_t place) const noexcept {
-  return isTable() && table()->isVacant(place);
+bool Dictionary::isVacantInTable(std::size_t place) const noexcept {
+  return table()->isVacant(place);
 }
 
-Dictionary::Entry Dictionary::entryAt(std::size_t place) const {
-  if (isTable()) return {table()->key(place), table()->value(place)};
-  const Block& block = value_.block();
-  const std::uint32_t header = value_.slot_.body;
-  const auto index = static_cast<std::uint32_t>(place);
-  return {block.keyText(block.header(header).firstKey + index),
-          Value::in(block, block.items(header)[index])};
+Dictionary::Entry Dictionary::entryOfTable(std::size_t place) const {
+  return {table()->key(place), table()->value(place)};
 }
 
 bool Dictionary::contains(std::string_view key) const { return !(*this)[key].isNothing(); }

@@ -66,9 +66,21 @@ class Dictionary {
   bool ownsTable() const noexcept;
   detail::Table& ownTable();
   // Places in the order, some of which are vacant in a dictionary that had keys removed.
-  std::size_t places() const noexcept;
-  bool isVacant(std::size_t place) const noexcept;
-  Entry entryAt(std::size_t place) const;
+  std::size_t places() const noexcept {
+    if (isTable()) return placesOfTable();
+    return value_.isNothing() ? 0 : value_.block().header(value_.slot_.body).count;
+  }
+  bool isVacant(std::size_t place) const noexcept { return isTable() && isVacantInTable(place); }
+  Entry entryAt(std::size_t place) const {
+    if (isTable()) return entryOfTable(place);
+    const detail::Block& block = value_.block();
+    const std::uint32_t header = value_.slot_.body;
+    return {block.keyText(block.header(header).firstKey + static_cast<std::uint32_t>(place)),
+            Value::in(block, block.items(header)[place])};
+  }
+  std::size_t placesOfTable() const noexcept;
+  bool isVacantInTable(std::size_t place) const noexcept;
+  Entry entryOfTable(std::size_t place) const;
 
   Value value_;  // nothing, or of a dictionary's form
 };

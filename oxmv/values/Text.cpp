@@ -12,6 +12,13 @@ std::uint8_t byteAt(std::string_view text, std::size_t i) {
   return static_cast<std::uint8_t>(text[i]);
 }
 
+template <class Word>
+Word wordAt(const char* bytes) {
+  Word word = 0;
+  std::memcpy(&word, bytes, sizeof word);
+  return word;
+}
+
 // The range of the second byte that follows `lead`; together with the count of bytes this is Table
 // 3-7 of the Unicode Standard ("Well-Formed UTF-8 Byte Sequences").
 struct Sequence {
@@ -34,9 +41,7 @@ constexpr Sequence sequenceOf(std::uint8_t lead) {
 std::size_t skipAscii(std::string_view bytes, std::size_t from) {
   std::size_t i = from;
   for (; bytes.size() - i >= sizeof(std::uint64_t); i += sizeof(std::uint64_t)) {
-    std::uint64_t word = 0;
-    std::memcpy(&word, bytes.data() + i, sizeof word);
-    if ((word & highBits) != 0) break;
+    if ((wordAt<std::uint64_t>(bytes.data() + i) & highBits) != 0) break;
   }
   while (i < bytes.size() && byteAt(bytes, i) < 0x80) ++i;
   return i;
@@ -44,9 +49,22 @@ std::size_t skipAscii(std::string_view bytes, std::size_t from) {
 
 }  // namespace
 
-bool isAscii(std::string_view bytes) noexcept { return skipAscii(bytes, 0) == bytes.size(); }
+bool isAscii(std::string_view bytes) noexcept {
+  // The last word may begin in the one before it; so that short texts need no loop over bytes.
+  const char* const end = bytes.data() + bytes.size();
+  if (bytes.size() < sizeof(std::uint64_t)) {
+    if (bytes.size() >= sizeof(std::uint32_t))
+      return ((wordAt<std::uint32_t>(bytes.data()) | wordAt<std::uint32_t>(end - 4)) &
+              0x80808080u) == 0;
+    return skipAscii(bytes, 0) == bytes.size();
+  }
+  std::uint64_t all = wordAt<std::uint64_t>(end - 8);
+  for (const char* at = bytes.data(); end - at > 8; at += 8) all |= wordAt<std::uint64_t>(at);
+  return (all & highBits) == 0;
+}
 
 bool isUtf8(std::string_view bytes) noexcept {
+  if (isAscii(bytes)) return true;
   for (std::size_t i = skipAscii(bytes, 0); i < bytes.size(); i = skipAscii(bytes, i)) {
     const Sequence sequence = sequenceOf(byteAt(bytes, i));
     if (sequence.length == 0 || sequence.length > bytes.size() - i) return false;

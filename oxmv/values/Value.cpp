@@ -6,6 +6,7 @@
 
 #include "oxmv/values/Array.h"
 #include "oxmv/values/Dictionary.h"
+#include "oxmv/values/LittleEndian.h"
 #include "oxmv/values/Numbers.h"
 #include "oxmv/values/Text.h"
 
@@ -17,22 +18,40 @@ using detail::Slot;
 
 namespace {
 
-std::string_view asText(std::span<const std::uint8_t> bytes) {
-  return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
-}
-
 std::span<const std::uint8_t> asBytes(std::string_view text) {
   return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
-// The same place, ending before its first NUL.
-Slot cutAtNul(const Block& block, Slot place) {
-  const std::uint8_t* start = block.bytes(place).data();
-  const void* nul = place.size() == 0 ? nullptr : std::memchr(start, 0, place.size());
-  const auto size = nul == nullptr
-                        ? place.size()
-                        : static_cast<std::uint32_t>(static_cast<const std::uint8_t*>(nul) - start);
-  return Slot::place(Form::text, size, place.body);
+// The same place, ending before its first NUL, and whether its bytes are all ASCII. Both in one pass:
+// nearly every text is.
+struct Cut {
+  Slot text;
+  bool isAscii;
+};
+
+Cut cutAtNul(const Block& block, Slot place) {
+  constexpr std::uint64_t ones = 0x0101010101010101u;
+  constexpr std::uint64_t highBits = 0x8080808080808080u;
+  const std::span<const std::uint8_t> there = block.bytes().subspan(place.body);
+  const std::uint32_t size = place.size();
+  std::uint32_t i = 0;
+  for (; i < size && there.size() - i >= sizeof(std::uint64_t); i += sizeof(std::uint64_t)) {
+    // The lowest bit is right: borrows only go up from a byte that is zero.
+    const std::uint64_t word = loadLe64(there.data() + i);
+    const std::uint64_t stops = ((word - ones) | word) & highBits;
+    if (stops == 0) continue;
+    i += static_cast<std::uint32_t>(std::countr_zero(stops)) / 8;
+    break;
+  }
+  while (i < size && there[i] - 1u < 0x7Fu) ++i;
+  const bool isAscii = i >= size || there[i] == 0;
+  if (!isAscii) {
+    const void* nul = std::memchr(there.data() + i, 0, size - i);
+    i = nul == nullptr
+            ? size
+            : static_cast<std::uint32_t>(static_cast<const std::uint8_t*>(nul) - there.data());
+  }
+  return {Slot::place(Form::text, std::min(i, size), place.body), isAscii};
 }
 
 }  // namespace
@@ -67,38 +86,16 @@ Value Value::wholeText(Form form, std::string_view text) {
   return isUtf8(text) ? whole(form, asBytes(text)) : whole(form, asBytes(utf8FromLatin1(text)));
 }
 
-Value Value::in(const Block& block, Slot slot) {
-  const Form form = slot.form();
-  if (form == Form::integer) return Value(std::bit_cast<std::int32_t>(slot.body));
-  if (form == Form::float32) return Value(slot, nullptr);
-  if (form == Form::textToNul) slot = cutAtNul(block, slot);
-  if (slot.form() == Form::text && !isUtf8(block.text(slot))) {
-    return wholeText(Form::wholeText, block.text(slot));
+Value Value::textIn(const Block& block, Slot slot) {
+  bool isValid = false;
+  if (slot.form() == Form::textToNul) {
+    const Cut cut = cutAtNul(block, slot);
+    slot = cut.text;
+    isValid = cut.isAscii;
   }
+  if (!isValid && !isUtf8(block.text(slot))) return wholeText(Form::wholeText, block.text(slot));
   block.retain();
   return Value(slot, &block);
-}
-
-Value::Kind Value::kind() const noexcept {
-  switch (slot_.form()) {
-    case Form::nothing: return Kind::nothing;
-    case Form::integer: return Kind::integer;
-    case Form::float32: return Kind::float32;
-    case Form::float64: return Kind::float64;
-    case Form::text:
-    case Form::textToNul:
-    case Form::wholeText:
-    case Form::wholeDerivedText: return Kind::text;
-    case Form::data:
-    case Form::wholeData: return Kind::data;
-    case Form::floats:
-    case Form::integers:
-    case Form::list:
-    case Form::arrayBox: return Kind::array;
-    case Form::dictionary:
-    case Form::dictionaryBox: return Kind::dictionary;
-  }
-  return Kind::nothing;
 }
 
 bool Value::isNumber() const noexcept {
@@ -167,18 +164,6 @@ double Value::doubleValue() const noexcept {
     case Kind::dictionary: break;
   }
   return 0;
-}
-
-std::span<const std::uint8_t> Value::payload() const noexcept {
-  const Form form = slot_.form();
-  if (form == Form::text || form == Form::data) return block().bytes(slot_);
-  const bool isWhole =
-      form == Form::wholeText || form == Form::wholeDerivedText || form == Form::wholeData;
-  return isWhole && content_.owner != nullptr ? block().bytes() : std::span<const std::uint8_t>();
-}
-
-std::string_view Value::text() const& noexcept {
-  return isText() ? asText(payload()) : std::string_view();
 }
 
 std::size_t Value::length() const noexcept { return utf16Length(text()); }

@@ -2,6 +2,7 @@
 
 #pragma once
 
+#include <array>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -80,7 +81,7 @@ class Value {
   }
   ~Value() { release(); }
 
-  Kind kind() const noexcept;
+  Kind kind() const noexcept { return kinds[static_cast<std::size_t>(slot_.form())]; }
   bool isNothing() const noexcept { return slot_.form() == detail::Form::nothing; }
   bool isNumber() const noexcept;  // an integer, a float or a double
   bool isText() const noexcept { return kind() == Kind::text; }
@@ -98,7 +99,11 @@ class Value {
   std::uint32_t floatBits() const noexcept;
 
   // The characters of a text; empty for every other kind. The view holds as long as this value.
-  std::string_view text() const& noexcept;
+  std::string_view text() const& noexcept {
+    if (!isText()) return {};
+    const std::span<const std::uint8_t> bytes = payload();
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+  }
   std::string text() const&& { return std::string(static_cast<const Value&>(*this).text()); }
   // A text's length in characters as UTF-16 counts them; 0 for every other kind.
   std::size_t length() const noexcept;
@@ -119,9 +124,22 @@ class Value {
   friend bool operator==(const Value& a, const Value& b);
 
   // Internal: the value of a slot of `block`.
-  static Value in(const detail::Block& block, detail::Slot slot);
+  static Value in(const detail::Block& block, detail::Slot slot) {
+    using detail::Form;
+    const Form form = slot.form();
+    if (form == Form::integer) return {IntegerTag{}, static_cast<std::int32_t>(slot.body)};
+    if (form == Form::float32) return {slot, nullptr};
+    if (form == Form::text || form == Form::textToNul) return textIn(block, slot);
+    block.retain();
+    return {slot, &block};
+  }
 
  private:
+  // Of the forms, in their order.
+  static constexpr std::array kinds = {
+      Kind::nothing, Kind::integer, Kind::float32, Kind::float64,   Kind::text,       Kind::text,
+      Kind::data,    Kind::array,   Kind::array,   Kind::array,     Kind::dictionary, Kind::text,
+      Kind::text,    Kind::data,    Kind::array,   Kind::dictionary};
   friend class Array;
   friend class Dictionary;
   struct IntegerTag {};
@@ -135,6 +153,7 @@ class Value {
       : slot_(detail::Slot::scalar(detail::Form::integer, 0)), content_{.integer = number} {}
   Value(detail::Slot slot, const detail::Shared* owner) noexcept
       : slot_(slot), content_{.owner = owner} {}
+  static Value textIn(const detail::Block& block, detail::Slot slot);
   static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
   static Value wholeText(detail::Form form, std::string_view text);
 
@@ -149,7 +168,14 @@ class Value {
   const detail::Block& block() const noexcept {
     return static_cast<const detail::Block&>(*content_.owner);
   }
-  std::span<const std::uint8_t> payload() const noexcept;
+  std::span<const std::uint8_t> payload() const noexcept {
+    using detail::Form;
+    const Form form = slot_.form();
+    if (form == Form::text || form == Form::data) return block().bytes(slot_);
+    const bool isWhole =
+        form == Form::wholeText || form == Form::wholeDerivedText || form == Form::wholeData;
+    return isWhole && content_.owner != nullptr ? block().bytes() : std::span<const std::uint8_t>();
+  }
   void retain() const noexcept {
     if (const auto* shared = owner()) shared->retain();
   }

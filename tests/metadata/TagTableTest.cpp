@@ -205,5 +205,20 @@ TEST(TagTable, SaysHowATagIsReadWrittenAndAccepted) {
   }
 }
 
+TEST(TagTable, PlainRuleOfEveryRowStandsAtItsIndex) {
+  for (std::size_t i = 0; i < tagRows().size(); ++i) {
+    const TagRow& row = tagRows()[i];
+    EXPECT_EQ(detail::likelyRow(row.tag), i);
+    EXPECT_EQ(detail::plainRules[i].tag, row.tag);
+    EXPECT_EQ(detail::plainRules[i].read, row.read);
+  }
+}
+
+TEST(TagTable, PlainRuleOfNoTagTakesNoSize) {
+  const detail::PlainRule& rule = detail::plainRules[detail::noRow];
+  for (std::uint32_t size = 0; size <= 0xFFFFFF; size += 5)
+    ASSERT_GT(size - rule.least, rule.range) << size;
+}
+
 }  // namespace
 }  // namespace oxmv::test
