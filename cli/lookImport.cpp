@@ -257,17 +257,30 @@ class Import {
   // Where the import ended, why, and how to mend that.
   void refuse() {
     const std::size_t end = endingFinding();
+    if (end == findings_.size() && imported_.stop == LookImportStop::tooMuch) return refuseSoMany();
     if (end == findings_.size())
       return fail(name_, {"changed", "was changed while it was imported; import it again"});
     const LookFinding& finding = findings_[end];
     problem_ = FileProblem{finding.code, places_[end] + finding.message};
     if (imported_.stop == LookImportStop::notWellFormed)
       return call_.messages.error(name_, problem_->message, problem_->code);
-    const std::string_view done =
-        isDryRun_ || !imported_.wroteAny() ? "nothing written" : "the tables before it are written";
-    if (alert_.empty()) return call_.messages.refused(name_, problem_->message, finding.code, done);
+    if (alert_.empty())
+      return call_.messages.refused(name_, problem_->message, finding.code, done());
     call_.messages.refused(name_, places_[end] + visible(alert_), finding.code,
-                           fmt::format("{}; {}", done, finding.message));
+                           fmt::format("{}; {}", done(), finding.message));
+  }
+
+  std::string_view done() const {
+    return isDryRun_ || !imported_.wroteAny() ? "nothing written"
+                                              : "the tables before it are written";
+  }
+
+  // How many files a description makes is known only when they are made.
+  void refuseSoMany() {
+    problem_ = FileProblem{
+        "too-much",
+        fmt::format("more than {} new tables: divide the description", maxImportedFiles)};
+    call_.messages.refused(name_, problem_->message, problem_->code, done());
   }
 
   // The library is silent when it leaves a description alone that is there.

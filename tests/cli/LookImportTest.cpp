@@ -359,6 +359,23 @@ TEST(LookImport, NamesAFileThatCannotBeWritten) {
             false);
 }
 
+TEST(LookImport, StopsWhereADescriptionHasMoreTablesThanOneImportWrites) {
+  const LookFolder folder;
+  std::string tables = "<size>1</size>";
+  for (int i = 0; i < 4097; ++i) {
+    std::string digits = std::to_string(10000000 + i);
+    tables += "<a>" + digits + digits + digits + "</a>";
+  }
+  const std::string file = folder.description("many.xml", lut(tables));
+  const Outcome outcome = folder.run({"import", "--dry-run", file});
+  EXPECT_EQ(outcome.exitCode, 4);
+  EXPECT_EQ(linesOf(outcome.out).size(), 4096u);
+  EXPECT_TRUE(outcome.err.ends_with(
+      "oxmv: refused: " + file +
+      ": more than 4096 new tables: divide the description (too-much); nothing written\n"))
+      << outcome.err;
+}
+
 TEST(LookImport, RefusesStandardInputWhichHasNoName) {
   EXPECT_EQ(run({"look", "import", "-"}).err,
             "oxmv: error: a look has the name of its file, and - has none (standard-input)\n");
