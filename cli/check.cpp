@@ -5,6 +5,7 @@
 
 #include <fmt/format.h>
 
+#include "cli/CheckReport.h"
 #include "cli/Clips.h"
 #include "cli/Findings.h"
 #include "cli/JsonResults.h"
@@ -21,49 +22,21 @@ std::vector<Finding> findingsToSay(const ClipName& name, const ClipStream& strea
   return findings;
 }
 
-void writeLines(Call& call, const std::string& name, const std::vector<Finding>& findings) {
-  for (const Finding& finding : findings)
-    call.output.write(fmt::format("{}: {} ({})\n", nameInMessages(name), locate(finding),
-                                  call.style.warning(codeOf(finding))));
-}
-
-void writeResult(JsonResults& results, const std::string& name,
-                 const std::vector<Finding>* findings, const FileProblem* problem) {
-  results.add([&](JsonWriter& json) {
-    beginResult(json, "oxmv.check/1", name);
-    json.key("findings");
-    if (findings == nullptr) {
-      json.null();
-    } else {
-      json.beginArray();
-      for (const Finding& finding : *findings) writeFinding(json, finding);
-      json.endArray();
-    }
-    endResult(json, problem);
-  });
-}
-
 void run(Call& call) {
-  const bool isJson = wantsJson(call);
-  JsonResults results(call);
+  CheckReport report(call, "oxmv.check/1");
   for (const ClipName& clip : namedClips(call)) {
-    const std::string& name = clip.word;
     const auto read = readStream(clip);
     if (const auto* problem = std::get_if<FileProblem>(&read)) {
-      call.messages.error(name, problem->message, problem->code);
-      if (isJson) writeResult(results, name, nullptr, problem);
+      report.addProblem(clip.word, *problem);
       continue;
     }
-    const std::vector<Finding> findings = findingsToSay(clip, std::get<ClipStream>(read));
-    if (!findings.empty()) call.messages.raise(Outcome::no);
-    if (isJson) {
-      writeResult(results, name, &findings, nullptr);
-    } else {
-      writeLines(call, name, findings);
-    }
-    call.messages.note(name, counted(findings.size(), "finding"));
+    const auto line = [&](const Finding& finding) {
+      return fmt::format("{}: {} ({})", nameInMessages(clip.word), locate(finding),
+                         call.style.warning(codeOf(finding)));
+    };
+    report.add(clip.word, findingsToSay(clip, std::get<ClipStream>(read)), line, writeFinding);
   }
-  if (isJson) results.finish();
+  report.finish();
 }
 
 constexpr auto flags = std::to_array({Flag::json, Flag::ndjson, Flag::filesFrom, Flag::null});

@@ -10,6 +10,7 @@
 
 #include <fmt/format.h>
 
+#include "cli/CheckReport.h"
 #include "cli/Inputs.h"
 #include "cli/JsonResults.h"
 #include "cli/LookTables.h"
@@ -155,61 +156,36 @@ class Check {
   std::vector<LookTableFinding> findings_;
 };
 
-void writeLines(Call& call, const std::string& name,
-                const std::vector<LookTableFinding>& findings) {
-  for (const LookTableFinding& finding : findings) {
-    const std::string place = finding.offset ? fmt::format("byte {}: ", *finding.offset) : "";
-    call.output.write(fmt::format("{}: {}{} ({})\n", nameInMessages(name), place, finding.message,
-                                  call.style.warning(finding.code)));
-  }
+std::string lineOf(const Call& call, const std::string& name, const LookTableFinding& finding) {
+  const std::string place = finding.offset ? fmt::format("byte {}: ", *finding.offset) : "";
+  return fmt::format("{}: {}{} ({})", nameInMessages(name), place, finding.message,
+                     call.style.warning(finding.code));
 }
 
-void writeResult(JsonResults& results, const std::string& name,
-                 const std::vector<LookTableFinding>* findings, const FileProblem* problem) {
-  results.add([&](JsonWriter& json) {
-    beginResult(json, "oxmv.look.check/1", name);
-    json.key("findings");
-    if (findings == nullptr) {
-      json.null();
-      return endResult(json, problem);
-    }
-    json.beginArray();
-    for (const LookTableFinding& finding : *findings) {
-      json.beginObject();
-      json.member("code", finding.code);
-      if (finding.offset) {
-        json.member("offset", *finding.offset);
-      } else {
-        json.member("offset", std::nullopt);
-      }
-      json.member("message", finding.message);
-      json.endObject();
-    }
-    json.endArray();
-    endResult(json, problem);
-  });
+void writeFinding(JsonWriter& json, const LookTableFinding& finding) {
+  json.beginObject();
+  json.member("code", finding.code);
+  if (finding.offset) {
+    json.member("offset", *finding.offset);
+  } else {
+    json.member("offset", std::nullopt);
+  }
+  json.member("message", finding.message);
+  json.endObject();
 }
 
 void run(Call& call) {
-  const bool isJson = wantsJson(call);
-  JsonResults results(call);
+  CheckReport report(call, "oxmv.look.check/1");
   for (const std::string& name : namedInputs(call)) {
     const auto content = readInput(name);
     if (const auto* problem = std::get_if<FileProblem>(&content)) {
-      call.messages.error(name, problem->message, problem->code);
-      if (isJson) writeResult(results, name, nullptr, problem);
+      report.addProblem(name, *problem);
       continue;
     }
-    const auto findings = Check(name, std::get<Bytes>(content)).run();
-    if (!findings.empty()) call.messages.raise(Outcome::no);
-    if (isJson) {
-      writeResult(results, name, &findings, nullptr);
-    } else {
-      writeLines(call, name, findings);
-    }
-    call.messages.note(name, counted(findings.size(), "finding"));
+    const auto line = [&](const LookTableFinding& finding) { return lineOf(call, name, finding); };
+    report.add(name, Check(name, std::get<Bytes>(content)).run(), line, writeFinding);
   }
-  if (isJson) results.finish();
+  report.finish();
 }
 
 constexpr auto flags = std::to_array({Flag::json, Flag::ndjson, Flag::filesFrom, Flag::null});

@@ -6,6 +6,7 @@
 
 #include <fmt/format.h>
 
+#include "cli/CheckReport.h"
 #include "cli/Inputs.h"
 #include "cli/JsonResults.h"
 #include "cli/LookFindings.h"
@@ -33,13 +34,11 @@ std::vector<Located> lint(const std::string& name, const Bytes& file) {
   return located;
 }
 
-void writeLines(Call& call, const std::string& name, const std::vector<Located>& findings) {
-  for (const auto& [finding, position] : findings) {
-    std::string place = nameInMessages(name);
-    if (position) place += fmt::format(":{}:{}", position->line, position->column);
-    call.output.write(
-        fmt::format("{}: {} ({})\n", place, finding.message, call.style.warning(finding.code)));
-  }
+std::string lineOf(const Call& call, const std::string& name, const Located& located) {
+  const auto& [finding, position] = located;
+  std::string place = nameInMessages(name);
+  if (position) place += fmt::format(":{}:{}", position->line, position->column);
+  return fmt::format("{}: {} ({})", place, finding.message, call.style.warning(finding.code));
 }
 
 void writeFinding(JsonWriter& json, const Located& located) {
@@ -57,42 +56,18 @@ void writeFinding(JsonWriter& json, const Located& located) {
   json.endObject();
 }
 
-void writeResult(JsonResults& results, const std::string& name,
-                 const std::vector<Located>* findings, const FileProblem* problem) {
-  results.add([&](JsonWriter& json) {
-    beginResult(json, "oxmv.look.lint/1", name);
-    json.key("findings");
-    if (findings == nullptr) {
-      json.null();
-    } else {
-      json.beginArray();
-      for (const Located& finding : *findings) writeFinding(json, finding);
-      json.endArray();
-    }
-    endResult(json, problem);
-  });
-}
-
 void run(Call& call) {
-  const bool isJson = wantsJson(call);
-  JsonResults results(call);
+  CheckReport report(call, "oxmv.look.lint/1");
   for (const std::string& name : namedInputs(call)) {
     const auto content = readInput(name);
     if (const auto* problem = std::get_if<FileProblem>(&content)) {
-      call.messages.error(name, problem->message, problem->code);
-      if (isJson) writeResult(results, name, nullptr, problem);
+      report.addProblem(name, *problem);
       continue;
     }
-    const std::vector<Located> findings = lint(name, std::get<Bytes>(content));
-    if (!findings.empty()) call.messages.raise(Outcome::no);
-    if (isJson) {
-      writeResult(results, name, &findings, nullptr);
-    } else {
-      writeLines(call, name, findings);
-    }
-    call.messages.note(name, counted(findings.size(), "finding"));
+    const auto line = [&](const Located& located) { return lineOf(call, name, located); };
+    report.add(name, lint(name, std::get<Bytes>(content)), line, writeFinding);
   }
-  if (isJson) results.finish();
+  report.finish();
 }
 
 constexpr auto flags = std::to_array({Flag::json, Flag::ndjson, Flag::filesFrom, Flag::null});
