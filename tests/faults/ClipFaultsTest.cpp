@@ -1,5 +1,6 @@
 // Clips in a file system that fails, and in a process that is killed.
 
+#include <algorithm>
 #include <cerrno>
 #include <chrono>
 #include <csignal>
@@ -332,8 +333,8 @@ TEST(ClipFault, FolderThatCannotBeSynchronisedIsDoneWithout) {
 TEST(ClipFault, FailureBehindTheGuidOfTheLastFileKeepsTheGuid) {
   const Database database;
   const fs::path file = database.folder() / "last";
-  Bytes content(sizeof(myGUID), 9);
-  content.insert(content.end(), oldContent.begin(), oldContent.end());
+  Bytes content(sizeof(myGUID) + oldContent.size(), 9);
+  std::copy(oldContent.begin(), oldContent.end(), content.end() - std::ssize(oldContent));
   putFile(file, content);
   std::size_t zeros = 0;
   std::size_t guids = 0;
