@@ -20,7 +20,7 @@ class Prefs : public testing::Test {
   }
   std::string content() const { return readFile(user.preferences()); }
 
-  const UserFolders user{};
+  const UserFolders user;
   const std::string file = user.preferences().string();
   const std::string systemFile = user.systemPreferences().string();
 };

@@ -14,6 +14,8 @@ namespace oxmv::cli::test {
 
 class UserFolders {
  public:
+  UserFolders() {}  // so that one may be const without an initialiser
+
   std::filesystem::path root() const { return root_.path(); }
   // The user's preferences file, and the one for all users.
   std::filesystem::path preferences() const { return root_ / "user/com.ombrix.oxmv.toml"; }
