@@ -82,6 +82,8 @@ void hideCreationTimes(bool areHidden) { hasNoCreationTimes = areHidden; }
 using oxmv::test::original;
 using oxmv::test::pass;
 
+// Seen from outside, so that a shared library comes here, too.
+#pragma GCC visibility push(default)
 extern "C" {
 
 int open(const char* path, int flags, ...) {
@@ -181,3 +183,4 @@ int unlink(const char* path) noexcept {
 }
 
 }  // extern "C"
+#pragma GCC visibility pop
