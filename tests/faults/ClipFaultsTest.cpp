@@ -423,6 +423,25 @@ TEST(ClipFault, FullDiskLeavesTheOldFile) {
   EXPECT_EQ(status, 0);
 }
 
+// The default folder, in a process whose root is a folder of the test's.
+TEST(ClipFault, OverrideIsWrittenIntoTheDefaultFolderWhichIsStored) {
+  const TempDir dir;
+  fs::create_directories(dir / "Library/Application Support/Ombrix");
+  constexpr int cannotMove = 77;
+  const pid_t child = startChild([&] {
+    if (::geteuid() != 0 && ::unshare(CLONE_NEWUSER) != 0) return cannotMove;
+    if (::chroot(dir.path().c_str()) != 0 || ::chdir("/") != 0) return cannotMove;
+    const InstalledFakeHost host;
+    if (!newClip().writeToOverride()) return 1;
+    const Value stored = host->preferences[std::string(preferencesAppID)]["OverridePath"];
+    return stored == Value("/Library/Application Support/Ombrix") ? 0 : 2;
+  });
+  const int status = exitStatusOf(child);
+  if (status == cannotMove) GTEST_SKIP() << "this process may not change its root";
+  EXPECT_EQ(status, 0);
+  EXPECT_EQ(getFile(dir / "Library/Application Support/Ombrix/override.colr"), newContent);
+}
+
 // Several processes at once.
 
 int saveOften(const Value& reel, int count) {
