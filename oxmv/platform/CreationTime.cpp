@@ -29,6 +29,9 @@ std::optional<CalendarTime> creationTime(const std::filesystem::path& path) {
   struct statx status = {};
   if (::statx(AT_FDCWD, path.c_str(), 0, STATX_BTIME, &status) != 0) return std::nullopt;
   if ((status.stx_mask & STATX_BTIME) == 0) return std::nullopt;
+  // Some file systems (overlays, some network ones) say that they remember, and answer nothing but
+  // zeros.
+  if (status.stx_btime.tv_sec == 0 && status.stx_btime.tv_nsec == 0) return std::nullopt;
   return localTime(status.stx_btime.tv_sec);
 }
 

@@ -17,15 +17,15 @@
 namespace oxmv::test {
 namespace {
 
-class StillFault : public testing::Test {
+class StillFault : public testing::TestWithParam<CreationTimes> {
  protected:
-  StillFault() { hideCreationTimes(true); }
-  ~StillFault() override { hideCreationTimes(false); }
+  StillFault() { setCreationTimes(GetParam()); }
+  ~StillFault() override { setCreationTimes(CreationTimes::told); }
 
   InstalledFakeHost host_;
 };
 
-TEST_F(StillFault, WithoutItsCreationTimeAStillHasNoTimes) {
+TEST_P(StillFault, WithoutItsCreationTimeAStillHasNoTimes) {
   const TempDir folder;
   const auto path = folder / "still.jpg";
   const Bytes still = exampleStill();
@@ -40,6 +40,9 @@ TEST_F(StillFault, WithoutItsCreationTimeAStillHasNoTimes) {
                         {fieldOfViewKey, Array::of(87)},
                         {"FIRM", "QX3.01.02.00"}}));
 }
+
+INSTANTIATE_TEST_SUITE_P(CreationTimes, StillFault,
+                         testing::Values(CreationTimes::hidden, CreationTimes::zero));
 
 }  // namespace
 }  // namespace oxmv::test

@@ -22,7 +22,7 @@ std::size_t faultyCall = 0;
 Fault currentFault{};
 std::string_view faulty;
 std::vector<SystemCall> made;
-bool hasNoCreationTimes = false;
+CreationTimes creationTimes = CreationTimes::told;
 
 // The function of that name in the C library.
 template <class Function>
@@ -75,7 +75,7 @@ std::vector<SystemCall> systemCalls() { return made; }
 
 std::string faultyFunction() { return std::string(faulty); }
 
-void hideCreationTimes(bool areHidden) { hasNoCreationTimes = areHidden; }
+void setCreationTimes(CreationTimes times) { creationTimes = times; }
 
 }  // namespace oxmv::test
 
@@ -152,7 +152,14 @@ int lstat(const char* path, struct stat* status) noexcept {
 int statx(int folder, const char* path, int flags, unsigned mask, struct statx* status) noexcept {
   static auto* const next = original<int(int, const char*, int, unsigned, struct statx*)>("statx");
   const int result = next(folder, path, flags, mask, status);
-  if (oxmv::test::hasNoCreationTimes) status->stx_mask &= ~STATX_BTIME;
+  switch (oxmv::test::creationTimes) {
+    case oxmv::test::CreationTimes::told: break;
+    case oxmv::test::CreationTimes::hidden: status->stx_mask &= ~STATX_BTIME; break;
+    case oxmv::test::CreationTimes::zero:
+      status->stx_mask |= STATX_BTIME;
+      status->stx_btime = {};
+      break;
+  }
   return result;
 }
 

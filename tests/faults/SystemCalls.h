@@ -40,7 +40,9 @@ std::vector<SystemCall> systemCalls();
 std::size_t disarmFault();
 std::string faultyFunction();
 
-// Whether files tell when they were created; some file systems do not remember it.
-void hideCreationTimes(bool areHidden);
+// What files tell of when they were created. Some file systems do not remember it; some of these say
+// that they do, and answer zeros.
+enum class CreationTimes { told, hidden, zero };
+void setCreationTimes(CreationTimes times);
 
 }  // namespace oxmv::test
