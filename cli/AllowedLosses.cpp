@@ -6,6 +6,7 @@
 
 #include <fmt/format.h>
 
+#include "cli/TagNames.h"
 #include "oxmv/values/Characters.h"
 
 namespace oxmv::cli {
@@ -15,7 +16,11 @@ namespace {
 constexpr std::size_t lossesSaid = 20;
 
 std::string inWords(const Loss& loss) {
-  return visible(fmt::format("{} {}", loss.path, loss.message));
+  const std::string words = visible(fmt::format("{} {}", loss.path, loss.message));
+  if (loss.code != LossCode::unknownTag && loss.code != LossCode::badKey) return words;
+  // A key that is none of the tags is most likely a slip of the hand.
+  const std::string_view key = std::string_view(loss.path).substr(loss.path.rfind('/') + 1);
+  return findTagRow(key) != nullptr ? words : words + tagsMeantBy(key);
 }
 
 }  // namespace

@@ -108,6 +108,20 @@ TEST(Encode, NamesTheLossAndTheWayOut) {
   EXPECT_EQ(readFile(folder / "made.colr"), "as it was");
 }
 
+TEST(Encode, NamesTheTagsNearestToAKeyThatIsNone) {
+  const std::string begin = "oxmv: refused: standard input: ";
+  const auto lines = linesOf(encode(R"({"RELE":"A","COL1":{"SATU":1.0,"White balance":1}})").err);
+  ASSERT_EQ(lines.size(), 2u);
+  EXPECT_EQ(lines[0], begin +
+                          "RELE is a tag that is never stored; did you mean REEL (Reel name)?"
+                          " (unknown-tag); nothing written; --allow unknown-tag lets it through");
+  EXPECT_EQ(lines[1],
+            begin +
+                "COL1/White balance is no tag: a tag has four ASCII characters; did you mean"
+                " WBAL (White balance)? (bad-key); nothing written; --allow bad-key lets it"
+                " through");
+}
+
 TEST(Encode, LetsThroughWhatIsAllowedAndWarns) {
   const Outcome outcome = encode(R"({"REEL":"Café","TAKE":1})", {"--allow", "text-nonascii"});
   EXPECT_EQ(outcome.exitCode, 0);
