@@ -79,6 +79,24 @@ std::optional<Value> floatFromBits(std::string_view text) {
   return Value(std::bit_cast<float>(bits));
 }
 
+// Whether a decimal number, other than zero, lies between -1 and 1.
+bool isBelowOne(std::string_view number) {
+  const std::size_t e = std::min(number.find_first_of("eE"), number.size());
+  const std::size_t point = std::min(number.find('.'), e);
+  const std::size_t first = number.find_first_of("123456789");
+  // The number is 0.d... times ten to the power of places and exponent.
+  const std::int64_t places =
+      static_cast<std::int64_t>(point) - static_cast<std::int64_t>(first) + (first > point ? 1 : 0);
+  std::int64_t exponent = 0;
+  if (e < number.size()) {
+    const char* digits = number.data() + e + 1;
+    if (*digits == '+') ++digits;
+    const char* end = number.data() + number.size();
+    if (std::from_chars(digits, end, exponent).ec != std::errc()) return *digits == '-';
+  }
+  return exponent <= -places;
+}
+
 // What the parser found, without its own wrapping and without the text that it read.
 std::string sentenceOf(std::string_view message) {
   if (const std::size_t dash = message.find(" - "); dash != std::string_view::npos)
@@ -225,9 +243,10 @@ bool Builder::addFloat(const std::string& digits, const char* start) {
   if (digits.find_first_of(".eE") == std::string::npos) return failInteger(start);
   float number = 0;
   const auto result = std::from_chars(digits.data(), digits.data() + digits.size(), number);
-  if (result.ec != std::errc())
-    return fail("json-float-range", "the number does not fit a float", start);
-  return add(Value(number), start);
+  if (result.ec == std::errc()) return add(Value(number), start);
+  // The nearest float to what is too small for any is a zero; nothing is near what is too large.
+  if (isBelowOne(digits)) return add(Value(digits.starts_with('-') ? -0.0f : 0.0f), start);
+  return fail("json-float-range", "the number does not fit a float", start);
 }
 
 bool Builder::key(std::string& name) {

@@ -145,6 +145,21 @@ TEST(TagJson, RoundsFloatsOnce) {
   EXPECT_EQ(read(R"({"a":1.00000005960464477539})")["a"].floatValue(), 1.0f);
 }
 
+TEST(TagJson, ReadsZeroForWhatIsNearerToItThanToAnyOtherFloat) {
+  const std::string zeros = "0." + std::string(60, '0') + "1";
+  const std::string many = "0." + std::string(400, '0') + "1e+10";
+  for (const std::string number :
+       {"1e-46", "7.0e-46", "1e-400", "1e-99999999999999999999", "123.5e-60", zeros.c_str(),
+        many.c_str(), "0.0", "0e5", "0.0e99999999999999999999"}) {
+    SCOPED_TRACE(number);
+    const Value positive = read("{\"a\":" + number + "}")["a"];
+    EXPECT_EQ(positive.kind(), Value::Kind::float32);
+    EXPECT_EQ(positive.floatBits(), 0u);
+    EXPECT_EQ(read("{\"a\":-" + number + "}")["a"].floatBits(), 0x80000000u);
+  }
+  EXPECT_EQ(read(R"({"a":7.1e-46})")["a"].floatBits(), 1u);
+}
+
 TEST(TagJson, ReadsNamesWithDollars) {
   const Dictionary expected = {{"$data", "x"}, {"$", 1}, {"$$a", 2}};
   EXPECT_EQ(read(R"({"$$data":"x","$$":1,"$$$a":2})"), expected);
@@ -232,7 +247,8 @@ TEST(TagJson, RefusesIntegersOfMoreThan64Bits) {
 
 TEST(TagJson, RefusesFloatsOutOfRange) {
   const std::string message = "1:6 json-float-range: the number does not fit a float";
-  for (const char* number : {"3.5e38", "-1e39", "1e400", "1e-46", "-1e-400", "1e99999999999"})
+  const std::string digits = "1" + std::string(400, '0') + "e-10";
+  for (const char* number : {"3.5e38", "-1e39", "1e400", "1e99999999999", digits.c_str()})
     EXPECT_EQ(errorIn("{\"a\":" + std::string(number) + "}"), message) << number;
   EXPECT_EQ(errorIn("{\"a\":0e999}"), "none");
   EXPECT_EQ(errorIn("{\"a\":3.4028235e38}"), "none");
