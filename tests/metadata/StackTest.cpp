@@ -5,8 +5,10 @@
 
 #include <gtest/gtest.h>
 
+#include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagStreamEditor.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
@@ -35,10 +37,11 @@ void expectSmallStack(const std::function<void()>& work) {
   EXPECT_LE(stackUsedBy(work, stackSize), mayTake);
 }
 
-// As deep as streams nest and deeper, with something of every kind at every level.
-Bytes deepStream() {
+// Streams nest 64 levels deep; this one deeper, unless told, with something of every kind at every
+// level.
+Bytes deepStream(int levels = 100) {
   Bytes level;
-  for (int i = 0; i < 100; ++i) {
+  for (int i = 0; i < levels; ++i) {
     StreamBuilder outer;
     outer.record("TAGN", 'c', "Caf\xE9").record("TAGV", 'L', i).record("KWRd", 'c', "word");
     const Bytes point = StreamBuilder().raw(Bytes(8, 1)).raw(level).bytes();
@@ -75,6 +78,27 @@ TEST(Stack, ChangesADeepDictionary) {
     tags.remove("REG ");
     EXPECT_EQ(copy.size(), 5u);
     EXPECT_EQ(tags.size(), 4u);
+  });
+}
+
+// Too deep and in twenty ways not to be read back, so that each level has something to explain.
+TEST(Stack, FindsTheLossesOfADeepDictionary) {
+  Value level(1);
+  for (int i = 0; i < 100; ++i) {
+    Dictionary outer{{"REEL", "Caf\u00E9"}, {"XXXX", 1}, {"TAKE", "text"}, {"SATU", 1}};
+    outer.set(i % 2 == 0 ? "COL1" : "CTLp", i % 2 == 0 ? level : Value(Array::of(level)));
+    level = outer;
+  }
+  expectSmallStack([&] { EXPECT_GT(findLosses(level.dictionary(), Layout::exact).size(), 100u); });
+}
+
+TEST(Stack, EditsADeepStream) {
+  const Bytes stream = deepStream(60);
+  expectSmallStack([&] {
+    TagStreamEditor editor(stream);
+    const auto error = editor.set("COL1/REEL", "A001");
+    EXPECT_FALSE(error);
+    EXPECT_GT(editor.stream().size(), stream.size());
   });
 }
 
