@@ -154,13 +154,12 @@ void requireReads(const Edit& edit, std::string_view path, const Dictionary& bef
 }
 
 // The bytes that no edit of the row may take, put in or change.
-Bytes otherBytes(const TagRow& row, std::vector<StreamPart> parts) {
+Bytes otherBytes(const TagRow& row, const std::vector<StreamPart>& parts) {
   if (row.write == Write::tagGroup) return bytesWithout({{"TAGN"_tag, "TAGV"_tag}}, parts);
   if (row.write == Write::regGroup) return bytesWithout({{"REGN"_tag, "REGV"_tag}}, parts);
-  if (row.write == Write::controlPoint) {  // also without what ends a list of them
-    std::erase_if(parts, [](const StreamPart& part) { return part.bytes == Bytes(8); });
-  }
-  return bytesWithout({{row.tag}}, parts);
+  Bytes bytes = bytesWithout({{row.tag}}, parts);
+  if (row.write == Write::controlPoint) std::erase(bytes, 0);  // with zeros a list of them ends
+  return bytes;
 }
 
 std::vector<Bytes> recordsOf(Tag tag, const std::vector<StreamPart>& parts) {

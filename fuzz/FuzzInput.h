@@ -200,7 +200,8 @@ class FuzzInput {
 
   std::size_t dataSize() {
     const std::size_t choice = below(256);
-    if (choice == 255) return 65528 + below(16);
+    // About as much as 16 bits tell; once, for such inputs are slow.
+    if (choice == 255 && !std::exchange(hasLongData_, true)) return 65528 + below(16);
     return choice < 128 ? choice % 8 * 4 : choice % 24;
   }
 
@@ -214,6 +215,7 @@ class FuzzInput {
 
   std::span<const std::uint8_t> bytes_;
   const Doubles doubles_;
+  bool hasLongData_ = false;
 };
 
 }  // namespace oxmv::fuzz
