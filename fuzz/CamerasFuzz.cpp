@@ -8,7 +8,7 @@
 #include <string_view>
 #include <variant>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/import/CameraTables.h"
 
 namespace {

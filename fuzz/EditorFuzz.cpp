@@ -17,6 +17,7 @@
 #include <vector>
 
 #include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamEditor.h"

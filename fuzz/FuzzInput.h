@@ -6,7 +6,6 @@
 #include <bit>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <span>
 #include <string>
 #include <utility>
@@ -18,11 +17,6 @@
 #include "oxmv/values/Dictionary.h"
 
 namespace oxmv::fuzz {
-
-// Ends the run where a property does not hold: the fuzzer keeps the input.
-inline void require(bool holds) {
-  if (!holds) std::abort();
-}
 
 inline std::string keyOf(const TagRow& row) {
   const auto characters = charactersOf(row.tag);

@@ -11,7 +11,7 @@
 #include <string>
 #include <system_error>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/store/LastRecord.h"

@@ -14,7 +14,7 @@
 #include <string>
 #include <vector>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/looks/HexTable.h"
 #include "oxmv/looks/LongRuns.h"
 #include "oxmv/looks/LookDescription.h"

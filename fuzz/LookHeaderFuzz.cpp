@@ -14,7 +14,7 @@
 #include <string_view>
 #include <vector>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/looks/LookNames.h"
 #include "oxmv/looks/LookTableFile.h"
 #include "oxmv/values/LittleEndian.h"

@@ -15,7 +15,7 @@
 #include <string>
 #include <vector>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/looks/Crc32.h"
 #include "oxmv/looks/LookImport.h"
 #include "oxmv/looks/LookTableFile.h"

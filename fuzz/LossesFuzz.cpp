@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/metadata/Losses.h"
 #include "tests/support/RealLosses.h"
 

@@ -19,6 +19,7 @@
 #include <string_view>
 
 #include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/store/ClipFileName.h"
 #include "oxmv/store/Locations.h"
 #include "oxmv/store/PathTemplate.h"

@@ -12,7 +12,7 @@
 #include <string>
 #include <string_view>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/platform/TomlText.h"
 
 namespace {

@@ -12,7 +12,7 @@
 #include <stdexcept>
 #include <string_view>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/host/Host.h"
 #include "oxmv/import/CameraStill.h"
 #include "oxmv/values/Array.h"

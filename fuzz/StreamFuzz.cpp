@@ -14,7 +14,7 @@
 #include <string_view>
 #include <vector>
 
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagPicker.h"
 #include "oxmv/metadata/TagStreamDecoder.h"

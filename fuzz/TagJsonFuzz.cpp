@@ -15,6 +15,7 @@
 
 #include "cli/TagJson.h"
 #include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/values/Characters.h"
 

@@ -19,7 +19,8 @@
 #include "cli/TagPaths.h"
 #include "cli/TypedValues.h"
 #include "cli/ValueText.h"
-#include "fuzz/FuzzInput.h"
+#include "fuzz/Require.h"
+#include "oxmv/values/Array.h"
 #include "oxmv/values/Characters.h"
 
 namespace {
