@@ -51,7 +51,7 @@ tidy: ## run clang-tidy over the library and the command
 	cmake --preset dev
 	run-clang-tidy -quiet -p build/dev "$(CURDIR)/(oxmv|cli)/.*"
 
-fuzz: packages-ci ## look for new inputs that break something, FUZZ_SECONDS (60) for each target
+fuzz: packages-ci ## look for inputs that break something, FUZZ_SECONDS (60) a target, FUZZ_JOBS at once
 	cmake --preset fuzz
 	cmake --build --preset fuzz
 	packaging/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)

@@ -5,19 +5,16 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <string_view>
 #include <variant>
 
+#include "fuzz/Require.h"
 #include "oxmv/import/CameraTables.h"
 
 namespace {
 
 using namespace oxmv;
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
+using fuzz::require;
 
 void check(const CameraTables& tables) {
   for (const auto& row : tables.shortPrefixes())

@@ -10,11 +10,11 @@
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <span>
 #include <string>
 #include <vector>
 
+#include "fuzz/Require.h"
 #include "oxmv/looks/HexTable.h"
 #include "oxmv/looks/LongRuns.h"
 #include "oxmv/looks/LookDescription.h"
@@ -23,10 +23,7 @@
 namespace {
 
 using namespace oxmv;
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
+using fuzz::require;
 
 std::string withRuns(std::span<const std::uint8_t> bytes) {
   std::string text;

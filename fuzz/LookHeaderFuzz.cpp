@@ -9,12 +9,12 @@
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <span>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "fuzz/Require.h"
 #include "oxmv/looks/LookNames.h"
 #include "oxmv/looks/LookTableFile.h"
 #include "oxmv/values/LittleEndian.h"
@@ -23,10 +23,7 @@
 namespace {
 
 using namespace oxmv;
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
+using fuzz::require;
 
 void checkHeader(std::span<const std::uint8_t> start) {
   const std::int32_t version = lookFileVersion(start);

@@ -8,20 +8,17 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <optional>
 #include <string>
 #include <string_view>
 
+#include "fuzz/Require.h"
 #include "oxmv/platform/TomlText.h"
 
 namespace {
 
 using namespace oxmv;
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
+using fuzz::require;
 
 TomlText changed(const TomlText& text, std::string_view key, const Value& value) {
   const std::optional<TomlText> result = text.with(key, value);

@@ -6,13 +6,13 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <memory>
 #include <optional>
 #include <span>
 #include <stdexcept>
 #include <string_view>
 
+#include "fuzz/Require.h"
 #include "oxmv/host/Host.h"
 #include "oxmv/import/CameraStill.h"
 #include "oxmv/values/Array.h"
@@ -21,10 +21,7 @@
 namespace {
 
 using namespace oxmv;
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
+using fuzz::require;
 
 // Counts the lines of the log, and nothing else.
 class QuietHost final : public Host {

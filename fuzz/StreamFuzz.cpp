@@ -3,20 +3,27 @@
 // - a listening observer, for whom the decoder takes the long way, changes nothing: neither values nor
 //   their order nor the identity; and hears of no more records than there are bytes;
 // - a dictionary encodes the same whether it is a view of its stream or was built entry by entry;
-// - the readable layout is walked to its end: no record in it is cut, too large or left over.
+// - the readable layout is walked to its end: no record in it is cut, too large or left over;
+// - what comes back from a stream unchanged is encoded in the same bytes from then on;
+// - picked out of the stream one by one the values are those of the dictionary.
 
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <span>
+#include <string_view>
+#include <vector>
 
+#include "fuzz/Require.h"
 #include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/metadata/TagPicker.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
+#include "oxmv/metadata/TagTable.h"
 
 namespace {
 
 using namespace oxmv;
+using fuzz::require;
 
 class Counter final : public StreamObserver {
  public:
@@ -26,10 +33,6 @@ class Counter final : public StreamObserver {
   void onRecord(const Record&) override { ++records; }
   void onStop(std::size_t, std::size_t, int, SkipReason, const Record*) override { ++stops; }
 };
-
-void require(bool holds) {
-  if (!holds) std::abort();
-}
 
 Dictionary decode(std::span<const std::uint8_t> bytes, StreamObserver* observer,
                   myGUID* guid = nullptr) {
@@ -46,6 +49,22 @@ Dictionary rebuilt(const Dictionary& tags) {
   Dictionary copy;
   for (const auto& [key, value] : tags) copy.set(key, value);
   return copy;
+}
+
+// Those of every tag, and of one that has no row.
+void comparePicked(std::span<const std::uint8_t> bytes, const Dictionary& tags) {
+  static const std::vector<Tag> wanted = [] {
+    std::vector<Tag> all = {"????"_tag};
+    for (const TagRow& row : tagRows()) all.push_back(row.tag);
+    return all;
+  }();
+  static std::vector<Value> picked;  // keeps its memory, and must not keep more
+  pickTags(bytes, wanted, picked);
+  require(picked.size() == wanted.size());
+  for (std::size_t i = 0; i < wanted.size(); ++i) {
+    const auto key = charactersOf(wanted[i]);
+    require(picked[i] == tags[std::string_view(key.data(), key.size())]);
+  }
 }
 
 }  // namespace
@@ -68,7 +87,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   const auto readable = encodeStream(tags, Layout::readable);
   require(readable && readable->size() % 4 == 0);
   Counter again;
-  decode(*readable, &again);
+  const Dictionary back = decode(*readable, &again);
   require(again.stops == 0);
+  if (back == tags) require(encodeStream(back, Layout::readable) == readable);
+  comparePicked(bytes, tags);
   return 0;
 }

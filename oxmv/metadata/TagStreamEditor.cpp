@@ -362,8 +362,7 @@ class StreamEdit {
 
   // The records that the encoder makes of a value. Of a pair only the one that is asked for.
   Encoded encode(const Target& target, const Value& value) const {
-    Encoded made = encodedRecords(
-        {{target.key, value}}, [&](const Spot& spot) { return belongsTo(*target.row, spot.tag); });
+    Encoded made = encodedRecords({{target.key, value}}, *target.row);
     if (made.records.empty() || !made.tags.contains(target.key)) {
       refuse(EditRefusal::notStored, "nothing would be stored");
     }
@@ -376,8 +375,7 @@ class StreamEdit {
   // The records of a group's entry. `isThere`: only its value counts, for the name in the stream
   // stays.
   Encoded encodeEntry(const Target& target, std::string_view name, bool isThere) const {
-    Encoded made = encodedRecords({{target.key, Dictionary{{name, edit_.value}}}},
-                                  [](const Spot&) { return true; });
+    Encoded made = encodedRecords({{target.key, Dictionary{{name, edit_.value}}}}, *target.row);
     const Dictionary group = made.tags[target.key].dictionary();
     if (group.empty()) refuse(EditRefusal::notStored, "nothing would be stored");
     const auto [madeName, value] = *group.begin();
@@ -387,19 +385,23 @@ class StreamEdit {
     return made;
   }
 
-  template <class Wanted>
-  Encoded encodedRecords(const Dictionary& tags, Wanted wanted) const {
+  Encoded encodedRecords(const Dictionary& tags, const TagRow& row) const {
     const auto stream = encodeStream(tags, edit_.layout);
     if (!stream) throw std::bad_alloc();
     SpotCollector collector(stream->size());
     Encoded made;
     made.tags = decoded(*stream, Standing::nested, &collector);
-    for (const Spot& spot : collector.spots) {
-      if (wanted(spot))
-        made.records.push_back(
-            padded(BytesView(*stream).subspan(spot.offset, spot.end - spot.offset)));
+    for (const std::size_t i : recordsOf(row, collector.spots, *stream)) {
+      const Spot& spot = collector.spots[i];
+      made.records.push_back(
+          padded(BytesView(*stream).subspan(spot.offset, spot.end - spot.offset)));
     }
     return made;
+  }
+
+  // Eight zeros, with which the writer ends a list of control points.
+  static bool isTerminator(const Spot& spot, BytesView stream) {
+    return spot.tag == Tag{} && spot.size == 0 && stream[spot.offset + recordHeaderSize - 1] == 0;
   }
 
   // Whether a record of that tag is one of the row's: of its group, or the terminator of control
@@ -410,17 +412,21 @@ class StreamEdit {
     return tag == row.tag || (row.write == Write::controlPoint && tag == Tag{});
   }
 
-  // Indices of the records that a whole tag or group consists of.
-  std::vector<std::size_t> spotsOf(const Target& target) const {
+  // Indices of the records that a row's value, or a whole group, consists of.
+  static std::vector<std::size_t> recordsOf(const TagRow& row, const std::vector<Spot>& spots,
+                                            BytesView stream) {
     std::vector<std::size_t> own;
-    for (std::size_t i = 0; i < spots_.size(); ++i) {
-      const bool isTerminator = spots_[i].tag == Tag{};
+    for (std::size_t i = 0; i < spots.size(); ++i) {
       // Zeros are a terminator only directly behind a control point.
-      if (isTerminator && (own.empty() || own.back() + 1 != i || spots_[own.back()].tag == Tag{}))
-        continue;
-      if (belongsTo(*target.row, spots_[i].tag)) own.push_back(i);
+      const bool isBehindPoint =
+          !own.empty() && own.back() + 1 == i && spots[own.back()].tag != Tag{};
+      if (spots[i].tag == Tag{} && !(isBehindPoint && isTerminator(spots[i], stream))) continue;
+      if (belongsTo(row, spots[i].tag)) own.push_back(i);
     }
     return own;
+  }
+  std::vector<std::size_t> spotsOf(const Target& target) const {
+    return recordsOf(*target.row, spots_, stream_);
   }
 
   // Those of an entry: names and values that were stored under it.

@@ -9,13 +9,16 @@
 #include <gtest/gtest.h>
 
 #include "oxmv/metadata/Losses.h"
-#include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagTable.h"
 #include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
+#include "tests/support/RealLosses.h"
 
 namespace oxmv {
 namespace {
+
+using test::comesBack;
+using test::isReal;
 
 // Random dictionaries, most of whose values are of the kind that their tag carries, and many at the
 // edges.
@@ -143,67 +146,6 @@ class Maker {
   std::mt19937 random_;
 };
 
-Dictionary comesBack(const Dictionary& tags, Layout layout) {
-  const auto stream = encodeStream(tags, layout).value();
-  if (stream.size() < 12) return {};
-  return decodeStream(stream, static_cast<std::int32_t>(stream.size()));
-}
-
-// The value at a loss's path; nothing where there is none. Names here hold neither '/' nor '['.
-Value at(const Dictionary& tags, std::string_view path) {
-  const std::size_t slash = path.find('/');
-  std::string_view key = path.substr(0, slash);
-  const std::size_t bracket = key.find('[');
-  Value value = tags[key.substr(0, bracket)];
-  if (bracket != std::string_view::npos) {
-    const auto index = static_cast<std::size_t>(Value(key.substr(bracket + 1)).intValue());
-    const Array array = value.array();
-    value = index < array.size() ? array[index] : Value();
-  }
-  if (slash == std::string_view::npos) return value;
-  return at(value.dictionary(), path.substr(slash + 1));
-}
-
-// Whether the entry of that path, or something that is written behind it, comes back differently.
-bool damages(const Dictionary& tags, std::string_view path, Layout layout) {
-  const std::string key(path.substr(0, path.find_first_of("/[")));
-  const Dictionary back = comesBack(tags, layout);
-  if (back[key] != tags[key]) return true;
-  Dictionary without = tags;
-  without.remove(key);
-  Dictionary backWithout = back;
-  backWithout.remove(key);
-  return comesBack(without, layout) != backWithout;
-}
-
-bool isDamage(const Loss& loss) {
-  return loss.code == LossCode::dataUnaligned || loss.code == LossCode::size16bit ||
-         loss.code == LossCode::guidLength;
-}
-
-// What is left when everything is taken out that makes a reader misread what follows it.
-Dictionary withoutDamage(Dictionary tags, const std::vector<Loss>& losses) {
-  for (const Loss& loss : losses) {
-    if (isDamage(loss)) tags.remove(loss.path.substr(0, loss.path.find_first_of("/[")));
-  }
-  return tags;
-}
-
-// Whether the path's value comes back differently: as part of the whole, or where damage by others
-// hides that, as part of the nested dictionary around it.
-bool shows(const Dictionary& tags, std::string_view path, Layout layout) {
-  if (at(tags, path) != at(comesBack(tags, layout), path)) return true;
-  const std::size_t slash = path.find('/');
-  if (slash == std::string_view::npos) return false;
-  return shows(at(tags, path.substr(0, slash)).dictionary(), path.substr(slash + 1), layout);
-}
-
-bool isReal(const Loss& loss, const Dictionary& tags, const std::vector<Loss>& losses,
-            Layout layout) {
-  if (isDamage(loss)) return damages(tags, loss.path, layout);
-  return shows(tags, loss.path, layout) || shows(withoutDamage(tags, losses), loss.path, layout);
-}
-
 std::string describe(const std::vector<Loss>& losses) {
   std::string text;
   for (const Loss& loss : losses) text += std::string(codeOf(loss.code)) + " " + loss.path + "; ";
@@ -236,7 +178,7 @@ TEST(LossesProperty, EveryLossIsRealAndExplained) {
       for (const Loss& loss : losses) {
         ++counts[static_cast<std::size_t>(loss.code)];
         ASSERT_NE(loss.code, LossCode::notReadBack) << i << ": " << describe(losses);
-        ASSERT_TRUE(isReal(loss, tags, losses, layout))
+        ASSERT_TRUE(isReal(loss, tags, layout))
             << i << ": " << codeOf(loss.code) << ' ' << loss.path << " of " << describe(losses);
       }
     }

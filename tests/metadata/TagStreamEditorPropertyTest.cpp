@@ -15,11 +15,14 @@
 #include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
+#include "tests/support/StreamParts.h"
 
 namespace oxmv {
 namespace {
 
 using test::Bytes;
+using test::bytesWithout;
+using test::partsOf;
 using test::StreamBuilder;
 
 class Random {
@@ -91,9 +94,9 @@ Bytes damaged(Bytes stream, Random& random) {
   return stream;
 }
 
-Dictionary loaded(const Bytes& stream, StreamObserver* observer = nullptr) {
+Dictionary loaded(const Bytes& stream) {
   if (stream.size() < 12) return {};
-  return decodeStream(stream, static_cast<std::int32_t>(stream.size()), nullptr, observer);
+  return decodeStream(stream, static_cast<std::int32_t>(stream.size()));
 }
 
 enum class Operation { set, append, remove };
@@ -161,43 +164,6 @@ Dictionary applied(Dictionary tags, const Edit& edit) {
   return tags;
 }
 
-// The bytes of every record at the outermost level that does not have one of those tags, with its
-// padding; and what trails.
-class Others final : public StreamObserver {
- public:
-  Others(const Bytes& stream, std::vector<Tag> named) : stream_(stream), named_(std::move(named)) {
-    loaded(stream, this);
-    if (end_ < stream.size()) add(end_, stream.size());
-  }
-  Bytes bytes;
-
-  void onRecord(const Record& record) override {
-    if (record.level != 0) return;
-    const std::size_t end =
-        std::min<std::size_t>(record.offset + std::max(record.length, 8u), stream_.size());
-    end_ = end;
-    if (std::find(named_.begin(), named_.end(), record.tag) != named_.end()) return;
-    add(record.offset, end);
-  }
-  void onMarker(std::size_t at, std::uint32_t, int level) override {
-    if (level != 0) return;
-    end_ = at + 4;
-    add(at, end_);
-  }
-
- private:
-  void add(std::size_t begin, std::size_t end) {
-    Bytes some(stream_.begin() + static_cast<std::ptrdiff_t>(begin),
-               stream_.begin() + static_cast<std::ptrdiff_t>(end));
-    some.resize((some.size() + 3) / 4 * 4);  // what ends the stream without padding may get it
-    bytes.insert(bytes.end(), some.begin(), some.end());
-  }
-
-  const Bytes& stream_;
-  const std::vector<Tag> named_;
-  std::size_t end_ = 0;
-};
-
 std::vector<Tag> namedBy(const std::string& path) {
   const std::string key = path.substr(0, 4);
   if (key == "TAG ") return {"TAGN"_tag, "TAGV"_tag};
@@ -237,8 +203,8 @@ bool holdsFor(const Bytes& stream, const Edit& edit, int round) {
         << round;
     return true;
   }
-  EXPECT_EQ(Others(editor.stream(), namedBy(edit.path)).bytes,
-            Others(stream, namedBy(edit.path)).bytes)
+  const std::vector<Tag> named = namedBy(edit.path);
+  EXPECT_EQ(bytesWithout(named, partsOf(editor.stream())), bytesWithout(named, partsOf(stream)))
       << round << ' ' << edit.path;
   return true;
 }

@@ -217,6 +217,27 @@ TEST(TagStreamEditor, KeepsTheTerminatorBehindControlPoints) {
   EXPECT_EQ(remove(stream, "CTLp"), StreamBuilder().record("TAKE", 'B', 1).bytes());
 }
 
+TEST(TagStreamEditor, TakesNoOtherRecordForTheTerminatorOfControlPoints) {
+  const std::string_view zeros("\0\0\0\0", 4);
+  const Bytes point = {1, 0, 0, 0, 2, 0, 0, 0};
+  const StreamBuilder withPayload = StreamBuilder().record(zeros, 0, "kept");
+  EXPECT_EQ(remove(StreamBuilder().record("CTLp", 0, point).raw(withPayload.bytes()), "CTLp"),
+            withPayload.bytes());
+  const StreamBuilder withType = StreamBuilder().header(zeros, 0, 'c').record("TAKE", 'B', 1);
+  EXPECT_EQ(remove(StreamBuilder().record("CTLp", 0, point).raw(withType.bytes()), "CTLp"),
+            withType.bytes());
+}
+
+TEST(TagStreamEditor, PutsInOneTerminatorAlsoWhereLostDataLookLikeMore) {
+  // 65536 bytes of data, of whose size 16 bits are kept: the zeros stand behind the record.
+  const Value points =
+      Array::of(Dictionary{{"FREE", Value::data(std::vector<std::uint8_t>(65536))}});
+  TagStreamEditor editor(ordinary().bytes(), Layout::exact);
+  EXPECT_EQ(outcome(editor.set("CTLp", points, Fidelity::lossy)), "done");
+  const Bytes kept = {0, 0, 0, 0, 0, 0, 0, 0, 'F', 'R', 'E', 'E', 0, 0, 0, 'c'};
+  EXPECT_EQ(editor.stream(), ordinary().record("CTLp", 0, kept).raw(Bytes(8)).bytes());
+}
+
 // ISO 400 and Lens "35mm" in the group, with another tag between the records of the first.
 StreamBuilder grouped() {
   return StreamBuilder()
