@@ -132,19 +132,32 @@ int fail(Outcome outcome, std::string_view what, std::string_view code) {
   return exitCode(outcome);
 }
 
+int runOrRefuse(std::span<const char* const> argv, StandardOutput& output) {
+  try {
+    return runArguments(argv, output);
+  } catch (const UsageError& error) {
+    return fail(Outcome::usage, error.what(), error.code());
+  }
+}
+
+// To say so must take no memory itself.
+int failShort(Outcome outcome, std::string_view line) noexcept {
+  writeStandardError(line);
+  return exitCode(outcome);
+}
+
 }  // namespace
 
 int run(std::span<const char* const> argv) {
   prepareStandardStreams();
   StandardOutput output;
   try {
-    return runArguments(argv, output);
-  } catch (const UsageError& error) {
-    return fail(Outcome::usage, error.what(), error.code());
+    return runOrRefuse(argv, output);
   } catch (const std::bad_alloc&) {
-    return fail(Outcome::failed, "not enough memory", "no-memory");
+    return failShort(Outcome::failed, "oxmv: error: not enough memory (no-memory)\n");
   } catch (...) {
-    return fail(Outcome::bug, "a bug in oxmv; please report what you called it with", "bug");
+    return failShort(Outcome::bug,
+                     "oxmv: error: a bug in oxmv; please report what you called it with (bug)\n");
   }
 }
 

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <cstdlib>
 #include <memory>
 #include <new>
 #include <string_view>
@@ -16,7 +17,35 @@ namespace {
 
 struct Unref {
   void operator()(ExifData* data) const { ::exif_data_unref(data); }
+  void operator()(ExifMem* memory) const { ::exif_mem_unref(memory); }
 };
+
+// Where the library gets no memory it leaves out what it wanted that for, and says nothing. So those
+// it asks remember whether they had none.
+thread_local bool isMemoryShort = false;
+
+void* remembering(void* memory) {
+  if (memory == nullptr) isMemoryShort = true;
+  return memory;
+}
+
+// Throws std::bad_alloc.
+std::unique_ptr<ExifData, Unref> load(std::span<const std::uint8_t> segment) {
+  isMemoryShort = false;
+  const std::unique_ptr<ExifMem, Unref> memory(
+      ::exif_mem_new([](ExifLong size) { return remembering(std::calloc(size, 1)); },
+                     [](void* old, ExifLong size) { return remembering(std::realloc(old, size)); },
+                     [](void* old) { std::free(old); }));
+  if (memory == nullptr) throw std::bad_alloc();
+  std::unique_ptr<ExifData, Unref> data(::exif_data_new_mem(memory.get()));
+  if (data == nullptr) throw std::bad_alloc();
+  // A segment is shorter than 64 KiB; of more bytes the library would not look at the rest either.
+  constexpr std::size_t most = 0xFFFF;
+  ::exif_data_load_data(data.get(), segment.data(),
+                        static_cast<unsigned>(std::min(segment.size(), most)));
+  if (isMemoryShort) throw std::bad_alloc();
+  return data;
+}
 
 template <class Fraction>
 std::optional<double> quotient(const Fraction& fraction) {
@@ -74,13 +103,7 @@ std::optional<std::string> textOf(const ExifEntry* entry) {
 ExifProperties readExif(std::span<const std::uint8_t> segment) {
   const auto reduced = reducedExif(segment);
   if (!reduced) return {};
-  const std::unique_ptr<ExifData, Unref> data(::exif_data_new());
-  if (data == nullptr) throw std::bad_alloc();
-  // A segment is shorter than 64 KiB; of more bytes the library would not look at the rest either.
-  constexpr std::size_t most = 0xFFFF;
-  ::exif_data_load_data(data.get(), reduced->data(),
-                        static_cast<unsigned>(std::min(reduced->size(), most)));
-
+  const auto data = load(*reduced);
   const ExifByteOrder order = ::exif_data_get_byte_order(data.get());
   return {
       .focalLength = numberOf(find(*data, EXIF_IFD_EXIF, ExifTagNumber::focalLength), order),

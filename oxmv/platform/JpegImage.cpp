@@ -2,6 +2,7 @@
 
 #include <memory>
 #include <new>
+#include <string_view>
 
 #include <turbojpeg.h>
 
@@ -26,7 +27,11 @@ bool isJpegImage(std::span<const std::uint8_t> bytes) {
   int colours = 0;
   ::tjDecompressHeader3(decompressor.get(), bytes.data(), bytes.size(), &width, &height, &sampling,
                         &colours);
-  return width > 0 && height > 0;
+  const bool hasSize = width > 0 && height > 0;
+  // Want of memory has no code of its own, only these words, which are never translated.
+  const std::string_view problem = ::tjGetErrorStr2(decompressor.get());
+  if (!hasSize && problem.find("Insufficient memory") != problem.npos) throw std::bad_alloc();
+  return hasSize;
 }
 
 }  // namespace oxmv

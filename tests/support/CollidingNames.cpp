@@ -2,12 +2,13 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cstdint>
 
 namespace oxmv::test {
 namespace {
 
-// The hash takes a text in words of 8 bytes, the first byte lowest:
+// The hash takes a text in words of 8 bytes, in the byte order of the machine:
 //
 //   hash := seed ^ length * m;   for each word: hash := (hash ^ scrambled(word)) * m;   finish
 //   scrambled(word) := folded(word * m) * m,   folded(x) := x ^ x >> 47
@@ -33,7 +34,8 @@ constexpr std::uint64_t scrambled(std::uint64_t word) { return folded(word * m) 
 constexpr std::uint64_t unscrambled(std::uint64_t word) { return folded(word * unM) * unM; }
 
 void append(std::string& text, std::uint64_t word) {
-  for (int shift = 0; shift < 64; shift += 8) text += static_cast<char>(word >> shift & 0xFF);
+  const auto bytes = std::bit_cast<std::array<char, sizeof word>>(word);
+  text.append(bytes.begin(), bytes.end());
 }
 
 }  // namespace
@@ -50,10 +52,11 @@ std::vector<std::string> collidingNames(std::size_t count) {
     const std::uint64_t second = unscrambled(hash ^ wanted);
     // One in 256 is ASCII. The others would not be UTF-8 and change when they are converted. A NUL
     // at the end would be taken for padding.
-    if ((second & highBits) != 0 || second >> 56 == 0) continue;
+    if ((second & highBits) != 0) continue;
     std::string name;
     append(name, first);
     append(name, second);
+    if (name.back() == '\0') continue;
     names.push_back(name);
   }
   return names;

@@ -46,8 +46,12 @@ void* take(std::size_t size, std::align_val_t alignment = {}) noexcept {
 }
 
 void* takeOrThrow(std::size_t size, std::align_val_t alignment = {}) {
-  if (void* memory = take(size, alignment)) return memory;
-  throw std::bad_alloc();
+  for (;;) {
+    if (void* memory = take(size, alignment)) return memory;
+    const std::new_handler handler = std::get_new_handler();
+    if (handler == nullptr) throw std::bad_alloc();
+    handler();
+  }
 }
 
 void giveBack(void* memory) noexcept {
