@@ -57,6 +57,8 @@ CLI::Option* declare(CLI::App& app, const FlagRow& row) {
   return app.add_option(names)->expected(1)->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
 }
 
+bool beginsLikeAFlag(std::string_view argument) { return argument.starts_with('-'); }
+
 [[noreturn]] void refuseFlag(std::string_view typed) {
   const std::string_view name = typed.substr(0, typed.find('='));
   using Names = std::vector<std::string_view>;
@@ -105,6 +107,11 @@ const FlagRow& rowOf(Flag flag) noexcept { return rows[static_cast<std::size_t>(
 
 Arguments Arguments::parse(std::span<const char* const> argv) {
   Arguments arguments;
+  if (std::none_of(argv.begin(), argv.end(), beginsLikeAFlag)) {
+    // Nothing but words: declaring the flags would be most of what "oxmv version" does.
+    if (!argv.empty()) arguments.words_.assign(argv.begin() + 1, argv.end());
+    return arguments;
+  }
   CLI::App app;
   app.set_help_flag();  // its own help knows nothing of verbs
   // Words are not declared: the parser would take "[a,b]" apart. They come with the unknown flags.
