@@ -11,7 +11,7 @@
 namespace oxmv {
 
 // Generated: the text of cameras.toml. See CMakeLists.txt.
-extern const std::string_view builtInCameras;
+[[gnu::visibility("hidden")]] extern const std::string_view builtInCameras;
 
 namespace {
 
