@@ -17,8 +17,6 @@ namespace {
 
 using Problem = CameraTablesProblem;
 
-constexpr std::size_t maxSize = std::size_t{64} << 10;
-
 bool isLetter(char c) { return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z'); }
 bool isDigit(char c) { return c >= '0' && c <= '9'; }
 bool isPrintable(char c) { return c >= 0x20 && c < 0x7F; }
@@ -126,7 +124,7 @@ const CameraTables& CameraTables::builtIn() {
 }
 
 std::variant<CameraTables, CameraTablesProblem> CameraTables::fromText(std::string_view toml) {
-  if (toml.size() > maxSize) return Problem{"larger than 64 KiB"};
+  if (toml.size() > maxCameraTablesSize) return Problem{"larger than 64 KiB"};
   TomlProblem mistake;
   const auto text = TomlText::parse(std::string(toml), &mistake);
   if (!text) return Problem{"line " + std::to_string(mistake.line) + ": " + mistake.message};
