@@ -11,13 +11,11 @@
 namespace oxmv {
 
 // Generated: the text of cameras.toml. See CMakeLists.txt.
-extern const std::string_view builtInCameras;
+[[gnu::visibility("hidden")]] extern const std::string_view builtInCameras;
 
 namespace {
 
 using Problem = CameraTablesProblem;
-
-constexpr std::size_t maxSize = std::size_t{64} << 10;
 
 bool isLetter(char c) { return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z'); }
 bool isDigit(char c) { return c >= '0' && c <= '9'; }
@@ -126,7 +124,7 @@ const CameraTables& CameraTables::builtIn() {
 }
 
 std::variant<CameraTables, CameraTablesProblem> CameraTables::fromText(std::string_view toml) {
-  if (toml.size() > maxSize) return Problem{"larger than 64 KiB"};
+  if (toml.size() > maxCameraTablesSize) return Problem{"larger than 64 KiB"};
   TomlProblem mistake;
   const auto text = TomlText::parse(std::string(toml), &mistake);
   if (!text) return Problem{"line " + std::to_string(mistake.line) + ": " + mistake.message};

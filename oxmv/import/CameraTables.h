@@ -10,6 +10,9 @@
 
 namespace oxmv {
 
+// The largest text that is taken for tables. Those that people write are far smaller.
+constexpr std::size_t maxCameraTablesSize = std::size_t{64} << 10;
+
 // Why a text holds no camera tables: `long-prefixes, row 3: prefix "QX301" is not like QX3.01`.
 struct CameraTablesProblem {
   std::string message;
@@ -43,8 +46,7 @@ class CameraTables {
 
   static const CameraTables& builtIn();
 
-  // Exactly the three tables, each with exactly its rows, in a text of at most 64 KiB: tables that
-  // people write are far smaller.
+  // Exactly the three tables, each with exactly its rows, in a text of at most maxCameraTablesSize.
   static std::variant<CameraTables, CameraTablesProblem> fromText(std::string_view toml);
 
   const std::array<FirmwareRow, 2>& shortPrefixes() const { return shortPrefixes_; }

@@ -10,7 +10,7 @@ using detail::Slot;
 
 namespace detail {
 
-class ArrayBox final : public Shared {
+class [[gnu::visibility("hidden")]] ArrayBox final : public Shared {
  public:
   explicit ArrayBox(std::vector<Value> values) : elements(std::move(values)) {}
   const std::vector<Value> elements;

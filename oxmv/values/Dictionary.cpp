@@ -43,7 +43,7 @@ namespace detail {
 // The entries of a dictionary that a host made or changed. An entry that was removed stays as a
 // vacant place, so that removing costs no more than finding, until vacant places outnumber the
 // others.
-class Table final : public Shared {
+class [[gnu::visibility("hidden")]] Table final : public Shared {
  public:
   Table() = default;
   // The same entries, none vacant. Copies no payload.
