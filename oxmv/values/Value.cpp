@@ -86,16 +86,20 @@ Value Value::wholeText(Form form, std::string_view text) {
   return isUtf8(text) ? whole(form, asBytes(text)) : whole(form, asBytes(utf8FromLatin1(text)));
 }
 
-Value Value::textIn(const Block& block, Slot slot) {
+void Value::borrowText(const Block& block, Slot slot) {
   bool isValid = false;
   if (slot.form() == Form::textToNul) {
     const Cut cut = cutAtNul(block, slot);
     slot = cut.text;
     isValid = cut.isAscii;
   }
-  if (!isValid && !isUtf8(block.text(slot))) return wholeText(Form::wholeText, block.text(slot));
-  block.retain();
-  return Value(slot, &block);
+  if (!isValid && !isUtf8(block.text(slot))) {
+    *this = wholeText(Form::wholeText, block.text(slot));
+    return;
+  }
+  release();
+  slot_ = slot.lent();
+  content_.owner = &block;
 }
 
 bool Value::isNumber() const noexcept {

@@ -72,8 +72,16 @@ class Value {
   Value(const Array& array) noexcept;
   Value(const Dictionary& dictionary) noexcept;
 
-  Value(const Value& other) noexcept : slot_(other.slot_), content_(other.content_) { retain(); }
-  Value(Value&& other) noexcept : slot_(other.slot_), content_(other.content_) { other.slot_ = {}; }
+  Value(const Value& other) noexcept : slot_(other.slot_.kept()), content_(other.content_) {
+    retain();
+  }
+  Value(Value&& other) noexcept : slot_(other.slot_.kept()), content_(other.content_) {
+    if (other.slot_.isLent()) {
+      retain();
+    } else {
+      other.slot_ = {};
+    }
+  }
   Value& operator=(Value other) noexcept {
     std::swap(slot_, other.slot_);
     std::swap(content_, other.content_);
@@ -125,13 +133,28 @@ class Value {
 
   // Internal: the value of a slot of `block`.
   static Value in(const detail::Block& block, detail::Slot slot) {
+    Value lent;
+    lent.borrow(block, slot);
+    return Value(std::move(lent));
+  }
+  // Internal: becomes the value of a slot of `block`, or that of `other`, without a share in the
+  // payload, whose owner has to stay. Whatever is copied or moved from it has a share.
+  void borrow(const detail::Block& block, detail::Slot slot) {
     using detail::Form;
     const Form form = slot.form();
-    if (form == Form::integer) return {IntegerTag{}, static_cast<std::int32_t>(slot.body)};
-    if (form == Form::float32) return {slot, nullptr};
-    if (form == Form::text || form == Form::textToNul) return textIn(block, slot);
-    block.retain();
-    return {slot, &block};
+    if (form == Form::text || form == Form::textToNul) return borrowText(block, slot);
+    release();
+    slot_ = slot.lent();
+    if (form == Form::integer) {
+      content_.integer = static_cast<std::int32_t>(slot.body);
+    } else {
+      content_.owner = &block;
+    }
+  }
+  void borrow(const Value& other) noexcept {
+    release();
+    slot_ = other.slot_.lent();
+    content_ = other.content_;
   }
 
  private:
@@ -153,7 +176,7 @@ class Value {
       : slot_(detail::Slot::scalar(detail::Form::integer, 0)), content_{.integer = number} {}
   Value(detail::Slot slot, const detail::Shared* owner) noexcept
       : slot_(slot), content_{.owner = owner} {}
-  static Value textIn(const detail::Block& block, detail::Slot slot);
+  void borrowText(const detail::Block& block, detail::Slot slot);
   static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
   static Value wholeText(detail::Form form, std::string_view text);
 
@@ -180,6 +203,7 @@ class Value {
     if (const auto* shared = owner()) shared->retain();
   }
   void release() const noexcept {
+    if (slot_.isLent()) return;
     if (const auto* shared = owner()) shared->release();
   }
 

@@ -15,13 +15,24 @@ using detail::Header;
 using detail::Key;
 using detail::Slot;
 
+static_assert(Slot::maxSize >= 2 * 0xFFFFFF, "a name of 24 bits of ISO-8859-1 fits in UTF-8");
 static_assert(sizeof(Slot) == 8 && sizeof(Key) == 4, "a block is as small as that");
 
 TEST(Slot, HoldsFormSizeAndPlace) {
   const Slot slot = Slot::place(Form::data, Slot::maxSize, 0xFFFFFFFEu);
   EXPECT_EQ(slot.form(), Form::data);
-  EXPECT_EQ(slot.size(), 0xFFFFFFFu);
+  EXPECT_EQ(slot.size(), Slot::maxSize);
   EXPECT_EQ(slot.body, 0xFFFFFFFEu);
+}
+
+TEST(Slot, MarkOfALentValueLeavesTheRest) {
+  const Slot slot = Slot::place(Form::wholeData, Slot::maxSize, 0xFFFFFFFEu);
+  EXPECT_FALSE(slot.isLent());
+  EXPECT_TRUE(slot.lent().isLent());
+  EXPECT_EQ(slot.lent().form(), Form::wholeData);
+  EXPECT_EQ(slot.lent().size(), Slot::maxSize);
+  EXPECT_EQ(slot.lent().body, 0xFFFFFFFEu);
+  EXPECT_EQ(slot.lent().kept(), slot);
 }
 
 TEST(Header, KeepsItsCountBesideTheSortedBit) {
