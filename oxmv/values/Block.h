@@ -131,6 +131,8 @@ struct Header {
 class Block final : public Shared {
  public:
   // One allocation that holds copies of all that is given; the bytes are `head` followed by `tail`.
+  // So many zeros stand behind them, for those who read texts several bytes at a time.
+  static constexpr std::size_t readAhead = 32;
   static Ref<const Block> make(std::span<const std::uint8_t> head, std::string_view tail,
                                std::span<const Slot> slots, std::span<const Key> keys);
 
@@ -144,8 +146,10 @@ class Block final : public Shared {
   Header header(std::uint32_t index) const { return Header::of(slots_[index]); }
   const Slot* items(std::uint32_t headerIndex) const { return slots_ + headerIndex + 1; }
 
-  std::string_view keyText(std::uint32_t index) const {
-    return keys_[index].isTag() ? keys_[index].tagText() : text(slots_[keys_[index].slot()]);
+  const Key* keys(std::uint32_t headerIndex) const { return keys_ + header(headerIndex).firstKey; }
+  // The key stands among those of this block.
+  std::string_view keyText(const Key& key) const {
+    return key.isTag() ? key.tagText() : text(slots_[key.slot()]);
   }
   // The slot of the value under `key` in the dictionary of that header; null when it has no such
   // key.

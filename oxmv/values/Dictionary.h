@@ -114,23 +114,30 @@ class Dictionary::Iterator {
   friend class Dictionary;
   Iterator(const Dictionary* dictionary, std::size_t place, std::size_t end)
       : dictionary_(dictionary), place_(place), end_(end) {
+    if (place_ == end_) return;
+    if (!dictionary->isTable()) {
+      const std::uint32_t header = dictionary->value_.slot_.body;
+      block_ = &dictionary->value_.block();
+      slots_ = block_->items(header);
+      keys_ = block_->keys(header);
+    }
     arrive();
   }
   // Borrows the entry of the place; from a vacant one it goes on to the next that is not.
   void arrive() {
     if (place_ == end_) return;
-    const Value& whole = dictionary_->value_;
-    if (dictionary_->isTable()) return arriveInTable();
-    const detail::Block& block = whole.block();
-    const std::uint32_t header = whole.slot_.body;
-    entry_.key = block.keyText(block.header(header).firstKey + static_cast<std::uint32_t>(place_));
-    entry_.value.borrow(block, block.items(header)[place_]);
+    if (block_ == nullptr) return arriveInTable();
+    entry_.key = block_->keyText(keys_[place_]);
+    entry_.value.borrow(*block_, slots_[place_]);
   }
   void arriveInTable();
 
   const Dictionary* dictionary_ = nullptr;
   std::size_t place_ = 0;
   std::size_t end_ = 0;
+  const detail::Block* block_ = nullptr;  // null: the entries stand in a table
+  const detail::Slot* slots_ = nullptr;
+  const detail::Key* keys_ = nullptr;
   Entry entry_;
 };
 

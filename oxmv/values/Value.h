@@ -3,6 +3,7 @@
 #pragma once
 
 #include <array>
+#include <bit>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -98,13 +99,23 @@ class Value {
   // Numbers. Integers give their low bits; floats and doubles are truncated toward zero and
   // saturate (not a number gives 0); text is read like a number at its start (white space, sign,
   // digits); every other kind gives 0.
-  std::int32_t intValue() const noexcept;
-  std::int64_t int64Value() const noexcept;
-  float floatValue() const noexcept;
-  double doubleValue() const noexcept;
+  std::int32_t intValue() const noexcept {
+    return isInteger() ? static_cast<std::int32_t>(content_.integer) : intOfOther();
+  }
+  std::int64_t int64Value() const noexcept {
+    return isInteger() ? content_.integer : int64OfOther();
+  }
+  float floatValue() const noexcept {
+    return isFloat32() ? std::bit_cast<float>(slot_.body) : floatOfOther();
+  }
+  double doubleValue() const noexcept {
+    return slot_.form() == detail::Form::float64 ? content_.float64 : doubleOfOther();
+  }
   // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a signalling
   // not-a-number would arrive as a quiet one.
-  std::uint32_t floatBits() const noexcept;
+  std::uint32_t floatBits() const noexcept {
+    return isFloat32() ? slot_.body : std::bit_cast<std::uint32_t>(floatOfOther());
+  }
 
   // The characters of a text; empty for every other kind. The view holds as long as this value.
   std::string_view text() const& noexcept {
@@ -145,11 +156,10 @@ class Value {
     if (form == Form::text || form == Form::textToNul) return borrowText(block, slot);
     release();
     slot_ = slot.lent();
-    if (form == Form::integer) {
-      content_.integer = static_cast<std::int32_t>(slot.body);
-    } else {
-      content_.owner = &block;
-    }
+    // Which of them no processor foresees: no branch, but a table of both.
+    const std::array contents = {Content{.owner = &block},
+                                 Content{.integer = static_cast<std::int32_t>(slot.body)}};
+    content_ = contents[form == Form::integer];
   }
   void borrow(const Value& other) noexcept {
     release();
@@ -177,6 +187,14 @@ class Value {
   Value(detail::Slot slot, const detail::Shared* owner) noexcept
       : slot_(slot), content_{.owner = owner} {}
   void borrowText(const detail::Block& block, detail::Slot slot);
+
+  bool isInteger() const noexcept { return slot_.form() == detail::Form::integer; }
+  bool isFloat32() const noexcept { return slot_.form() == detail::Form::float32; }
+  std::int32_t intOfOther() const noexcept;
+  std::int64_t int64OfOther() const noexcept;
+  float floatOfOther() const noexcept;
+  double doubleOfOther() const noexcept;
+
   static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
   static Value wholeText(detail::Form form, std::string_view text);
 
@@ -202,9 +220,10 @@ class Value {
   void retain() const noexcept {
     if (const auto* shared = owner()) shared->retain();
   }
+  // Whether there is something to release.
+  bool hasShare() const noexcept { return !slot_.isLent() && owner() != nullptr; }
   void release() const noexcept {
-    if (slot_.isLent()) return;
-    if (const auto* shared = owner()) shared->release();
+    if (hasShare()) content_.owner->release();
   }
 
   detail::Slot slot_;

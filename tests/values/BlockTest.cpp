@@ -70,7 +70,7 @@ TEST(Key, HoldsThePlaceOfAnyOtherText) {
 
 TEST(Block, HoldsCopiesOfAllThatItIsGiven) {
   std::array<std::uint8_t, 3> head = {1, 2, 3};
-  std::array<Slot, 2> slots = {Slot::scalar(Form::integer, 7), Slot::place(Form::text, 2, 2)};
+  std::array<Slot, 2> slots = {Header{1, false, 0}.slot(), Slot::place(Form::text, 2, 2)};
   std::array<Key, 1> keys = {Key::textAt(1)};
   const auto block = Block::make(head, "xy", slots, keys);
   head.fill(0);
@@ -80,7 +80,7 @@ TEST(Block, HoldsCopiesOfAllThatItIsGiven) {
   EXPECT_EQ(std::vector(block->bytes().begin(), block->bytes().end()),
             (std::vector<std::uint8_t>{1, 2, 3, 'x', 'y'}));
   EXPECT_EQ(block->text(Slot::place(Form::text, 2, 3)), "xy");
-  EXPECT_EQ(block->keyText(0), "\3x");
+  EXPECT_EQ(block->keyText(block->keys(0)[0]), "\3x");
 }
 
 }  // namespace
