@@ -191,7 +191,7 @@ class Decoder {
   Slot plainSlot(const detail::PlainRule& rule, std::uint32_t size, std::size_t payload) const {
     const std::uint32_t word = loadLe32(bytes_.data() + payload);
     const auto offset = static_cast<std::uint32_t>(payload);
-    return {static_cast<std::uint32_t>(rule.form) | (size << Slot::formBits & rule.placeMask),
+    return {static_cast<std::uint32_t>(rule.form) | (size << Slot::sizeShift & rule.placeMask),
             (word & rule.numberMask) | (offset & rule.placeMask)};
   }
 

@@ -158,7 +158,7 @@ bool appendLiteral(std::string& out, const Value& value, std::size_t depth);
 
 bool appendElements(std::string& out, const Array& elements, std::size_t depth) {
   const char* before = "[";
-  for (const Value element : elements) {
+  for (const Value& element : elements) {
     out += std::exchange(before, ", ");
     if (!appendLiteral(out, element, depth)) return false;
   }

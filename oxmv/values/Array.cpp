@@ -38,11 +38,8 @@ std::size_t Array::sizeOfValues() const noexcept {
   return value_.block().header(slot.body).count;
 }
 
-Value Array::valueAt(std::size_t index) const {
-  const Slot slot = value_.slot_;
-  if (slot.form() == Form::arrayBox) return boxed(*value_.owner())[index];
-  const detail::Block& block = value_.block();
-  return Value::in(block, block.items(slot.body)[index]);
+void Array::borrowFromBox(Value& element, std::size_t index) const noexcept {
+  element.borrow(boxed(*value_.owner())[index]);
 }
 
 bool operator==(const Array& a, const Array& b) { return Value(a) == Value(b); }

@@ -36,15 +36,12 @@ class Array {
   bool empty() const noexcept { return size() == 0; }
   // `index` must be below size().
   Value operator[](std::size_t index) const {
-    if (!isWords()) return valueAt(index);
-    const detail::Block& block = value_.block();
-    const detail::Form form =
-        value_.slot_.form() == detail::Form::floats ? detail::Form::float32 : detail::Form::integer;
-    const std::uint8_t* words = block.bytes(value_.slot_).data();
-    return Value::in(block, detail::Slot::scalar(form, loadLe32(words + index * wordSize)));
+    Value element;
+    borrowTo(element, index);
+    return Value(std::move(element));
   }
 
-  Iterator begin() const noexcept;
+  Iterator begin() const;
   Iterator end() const noexcept;
 
   friend bool operator==(const Array& a, const Array& b);
@@ -58,46 +55,70 @@ class Array {
     const detail::Form form = value_.slot_.form();
     return form == detail::Form::floats || form == detail::Form::integers;
   }
+  void borrowTo(Value& element, std::size_t index) const {
+    using detail::Form;
+    if (value_.slot_.form() == Form::arrayBox) return borrowFromBox(element, index);
+    const detail::Block& block = value_.block();
+    if (!isWords()) return element.borrow(block, block.items(value_.slot_.body)[index]);
+    const Form form = value_.slot_.form() == Form::floats ? Form::float32 : Form::integer;
+    const std::uint8_t* words = block.bytes(value_.slot_).data();
+    element.borrow(block, detail::Slot::scalar(form, loadLe32(words + index * wordSize)));
+  }
   // Of lists and boxes.
   std::size_t sizeOfValues() const noexcept;
-  Value valueAt(std::size_t index) const;
+  void borrowFromBox(Value& element, std::size_t index) const noexcept;
 
   Value value_;  // nothing, or of an array's form
 };
 
-// Goes through an array, which must outlive it. Yields values, not references: most are made on the
-// way.
+// Goes through an array, which must outlive it. The element that it has come to stands in the
+// iterator itself, as an entry does in a dictionary's: see there.
 class Array::Iterator {
  public:
   using value_type = Value;
   using difference_type = std::ptrdiff_t;
   using iterator_category = std::input_iterator_tag;
-  using reference = Value;
+  using reference = const Value&;
   using pointer = void;
 
   Iterator() = default;
-  Value operator*() const { return (*array_)[index_]; }
+  const Value& operator*() const& { return element_; }
+  Value operator*() const&& { return element_; }
   Iterator& operator++() {
     ++index_;
+    arrive();
     return *this;
   }
   Iterator operator++(int) {
     Iterator old = *this;
-    ++index_;
+    ++*this;
     return old;
   }
-  bool operator==(const Iterator&) const = default;
+  bool operator==(const Iterator& other) const {
+    return index_ == other.index_ && array_ == other.array_;
+  }
 
  private:
   friend class Array;
-  Iterator(const Array* array, std::size_t index) : array_(array), index_(index) {}
+  Iterator(const Array* array, std::size_t index, std::size_t end)
+      : array_(array), index_(index), end_(end) {
+    arrive();
+  }
+  void arrive() {
+    if (index_ != end_) array_->borrowTo(element_, index_);
+  }
 
   const Array* array_ = nullptr;
   std::size_t index_ = 0;
+  std::size_t end_ = 0;
+  Value element_;
 };
 
-inline Array::Iterator Array::begin() const noexcept { return {this, 0}; }
+inline Array::Iterator Array::begin() const { return {this, 0, size()}; }
 
-inline Array::Iterator Array::end() const noexcept { return {this, size()}; }
+inline Array::Iterator Array::end() const noexcept {
+  const std::size_t end = size();
+  return {this, end, end};
+}
 
 }  // namespace oxmv

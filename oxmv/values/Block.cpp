@@ -21,13 +21,15 @@ const T* put(std::byte*& place, std::span<const T> items) {
 Ref<const Block> Block::make(std::span<const std::uint8_t> head, std::string_view tail,
                              std::span<const Slot> slots, std::span<const Key> keys) {
   static_assert(alignof(Block) >= alignof(Slot) && alignof(Slot) >= alignof(Key));
-  const std::size_t trailing = slots.size_bytes() + keys.size_bytes() + head.size() + tail.size();
+  const std::size_t trailing =
+      slots.size_bytes() + keys.size_bytes() + head.size() + tail.size() + readAhead;
   auto* block = new (trailing) Block;
   auto* place = reinterpret_cast<std::byte*>(block + 1);
   block->slots_ = put(place, slots);
   block->keys_ = put(place, keys);
   block->bytes_ = put(place, head);
   put(place, std::span(reinterpret_cast<const std::uint8_t*>(tail.data()), tail.size()));
+  std::fill_n(place, readAhead, std::byte{0});
   block->byteCount_ = head.size() + tail.size();
   return Ref<const Block>::adopt(block);
 }
@@ -36,7 +38,7 @@ const Slot* Block::find(std::uint32_t headerIndex, std::string_view key) const {
   const Header dictionary = header(headerIndex);
   const Key* keys = keys_ + dictionary.firstKey;
   const Key* end = keys + dictionary.count;
-  const auto textOf = [&](std::uint32_t index) { return keyText(dictionary.firstKey + index); };
+  const auto textOf = [&](std::uint32_t index) { return keyText(keys[index]); };
   if (dictionary.sorted) {
     // The order: for each place the index of the key there, held as if it were a slot's.
     const Key* orderEnd = end + dictionary.count;

@@ -54,19 +54,28 @@ struct Slot {
 
   // Sizes come from records, whose size field has 24 bits; a name that had to be converted to UTF-8
   // may take twice as many bytes.
-  static constexpr std::uint32_t maxSize = 0xFFFFFFF;
+  static constexpr std::uint32_t maxSize = 0x7FFFFFF;
 
   static constexpr Slot scalar(Form form, std::uint32_t body) {
     return {static_cast<std::uint32_t>(form), body};
   }
   static constexpr Slot place(Form form, std::uint32_t size, std::uint32_t offset) {
-    return {static_cast<std::uint32_t>(form) | size << formBits, offset};
+    return {static_cast<std::uint32_t>(form) | size << sizeShift, offset};
   }
 
-  constexpr Form form() const { return static_cast<Form>(formAndSize & ((1u << formBits) - 1)); }
-  constexpr std::uint32_t size() const { return formAndSize >> formBits; }
+  constexpr Form form() const { return static_cast<Form>(formAndSize & (lentBit - 1)); }
+  constexpr std::uint32_t size() const { return formAndSize >> sizeShift; }
+
+  // The mark of a Value that has no share in its payload. No slot of a block has it.
+  constexpr bool isLent() const { return (formAndSize & lentBit) != 0; }
+  constexpr Slot lent() const { return {formAndSize | lentBit, body}; }
+  constexpr Slot kept() const { return {formAndSize & ~lentBit, body}; }
+
+  constexpr bool operator==(const Slot&) const = default;
 
   static constexpr int formBits = 4;
+  static constexpr std::uint32_t lentBit = 1u << formBits;
+  static constexpr int sizeShift = formBits + 1;
   static_assert(static_cast<int>(Form::dictionaryBox) < 1 << formBits, "every form fits");
 };
 
@@ -122,6 +131,8 @@ struct Header {
 class Block final : public Shared {
  public:
   // One allocation that holds copies of all that is given; the bytes are `head` followed by `tail`.
+  // So many zeros stand behind them, for those who read texts several bytes at a time.
+  static constexpr std::size_t readAhead = 32;
   static Ref<const Block> make(std::span<const std::uint8_t> head, std::string_view tail,
                                std::span<const Slot> slots, std::span<const Key> keys);
 
@@ -135,8 +146,10 @@ class Block final : public Shared {
   Header header(std::uint32_t index) const { return Header::of(slots_[index]); }
   const Slot* items(std::uint32_t headerIndex) const { return slots_ + headerIndex + 1; }
 
-  std::string_view keyText(std::uint32_t index) const {
-    return keys_[index].isTag() ? keys_[index].tagText() : text(slots_[keys_[index].slot()]);
+  const Key* keys(std::uint32_t headerIndex) const { return keys_ + header(headerIndex).firstKey; }
+  // The key stands among those of this block.
+  std::string_view keyText(const Key& key) const {
+    return key.isTag() ? key.tagText() : text(slots_[key.slot()]);
   }
   // The slot of the value under `key` in the dictionary of that header; null when it has no such
   // key.

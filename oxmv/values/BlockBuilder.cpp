@@ -10,6 +10,13 @@ namespace {
 // Bytes of converted names that a block can hold behind the stream's own: offsets have 32 bits.
 constexpr std::size_t maxExtra = 0x7FFFFFFF;
 
+// The first eight bytes of a text as a number; numbers that differ are in the order of their texts.
+std::uint64_t startOf(std::string_view text) {
+  std::uint64_t start = 0;
+  for (const char c : text.substr(0, 8)) start = start << 8 | static_cast<std::uint8_t>(c);
+  return text.size() < 8 ? start << (64 - 8 * text.size()) % 64 : start;
+}
+
 // With more keys than this a group's keys are followed by their order.
 constexpr std::size_t searchedInLine = 16;
 
@@ -84,25 +91,29 @@ void BlockBuilder::putGroups() {
     const std::uint32_t place = named_[i].place;
     Slot& group = open_.slots[place - 1];
     if (group.form() != Form::nothing) continue;  // put with its first entry
-    const std::span<const Named> entries = named_.from(i);
+    const std::span<Named> entries = named_.from(i);
     if (entries.size() <= searchedInLine) {
       mergeFew(entries, place);
     } else {
       mergeMany(entries, place);
     }
-    group = putGroup();
+    group = putGroup(entries);
   }
 }
 
-Slot BlockBuilder::putGroup() {
+// What is in group_, of the entries that were given.
+Slot BlockBuilder::putGroup(std::span<const Named> given) {
   const std::span<const Named> entries = group_.from(0);
-  const bool isSorted = entries.size() > searchedInLine;
+  const bool isSorted = given.size() > searchedInLine;
   const Slot dictionary = putHeader(Form::dictionary, entries.size(), isSorted);
   Slot* value = slots_.extend(entries.size());
   for (const Named& entry : entries) *value++ = entry.value;
   Key* key = keys_.extend(entries.size());
   for (const Named& entry : entries) *key++ = keyOf(entry.name);
-  if (isSorted) putOrder(Header::of(slots_[dictionary.body]));
+  if (!isSorted) return dictionary;
+  // Behind the keys, their order by text.
+  Key* order = keys_.extend(entries.size());
+  for (const Ranked& ranked : ranked_.from(0)) *order++ = Key::textAt(given[ranked.entry].index);
   return dictionary;
 }
 
@@ -135,40 +146,43 @@ BlockBuilder::Named* BlockBuilder::findNamed(std::string_view name) {
   return nullptr;
 }
 
-// The same by sorting, which no choice of names makes slow.
-void BlockBuilder::mergeMany(std::span<const Named> all, std::uint32_t place) {
-  group_.shrink(0);
-  for (const Named& entry : all) {
-    if (entry.place == place) group_.push(entry);
+// The same by sorting, which no choice of names makes slow. Leaves the order of what it has kept in
+// ranked_.
+void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
+  ranked_.shrink(0);
+  for (std::uint32_t i = 0; i < entries.size(); ++i) {
+    if (entries[i].place == place) ranked_.push({startOf(textOf(entries[i].name)), i});
   }
-  const std::span<Named> entries = group_.from(0);
-  std::sort(entries.begin(), entries.end(), [&](const Named& a, const Named& b) {
-    const auto order = textOf(a.name) <=> textOf(b.name);
-    return order != 0 ? order < 0 : a.index < b.index;
-  });
+  const std::span<Ranked> ranked = ranked_.from(0);
+  sortByName(ranked, entries);
   std::size_t kept = 0;
-  for (const Named& entry : entries) {
-    if (kept > 0 && textOf(entries[kept - 1].name) == textOf(entry.name)) {
-      entries[kept - 1].value = entry.value;
+  Named* first = nullptr;  // of those of the same name
+  for (const Ranked& next : ranked) {
+    Named& entry = entries[next.entry];
+    if (first != nullptr && textOf(first->name) == textOf(entry.name)) {
+      first->value = entry.value;
+      entry.place = 0;
     } else {
-      entries[kept++] = entry;
+      first = &entry;
+      ranked[kept++] = next;
     }
   }
-  group_.shrink(kept);
-  std::sort(entries.begin(), entries.begin() + static_cast<std::ptrdiff_t>(kept),
-            [](const Named& a, const Named& b) { return a.index < b.index; });
+  ranked_.shrink(kept);
+  group_.shrink(0);
+  for (Named& entry : entries) {
+    if (entry.place != place) continue;
+    entry.index = static_cast<std::uint32_t>(group_.size());
+    group_.push(entry);
+  }
 }
 
-// Behind the keys of a dictionary: their order by text.
-void BlockBuilder::putOrder(Header dictionary) {
-  const auto textOfKey = [&](Key place) {
-    const Key& key = keys_[dictionary.firstKey + place.slot()];
-    return key.isTag() ? key.tagText() : textOf(slots_[key.slot()]);
-  };
-  const std::size_t first = keys_.size();
-  for (std::uint32_t i = 0; i < dictionary.count; ++i) keys_.push(Key::textAt(i));
-  const std::span<Key> order = keys_.from(first);
-  std::sort(order.begin(), order.end(), [&](Key a, Key b) { return textOfKey(a) < textOfKey(b); });
+// Those of the same name in the order in which they came.
+void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> entries) const {
+  std::sort(ranked.begin(), ranked.end(), [&](const Ranked& a, const Ranked& b) {
+    if (a.start != b.start) return a.start < b.start;
+    const auto order = textOf(entries[a.entry].name) <=> textOf(entries[b.entry].name);
+    return order != 0 ? order < 0 : a.entry < b.entry;
+  });
 }
 
 Slot BlockBuilder::asUtf8(Slot text) {
@@ -196,6 +210,11 @@ std::string_view BlockBuilder::textOf(Slot place) const {
 }
 
 Ref<const Block> BlockBuilder::block() {
+  // What is no longer needed makes room for the block.
+  elements_.release();
+  named_.release();
+  group_.release();
+  ranked_.release();
   return Block::make(bytes_, extra_, slots_.from(0), keys_.from(0));
 }
 

@@ -41,6 +41,13 @@ class Scratch {
     return added;
   }
   void shrink(std::size_t size) { size_ = size; }
+  // Empty, and nothing of the heap.
+  void release() {
+    heap_.reset();
+    items_ = reinterpret_cast<T*>(own_.data());
+    capacity_ = inItself;
+    size_ = 0;
+  }
 
  private:
   void grow(std::size_t count) {
@@ -109,8 +116,7 @@ class BlockBuilder {
   }
   // An entry of the group that is the key's value. `name` is in UTF-8.
   void putNamed(Id id, Key key, Slot name, Slot value) {
-    const auto index = static_cast<std::uint32_t>(named_.size());
-    named_.push({name, value, index, gatheredAt(id, key)});
+    named_.push({name, value, gatheredAt(id, key)});
   }
   // An entry under a key that no id stands for.
   void putOnce(Key key, Slot value) {
@@ -136,8 +142,13 @@ class BlockBuilder {
   };
   struct Named {
     Slot name, value;
-    std::uint32_t index;  // in named_
     std::uint32_t place;
+    std::uint32_t index = 0;  // in the group, once that is put
+  };
+  // An entry of a group by its place in the order by text.
+  struct Ranked {
+    std::uint64_t start;  // of its name, as a number
+    std::uint32_t entry;  // of those that were given
   };
 
   // Where the entry of a list or group stands. Its slot is no value until the dictionary is closed.
@@ -150,11 +161,12 @@ class BlockBuilder {
   Slot putHeader(Form form, std::size_t count, bool sorted);
   void putLists();
   void putGroups();
-  Slot putGroup();
+  Slot putGroup(std::span<const Named> given);
   void mergeFew(std::span<const Named> entries, std::uint32_t place);
-  void mergeMany(std::span<const Named> entries, std::uint32_t place);
+  void mergeMany(std::span<Named> entries, std::uint32_t place);
+  void sortByName(std::span<Ranked> ranked, std::span<const Named> entries) const;
   Named* findNamed(std::string_view name);
-  void putOrder(Header dictionary);
+  void putOrder(std::span<const Named> entries);
   std::string_view textOf(Slot place) const;
 
   const std::span<const std::uint8_t> bytes_;
@@ -166,12 +178,13 @@ class BlockBuilder {
   Scratch<Slot, 2 * (mostEntries + 1)> openSlots_;
   Scratch<Key, 2 * (mostEntries + 1)> openKeys_;
   Scratch<std::uint8_t, 2 * (mostEntries + 1)> places_;
-  Scratch<Element, 64> elements_;
+  Scratch<Element, 1024> elements_;
   Scratch<Named, 32> named_;
-  Scratch<Named, 16> group_;  // the entries of one group, while it is put
+  Scratch<Named, 16> group_;    // the entries of one group, while it is put
+  Scratch<Ranked, 16> ranked_;  // the same by name, where they are many
 
-  Scratch<Slot, 256> slots_;  // of the block to be
-  Scratch<Key, 256> keys_;    // of the block to be
+  Scratch<Slot, 2048> slots_;  // of the block to be
+  Scratch<Key, 640> keys_;     // of the block to be
 };
 
 }  // namespace oxmv::detail

@@ -181,12 +181,12 @@ std::size_t Dictionary::placesOfTable() const noexcept {
   return table() == nullptr ? 0 : table()->places();
 }
 
-bool Dictionary::isVacantInTable(std::size_t place) const noexcept {
-  return table()->isVacant(place);
-}
-
-Dictionary::Entry Dictionary::entryOfTable(std::size_t place) const {
-  return {table()->key(place), table()->value(place)};
+void Dictionary::Iterator::arriveInTable() {
+  const detail::Table& table = *dictionary_->table();
+  while (place_ < end_ && table.isVacant(place_)) ++place_;
+  if (place_ == end_) return;
+  entry_.key = table.key(place_);
+  entry_.value.borrow(table.value(place_));
 }
 
 bool Dictionary::contains(std::string_view key) const { return !(*this)[key].isNothing(); }

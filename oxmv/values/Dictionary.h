@@ -51,7 +51,7 @@ class Dictionary {
   // Answers whether the key was there.
   bool remove(std::string_view key);
 
-  Iterator begin() const noexcept;
+  Iterator begin() const;
   Iterator end() const noexcept;
 
   // Equal are dictionaries with equal values under the same keys, whatever their order.
@@ -70,35 +70,35 @@ class Dictionary {
     if (isTable()) return placesOfTable();
     return value_.isNothing() ? 0 : value_.block().header(value_.slot_.body).count;
   }
-  bool isVacant(std::size_t place) const noexcept { return isTable() && isVacantInTable(place); }
-  Entry entryAt(std::size_t place) const {
-    if (isTable()) return entryOfTable(place);
-    const detail::Block& block = value_.block();
-    const std::uint32_t header = value_.slot_.body;
-    return {block.keyText(block.header(header).firstKey + static_cast<std::uint32_t>(place)),
-            Value::in(block, block.items(header)[place])};
-  }
   std::size_t placesOfTable() const noexcept;
-  bool isVacantInTable(std::size_t place) const noexcept;
-  Entry entryOfTable(std::size_t place) const;
 
   Value value_;  // nothing, or of a dictionary's form
 };
 
 // Goes through the entries in order. The dictionary must outlive it and stay unchanged.
+//
+// The entry that it has come to stands in the iterator itself, until it moves on or is gone; the
+// payload of its value is only lent by the dictionary, so that a loop
+//
+//   for (const auto& [key, value] : tags) ...
+//
+// need not count itself in and out at every entry. Whatever is copied from there (`auto entry =
+// *at`, `kept = value`, `value.dictionary()`) has its share in the payload and may stay longer than
+// the dictionary. An iterator without a name answers such a copy: `*tags.begin()`, `*at++`.
 class Dictionary::Iterator {
  public:
   using value_type = Entry;
   using difference_type = std::ptrdiff_t;
   using iterator_category = std::input_iterator_tag;
-  using reference = Entry;
+  using reference = const Entry&;
   using pointer = void;
 
   Iterator() = default;
-  Entry operator*() const { return dictionary_->entryAt(place_); }
+  const Entry& operator*() const& { return entry_; }
+  Entry operator*() const&& { return entry_; }
   Iterator& operator++() {
     ++place_;
-    skipVacant();
+    arrive();
     return *this;
   }
   Iterator operator++(int) {
@@ -106,24 +106,46 @@ class Dictionary::Iterator {
     ++*this;
     return old;
   }
-  bool operator==(const Iterator&) const = default;
+  bool operator==(const Iterator& other) const {
+    return place_ == other.place_ && dictionary_ == other.dictionary_;
+  }
 
  private:
   friend class Dictionary;
-  Iterator(const Dictionary* dictionary, std::size_t place)
-      : dictionary_(dictionary), place_(place) {
-    skipVacant();
+  Iterator(const Dictionary* dictionary, std::size_t place, std::size_t end)
+      : dictionary_(dictionary), place_(place), end_(end) {
+    if (place_ == end_) return;
+    if (!dictionary->isTable()) {
+      const std::uint32_t header = dictionary->value_.slot_.body;
+      block_ = &dictionary->value_.block();
+      slots_ = block_->items(header);
+      keys_ = block_->keys(header);
+    }
+    arrive();
   }
-  void skipVacant() {
-    while (place_ < dictionary_->places() && dictionary_->isVacant(place_)) ++place_;
+  // Borrows the entry of the place; from a vacant one it goes on to the next that is not.
+  void arrive() {
+    if (place_ == end_) return;
+    if (block_ == nullptr) return arriveInTable();
+    entry_.key = block_->keyText(keys_[place_]);
+    entry_.value.borrow(*block_, slots_[place_]);
   }
+  void arriveInTable();
 
   const Dictionary* dictionary_ = nullptr;
   std::size_t place_ = 0;
+  std::size_t end_ = 0;
+  const detail::Block* block_ = nullptr;  // null: the entries stand in a table
+  const detail::Slot* slots_ = nullptr;
+  const detail::Key* keys_ = nullptr;
+  Entry entry_;
 };
 
-inline Dictionary::Iterator Dictionary::begin() const noexcept { return {this, 0}; }
+inline Dictionary::Iterator Dictionary::begin() const { return {this, 0, places()}; }
 
-inline Dictionary::Iterator Dictionary::end() const noexcept { return {this, places()}; }
+inline Dictionary::Iterator Dictionary::end() const noexcept {
+  const std::size_t end = places();
+  return {this, end, end};
+}
 
 }  // namespace oxmv

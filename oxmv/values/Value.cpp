@@ -2,11 +2,11 @@
 
 #include <algorithm>
 #include <bit>
-#include <cstring>
+#include <limits>
 
 #include "oxmv/values/Array.h"
+#include "oxmv/values/ByteMasks.h"
 #include "oxmv/values/Dictionary.h"
-#include "oxmv/values/LittleEndian.h"
 #include "oxmv/values/Numbers.h"
 #include "oxmv/values/Text.h"
 
@@ -22,36 +22,26 @@ std::span<const std::uint8_t> asBytes(std::string_view text) {
   return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
-// The same place, ending before its first NUL, and whether its bytes are all ASCII. Both in one pass:
-// nearly every text is.
+// How much of a text counts, and whether that is all ASCII: both in one pass, nearly every text in
+// one step. Bytes behind the text are read, too; a block has enough of them.
 struct Cut {
-  Slot text;
+  std::uint32_t size;
   bool isAscii;
 };
 
-Cut cutAtNul(const Block& block, Slot place) {
-  constexpr std::uint64_t ones = 0x0101010101010101u;
-  constexpr std::uint64_t highBits = 0x8080808080808080u;
-  const std::span<const std::uint8_t> there = block.bytes().subspan(place.body);
-  const std::uint32_t size = place.size();
-  std::uint32_t i = 0;
-  for (; i < size && there.size() - i >= sizeof(std::uint64_t); i += sizeof(std::uint64_t)) {
-    // The lowest bit is right: borrows only go up from a byte that is zero.
-    const std::uint64_t word = loadLe64(there.data() + i);
-    const std::uint64_t stops = ((word - ones) | word) & highBits;
-    if (stops == 0) continue;
-    i += static_cast<std::uint32_t>(std::countr_zero(stops)) / 8;
-    break;
+Cut cutAt(const std::uint8_t* text, std::uint32_t size, bool endsAtNul) {
+  constexpr std::uint32_t width = detail::ByteMasks::width;
+  static_assert(Block::readAhead >= width);
+  const std::uint32_t ends = endsAtNul ? ~0u : 0u;
+  std::uint32_t high = 0;
+  for (std::uint32_t at = 0;; at += width) {
+    const detail::ByteMasks masks = detail::masksOf(text + at);
+    const std::uint32_t left = std::min(size - at, width);
+    const std::uint64_t end = (masks.nul & ends) | std::uint64_t{1} << left;
+    const auto taken = static_cast<std::uint32_t>(std::countr_zero(end));
+    high |= masks.high & static_cast<std::uint32_t>((std::uint64_t{1} << taken) - 1);
+    if (taken < width || size - at == width) return {at + taken, high == 0};
   }
-  while (i < size && there[i] - 1u < 0x7Fu) ++i;
-  const bool isAscii = i >= size || there[i] == 0;
-  if (!isAscii) {
-    const void* nul = std::memchr(there.data() + i, 0, size - i);
-    i = nul == nullptr
-            ? size
-            : static_cast<std::uint32_t>(static_cast<const std::uint8_t*>(nul) - there.data());
-  }
-  return {Slot::place(Form::text, std::min(i, size), place.body), isAscii};
 }
 
 }  // namespace
@@ -86,16 +76,16 @@ Value Value::wholeText(Form form, std::string_view text) {
   return isUtf8(text) ? whole(form, asBytes(text)) : whole(form, asBytes(utf8FromLatin1(text)));
 }
 
-Value Value::textIn(const Block& block, Slot slot) {
-  bool isValid = false;
-  if (slot.form() == Form::textToNul) {
-    const Cut cut = cutAtNul(block, slot);
-    slot = cut.text;
-    isValid = cut.isAscii;
+void Value::borrowText(const Block& block, Slot slot) {
+  const Cut cut = cutAt(block.bytes(slot).data(), slot.size(), slot.form() == Form::textToNul);
+  slot = Slot::place(Form::text, cut.size, slot.body);
+  if (!cut.isAscii && !isUtf8(block.text(slot))) {
+    *this = wholeText(Form::wholeText, block.text(slot));
+    return;
   }
-  if (!isValid && !isUtf8(block.text(slot))) return wholeText(Form::wholeText, block.text(slot));
-  block.retain();
-  return Value(slot, &block);
+  release();
+  slot_ = slot.lent();
+  content_.owner = &block;
 }
 
 bool Value::isNumber() const noexcept {
@@ -103,15 +93,15 @@ bool Value::isNumber() const noexcept {
   return form == Form::integer || form == Form::float32 || form == Form::float64;
 }
 
-std::int32_t Value::intValue() const noexcept {
+std::int32_t Value::intOfOther() const noexcept {
   switch (kind()) {
-    case Kind::integer: return static_cast<std::int32_t>(content_.integer);
     case Kind::float32:
     case Kind::float64: return truncated<std::int32_t>(doubleValue());
     case Kind::text: {
       constexpr std::int64_t lowest = std::numeric_limits<std::int32_t>::min();
       return static_cast<std::int32_t>(std::clamp(leadingInteger(text()), lowest, -(lowest + 1)));
     }
+    case Kind::integer:
     case Kind::nothing:
     case Kind::data:
     case Kind::array:
@@ -120,12 +110,12 @@ std::int32_t Value::intValue() const noexcept {
   return 0;
 }
 
-std::int64_t Value::int64Value() const noexcept {
+std::int64_t Value::int64OfOther() const noexcept {
   switch (kind()) {
-    case Kind::integer: return content_.integer;
     case Kind::float32:
     case Kind::float64: return truncated<std::int64_t>(doubleValue());
     case Kind::text: return leadingInteger(text());
+    case Kind::integer:
     case Kind::nothing:
     case Kind::data:
     case Kind::array:
@@ -134,12 +124,12 @@ std::int64_t Value::int64Value() const noexcept {
   return 0;
 }
 
-float Value::floatValue() const noexcept {
+float Value::floatOfOther() const noexcept {
   switch (kind()) {
     case Kind::integer: return static_cast<float>(content_.integer);
-    case Kind::float32: return std::bit_cast<float>(slot_.body);
     case Kind::float64: return static_cast<float>(content_.float64);
     case Kind::text: return leadingFloat(text());
+    case Kind::float32:
     case Kind::nothing:
     case Kind::data:
     case Kind::array:
@@ -148,16 +138,12 @@ float Value::floatValue() const noexcept {
   return 0;
 }
 
-std::uint32_t Value::floatBits() const noexcept {
-  return kind() == Kind::float32 ? slot_.body : std::bit_cast<std::uint32_t>(floatValue());
-}
-
-double Value::doubleValue() const noexcept {
+double Value::doubleOfOther() const noexcept {
   switch (kind()) {
     case Kind::integer: return static_cast<double>(content_.integer);
     case Kind::float32: return static_cast<double>(std::bit_cast<float>(slot_.body));
-    case Kind::float64: return content_.float64;
     case Kind::text: return leadingDouble(text());
+    case Kind::float64:
     case Kind::nothing:
     case Kind::data:
     case Kind::array:

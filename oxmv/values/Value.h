@@ -3,6 +3,7 @@
 #pragma once
 
 #include <array>
+#include <bit>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -72,8 +73,16 @@ class Value {
   Value(const Array& array) noexcept;
   Value(const Dictionary& dictionary) noexcept;
 
-  Value(const Value& other) noexcept : slot_(other.slot_), content_(other.content_) { retain(); }
-  Value(Value&& other) noexcept : slot_(other.slot_), content_(other.content_) { other.slot_ = {}; }
+  Value(const Value& other) noexcept : slot_(other.slot_.kept()), content_(other.content_) {
+    retain();
+  }
+  Value(Value&& other) noexcept : slot_(other.slot_.kept()), content_(other.content_) {
+    if (other.slot_.isLent()) {
+      retain();
+    } else {
+      other.slot_ = {};
+    }
+  }
   Value& operator=(Value other) noexcept {
     std::swap(slot_, other.slot_);
     std::swap(content_, other.content_);
@@ -90,13 +99,23 @@ class Value {
   // Numbers. Integers give their low bits; floats and doubles are truncated toward zero and
   // saturate (not a number gives 0); text is read like a number at its start (white space, sign,
   // digits); every other kind gives 0.
-  std::int32_t intValue() const noexcept;
-  std::int64_t int64Value() const noexcept;
-  float floatValue() const noexcept;
-  double doubleValue() const noexcept;
+  std::int32_t intValue() const noexcept {
+    return isInteger() ? static_cast<std::int32_t>(content_.integer) : intOfOther();
+  }
+  std::int64_t int64Value() const noexcept {
+    return isInteger() ? content_.integer : int64OfOther();
+  }
+  float floatValue() const noexcept {
+    return isFloat32() ? std::bit_cast<float>(slot_.body) : floatOfOther();
+  }
+  double doubleValue() const noexcept {
+    return slot_.form() == detail::Form::float64 ? content_.float64 : doubleOfOther();
+  }
   // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a signalling
   // not-a-number would arrive as a quiet one.
-  std::uint32_t floatBits() const noexcept;
+  std::uint32_t floatBits() const noexcept {
+    return isFloat32() ? slot_.body : std::bit_cast<std::uint32_t>(floatOfOther());
+  }
 
   // The characters of a text; empty for every other kind. The view holds as long as this value.
   std::string_view text() const& noexcept {
@@ -125,13 +144,27 @@ class Value {
 
   // Internal: the value of a slot of `block`.
   static Value in(const detail::Block& block, detail::Slot slot) {
+    Value lent;
+    lent.borrow(block, slot);
+    return Value(std::move(lent));
+  }
+  // Internal: becomes the value of a slot of `block`, or that of `other`, without a share in the
+  // payload, whose owner has to stay. Whatever is copied or moved from it has a share.
+  void borrow(const detail::Block& block, detail::Slot slot) {
     using detail::Form;
     const Form form = slot.form();
-    if (form == Form::integer) return {IntegerTag{}, static_cast<std::int32_t>(slot.body)};
-    if (form == Form::float32) return {slot, nullptr};
-    if (form == Form::text || form == Form::textToNul) return textIn(block, slot);
-    block.retain();
-    return {slot, &block};
+    if (form == Form::text || form == Form::textToNul) return borrowText(block, slot);
+    release();
+    slot_ = slot.lent();
+    // Which of them no processor foresees: no branch, but a table of both.
+    const std::array contents = {Content{.owner = &block},
+                                 Content{.integer = static_cast<std::int32_t>(slot.body)}};
+    content_ = contents[form == Form::integer];
+  }
+  void borrow(const Value& other) noexcept {
+    release();
+    slot_ = other.slot_.lent();
+    content_ = other.content_;
   }
 
  private:
@@ -153,7 +186,15 @@ class Value {
       : slot_(detail::Slot::scalar(detail::Form::integer, 0)), content_{.integer = number} {}
   Value(detail::Slot slot, const detail::Shared* owner) noexcept
       : slot_(slot), content_{.owner = owner} {}
-  static Value textIn(const detail::Block& block, detail::Slot slot);
+  void borrowText(const detail::Block& block, detail::Slot slot);
+
+  bool isInteger() const noexcept { return slot_.form() == detail::Form::integer; }
+  bool isFloat32() const noexcept { return slot_.form() == detail::Form::float32; }
+  std::int32_t intOfOther() const noexcept;
+  std::int64_t int64OfOther() const noexcept;
+  float floatOfOther() const noexcept;
+  double doubleOfOther() const noexcept;
+
   static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
   static Value wholeText(detail::Form form, std::string_view text);
 
@@ -179,8 +220,10 @@ class Value {
   void retain() const noexcept {
     if (const auto* shared = owner()) shared->retain();
   }
+  // Whether there is something to release.
+  bool hasShare() const noexcept { return !slot_.isLent() && owner() != nullptr; }
   void release() const noexcept {
-    if (const auto* shared = owner()) shared->release();
+    if (hasShare()) content_.owner->release();
   }
 
   detail::Slot slot_;

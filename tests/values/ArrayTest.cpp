@@ -1,10 +1,14 @@
+#include <iterator>
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
 
 #include "oxmv/values/Array.h"
 #include "oxmv/values/Dictionary.h"
+#include "tests/support/Decoding.h"
 #include "tests/support/Printing.h"
 
 namespace oxmv::test {
@@ -38,6 +42,45 @@ TEST(Array, IteratesOverAllElements) {
   EXPECT_EQ(*place++, Value(3));
   EXPECT_EQ(*place, Value(1));
   EXPECT_TRUE(++place == array.end());
+}
+
+static_assert(std::input_iterator<Array::Iterator>);
+
+// The elements of an array of each of its forms, kept beyond it in one way of each sort; the ways
+// are the same for dictionaries, whose tests have all of them.
+void expectToBeKept(std::optional<Array> array, const std::vector<Value>& elements) {
+  std::vector<Value> copied, moved, nameless;
+  for (const Value& element : *array) copied.push_back(element);
+  for (auto element : *array) moved.push_back(std::move(element));
+  for (auto at = array->begin(); at != array->end();) {
+    const Value& element = *at++;
+    nameless.push_back(element);
+  }
+  const std::vector<Value> range(array->begin(), array->end());
+  array.reset();
+  EXPECT_EQ(copied, elements);
+  EXPECT_EQ(moved, elements);
+  EXPECT_EQ(nameless, elements);
+  EXPECT_EQ(range, elements);
+}
+
+TEST(Array, WhatIsKeptFromALoopOutlivesTheArray) {
+  expectToBeKept(Array::of(3, "two", Array::of("three")), {3, "two", Array::of("three")});
+  expectToBeKept(decoded({'K', 'W', 'R', 'd', 4, 0, 0, 'c', 'n', 'o', 'o', 'n',  //
+                          'K', 'W', 'R', 'd', 4, 0, 0, 'c', 'C', 'a', 'f', 0xE9})["KWRd"]
+                     .array(),
+                 {"noon", "Caf\xC3\xA9"});
+  expectToBeKept(decoded({'D', 'S', 'P', 'm', 12, 0, 0, 0,  //
+                          'R', 'E', 'E', 'L', 4,  0, 0, 'c', 'A', '1', 0, 0})["DSPm"]
+                     .array(),
+                 {Dictionary{{"REEL", "A1"}}});
+  expectToBeKept(
+      decoded({'D', 'A', 'S', 'F', 8, 0, 0, 'f', 0, 0, 0x80, 0x3F, 0, 0, 0, 0x40})["DASF"].array(),
+      {1.0f, 2.0f});
+  expectToBeKept(
+      decoded({'B', 'A', 'D', 'P', 8, 0, 0, 'H', 5, 0, 0, 0, 0xFF, 0xFF, 0xFF, 0xFF})["BADP"]
+          .array(),
+      {5, -1});
 }
 
 TEST(Array, OfAnArrayHoldsThatArray) {

@@ -15,13 +15,24 @@ using detail::Header;
 using detail::Key;
 using detail::Slot;
 
+static_assert(Slot::maxSize >= 2 * 0xFFFFFF, "a name of 24 bits of ISO-8859-1 fits in UTF-8");
 static_assert(sizeof(Slot) == 8 && sizeof(Key) == 4, "a block is as small as that");
 
 TEST(Slot, HoldsFormSizeAndPlace) {
   const Slot slot = Slot::place(Form::data, Slot::maxSize, 0xFFFFFFFEu);
   EXPECT_EQ(slot.form(), Form::data);
-  EXPECT_EQ(slot.size(), 0xFFFFFFFu);
+  EXPECT_EQ(slot.size(), Slot::maxSize);
   EXPECT_EQ(slot.body, 0xFFFFFFFEu);
+}
+
+TEST(Slot, MarkOfALentValueLeavesTheRest) {
+  const Slot slot = Slot::place(Form::wholeData, Slot::maxSize, 0xFFFFFFFEu);
+  EXPECT_FALSE(slot.isLent());
+  EXPECT_TRUE(slot.lent().isLent());
+  EXPECT_EQ(slot.lent().form(), Form::wholeData);
+  EXPECT_EQ(slot.lent().size(), Slot::maxSize);
+  EXPECT_EQ(slot.lent().body, 0xFFFFFFFEu);
+  EXPECT_EQ(slot.lent().kept(), slot);
 }
 
 TEST(Header, KeepsItsCountBesideTheSortedBit) {
@@ -59,7 +70,7 @@ TEST(Key, HoldsThePlaceOfAnyOtherText) {
 
 TEST(Block, HoldsCopiesOfAllThatItIsGiven) {
   std::array<std::uint8_t, 3> head = {1, 2, 3};
-  std::array<Slot, 2> slots = {Slot::scalar(Form::integer, 7), Slot::place(Form::text, 2, 2)};
+  std::array<Slot, 2> slots = {Header{1, false, 0}.slot(), Slot::place(Form::text, 2, 2)};
   std::array<Key, 1> keys = {Key::textAt(1)};
   const auto block = Block::make(head, "xy", slots, keys);
   head.fill(0);
@@ -69,7 +80,7 @@ TEST(Block, HoldsCopiesOfAllThatItIsGiven) {
   EXPECT_EQ(std::vector(block->bytes().begin(), block->bytes().end()),
             (std::vector<std::uint8_t>{1, 2, 3, 'x', 'y'}));
   EXPECT_EQ(block->text(Slot::place(Form::text, 2, 3)), "xy");
-  EXPECT_EQ(block->keyText(0), "\3x");
+  EXPECT_EQ(block->keyText(block->keys(0)[0]), "\3x");
 }
 
 }  // namespace

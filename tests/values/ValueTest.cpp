@@ -252,6 +252,49 @@ TEST(Value, TextThatIsNotUtf8IsReadAsLatin1) {
   EXPECT_EQ(Value("\xC3\xA9\xFF").text(), "\xC3\x83\xC2\xA9\xC3\xBF");
 }
 
+// In a block a text is looked at several bytes at a time, whatever follows it.
+
+Value textIn(const std::string& bytes, std::size_t size, detail::Form form) {
+  const auto block = detail::Block::make({}, bytes, {}, {});
+  return Value::in(*block, detail::Slot::place(form, static_cast<std::uint32_t>(size), 0));
+}
+
+TEST(Value, TextInABlockHasEveryLength) {
+  for (std::size_t size = 0; size <= 100; ++size) {
+    const std::string bytes(size, 'x');
+    for (const std::string_view behind : {""sv, "y"sv, "\xFF"sv, "\0"sv}) {
+      const std::string all = bytes + std::string(behind);
+      EXPECT_EQ(textIn(all, size, detail::Form::text).text(), bytes) << size;
+      EXPECT_EQ(textIn(all, size, detail::Form::textToNul).text(), bytes) << size;
+    }
+  }
+}
+
+TEST(Value, TextInABlockEndsAtItsFirstNulOrGoesOn) {
+  for (std::size_t nul = 0; nul < 70; ++nul) {
+    std::string bytes(70, 'x');
+    bytes[nul] = '\0';
+    bytes[69] = '\0';
+    EXPECT_EQ(textIn(bytes, 70, detail::Form::textToNul).text(), bytes.substr(0, nul));
+    EXPECT_EQ(textIn(bytes, 70, detail::Form::text).text(), bytes);
+    bytes[69] = '\xE9';
+    EXPECT_EQ(textIn(bytes, 70, detail::Form::textToNul), Value(bytes.substr(0, nul)));
+    EXPECT_EQ(textIn(bytes, 70, detail::Form::text), Value(bytes));
+  }
+}
+
+TEST(Value, TextInABlockIsUtf8WhereverItsLettersAre) {
+  for (std::size_t place = 0; place < 70; ++place) {
+    std::string bytes(72, 'x');
+    bytes.replace(place, 2, "\xC3\xA9");
+    EXPECT_EQ(textIn(bytes, 72, detail::Form::textToNul).text(), bytes);
+    bytes[place + 1] = 'x';  // what is left is ISO-8859-1
+    const std::string converted = bytes.substr(0, place) + "\xC3\x83" + bytes.substr(place + 1);
+    EXPECT_EQ(textIn(bytes, 72, detail::Form::textToNul).text(), converted);
+    EXPECT_EQ(textIn(bytes, 72, detail::Form::text).text(), converted);
+  }
+}
+
 TEST(Value, LengthCountsUtf16Units) {
   EXPECT_EQ(Value("").length(), 0u);
   EXPECT_EQ(Value("REEL").length(), 4u);
