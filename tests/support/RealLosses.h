@@ -29,7 +29,7 @@ inline Dictionary comesBack(const Dictionary& tags, Layout layout) {
   return isShort ? Dictionary() : reread(tags, layout);
 }
 
-bool differAt(const Dictionary& a, const Dictionary& b, std::string_view path);
+inline bool differAt(const Dictionary& a, const Dictionary& b, std::string_view path);
 
 // What `path` names within the values, or the values themselves where it is at its end.
 inline bool differBehind(const Value& a, const Value& b, std::string_view path) {
