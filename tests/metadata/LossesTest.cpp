@@ -281,5 +281,11 @@ TEST(Losses, CodesReadBack) {
   EXPECT_FALSE(lossCodeOf(""));
 }
 
+TEST(Losses, NamesWhatAListHasInPlaceOfAValue) {
+  const Dictionary tags = {{"REEL", "A001C002"}, {"KWRd", Array::of(Value())}};
+  EXPECT_EQ(losses(tags), Found{"wrong-kind KWRd[0]"});
+  EXPECT_TRUE(messageOf(tags).starts_with("is nothing")) << messageOf(tags);
+}
+
 }  // namespace
 }  // namespace oxmv
