@@ -2,6 +2,8 @@
 
 PREFIX ?= /usr/local
 FUZZ_SECONDS ?= 60
+MUTANTS ?= 40
+SEED ?= 1
 CMAKE_BUILD_PARALLEL_LEVEL ?= $(shell nproc)
 CTEST_PARALLEL_LEVEL ?= $(shell nproc)
 export CMAKE_BUILD_PARALLEL_LEVEL CTEST_PARALLEL_LEVEL
@@ -12,7 +14,7 @@ sources = git ls-files -z --cached --others --exclude-standard -- '*.h' '*.cpp'
 MAKEFLAGS += --no-print-directory
 .NOTPARALLEL:
 .PHONY: help build demo test bench instructions install format format-check tidy fuzz \
-        clean packages-build packages-test packages-bench packages-ci
+        clean packages-build packages-test packages-coverage packages-bench packages-ci
 
 help: ## list these targets
 	@sed -nE 's/^([a-z-]+):[^#]*## (.*)/  make \1\t\2/p' Makefile | expand -t 20
@@ -28,6 +30,18 @@ test: packages-test ## install what the tests need, build and run every test
 	cmake --preset dev
 	cmake --build --preset dev
 	ctest --preset dev
+
+coverage: packages-coverage ## count the lines that the tests reach: build/coverage/report/index.html
+	cmake --preset coverage
+	cmake --build --preset coverage
+	packaging/coverage build/coverage
+
+# Where a slip costs most: what reads, writes and edits streams, and what imports looks.
+mutated = $(addprefix oxmv/metadata/TagStream,Decoder.cpp Encoder.cpp Editor.cpp) \
+  $(addprefix oxmv/looks/,HexTable.cpp LookDescription.cpp LookImport.cpp LookTableFile.cpp)
+
+mutants: packages-coverage ## see whether tests notice MUTANTS (40) changes of each of some sources
+	packaging/mutants --seed $(SEED) --count $(MUTANTS) $(mutated)
 
 bench: packages-bench ## measure: install what that needs, build, run the benchmarks
 	cmake --preset release -B build/bench -D OXMV_BENCH=ON
@@ -64,6 +78,9 @@ packages-build:
 
 packages-test:
 	packaging/install-packages build test
+
+packages-coverage:
+	packaging/install-packages build test coverage
 
 packages-bench:
 	packaging/install-packages build bench

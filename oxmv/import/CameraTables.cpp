@@ -71,7 +71,7 @@ class RowReader {
       case Prefix::longOne: return "not like QX3.01";
       case Prefix::either: return "neither of 3 characters nor like QX3.01";
     }
-    return {};
+    return {};  // Not reached: every case is above.
   }
 
   void refuse(const std::string& what) {

@@ -11,7 +11,7 @@
 namespace oxmv {
 
 // Makes the nodes of what the walk through a document tells.
-class [[gnu::visibility("hidden")]] LookDescription::Builder final : public XmlVisitor {
+class LookDescription::Builder final : public XmlVisitor {
  public:
   Builder(LookDescription& description, std::size_t mostText)
       : to_(description), mostText_(std::min(mostText, maxFileSize)) {}
@@ -147,7 +147,7 @@ class [[gnu::visibility("hidden")]] LookDescription::Builder final : public XmlV
 // well-formed itself and has the same nodes. Everything else (runs in comments or attributes,
 // documents with a type, whose entities have no place of their own, or in another encoding) ends the
 // walk, or leaves runs over, and is parsed as it is.
-class [[gnu::visibility("hidden")]] LookDescription::Restorer final : public XmlVisitor {
+class LookDescription::Restorer final : public XmlVisitor {
  public:
   Restorer(const Skeleton& skeleton, Builder& builder) : skeleton_(skeleton), builder_(builder) {}
 

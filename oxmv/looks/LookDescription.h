@@ -71,8 +71,8 @@ class LookDescription {
   LookNode node(std::size_t index) const;
 
  private:
-  class Builder;
-  class Restorer;
+  class [[gnu::visibility("hidden")]] Builder;
+  class [[gnu::visibility("hidden")]] Restorer;
 
   // 16 bytes: a hostile file may have a node for every four of its own. A file and the text made of
   // it have at most maxFileSize bytes each, so 32 bits hold every place.

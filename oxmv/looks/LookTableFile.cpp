@@ -124,7 +124,7 @@ bool isCurrentLookFile(std::span<const std::uint8_t> start) noexcept {
     case Magic::ours: return loadLe32(&start[4]) == lookVersion;
     case Magic::otherOrder: return loadLe32(&start[4]) == lookVersion << 24;
   }
-  return false;
+  return false;  // Not reached: every case is above.
 }
 
 std::string lookFileNameOf(std::uint32_t crc) {

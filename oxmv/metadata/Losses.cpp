@@ -84,7 +84,7 @@ std::string_view nameOf(Value::Kind kind) {
     case Value::Kind::array: return "a list";
     case Value::Kind::dictionary: return "a dictionary";
   }
-  return {};
+  return {};  // Not reached: every case is above.
 }
 
 // The key that is always written along with this one; null for most.
@@ -166,7 +166,7 @@ class LossFinder {
   void explainValue(const TagRow& row, const Value& value, const Value& back,
                     const std::string& path, int level) {
     switch (row.write) {
-      case Write::none: break;
+      case Write::none: break;  // Not reached: see explainEntry().
       case Write::timecode:
       case Write::text: return explainText(value, back, path, 255);
       case Write::fourCC: return explainText(value, back, path, 4);

@@ -50,7 +50,7 @@ bool interpret(const TagRow& row, std::span<const std::uint8_t> payload, Value& 
     case Read::regName:
     case Read::regValue: return false;
   }
-  return false;
+  return false;  // Not reached: every case is above.
 }
 
 // Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or whose

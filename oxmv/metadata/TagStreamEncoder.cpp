@@ -295,7 +295,7 @@ std::optional<std::vector<std::uint8_t>> encodeStream(const Dictionary& tags,
   } catch (const std::bad_alloc&) {
     return std::nullopt;
   } catch (const std::length_error&) {  // larger than a vector can be
-    return std::nullopt;
+    return std::nullopt;                // Not reached: memory ends first.
   }
 }
 

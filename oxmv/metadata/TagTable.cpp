@@ -392,7 +392,7 @@ std::string readsAs(const TagRow& row) {
     case Read::regName: return "name in \"REG \"";
     case Read::regValue: return "value in \"REG \"";
   }
-  return {};
+  return {};  // Not reached: every case is above.
 }
 
 std::string writesAs(const TagRow& row) {
@@ -420,7 +420,7 @@ std::string writesAs(const TagRow& row) {
     case Write::tagGroup: return "TAGN and TAGV";
     case Write::regGroup: return "REGN and REGV";
   }
-  return {};
+  return {};  // Not reached: every case is above.
 }
 
 std::string acceptsAs(const TagRow& row) {
@@ -431,7 +431,7 @@ std::string acceptsAs(const TagRow& row) {
     case Accept::array: return "array of " + std::to_string(row.count);
     case Accept::never: return "nothing";
   }
-  return {};
+  return {};  // Not reached: every case is above.
 }
 
 }  // namespace oxmv

@@ -317,5 +317,12 @@ TEST(UpdatePreferencesFile, LosesNothingOfProcessesThatWriteAtOnce) {
   EXPECT_EQ(filesIn(dir.path()), 1);
 }
 
+TEST(PreferencesError, HasATextForEachCode) {
+  const std::error_code error = PreferencesError::busy;
+  EXPECT_STREQ(error.category().name(), "oxmv.preferences");
+  EXPECT_EQ(error.message(), "Another program keeps the preferences folder locked");
+  EXPECT_EQ(error.category().message(99), "Unknown error");
+}
+
 }  // namespace
 }  // namespace oxmv

@@ -277,5 +277,12 @@ TEST(HexTable, EveryCharacterIsADigitOrNot) {
   }
 }
 
+TEST(HexTable, GapThatGrowsWhereAGroupIsShorterMakesThatMalformed) {
+  // Four groups are taken at once; in the next four a blank stands where the first digit would.
+  const std::string spaced = "0000803F 0000803F 0000803F 0000803F ";
+  EXPECT_EQ(read(spaced + " 1234567 " + spaced).table.malformed, 1u);
+  EXPECT_EQ(read("0000803F " + spaced + " 1234567 " + spaced).table.malformed, 1u);
+}
+
 }  // namespace
 }  // namespace oxmv

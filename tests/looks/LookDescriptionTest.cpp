@@ -412,5 +412,28 @@ TEST(LookDescription, SamplesAreReadAlikeInBothWays) {
   }
 }
 
+TEST(LookDescription, TextsInUtf16ThatHoldALongRunOfAnOddLengthAreTheSame) {
+  // U+4E30 and many U+3030 are 'N', and then '0' an odd number of times: with one character in the
+  // place of those the rest would be UTF-16 still.
+  const std::size_t count = minLongRun;
+  for (const std::string& mark : {std::string("\xFE\xFF"), std::string()}) {
+    std::string file = mark;
+    const auto add = [&](char32_t c) {
+      file += static_cast<char>(c >> 8);
+      file += static_cast<char>(c & 0xFF);
+    };
+    for (const char c : std::string_view("<?xml version='1.0' encoding='UTF-16'?><look><LUT>"))
+      add(static_cast<unsigned char>(c));
+    add(0x4E30);
+    std::string text = "\u4E30";
+    for (std::size_t i = 0; i < count; ++i) {
+      add(0x3030);
+      text += "\u3030";
+    }
+    for (const char c : std::string_view("</LUT></look>")) add(static_cast<unsigned char>(c));
+    EXPECT_EQ(nodesOf(file), "LUT\ntable: " + text + "\n");
+  }
+}
+
 }  // namespace
 }  // namespace oxmv

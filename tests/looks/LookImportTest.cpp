@@ -299,6 +299,28 @@ TEST_F(LookImport, TableThatCouldNotBeWrittenIsNotTriedAgain) {
   EXPECT_FALSE(fs::exists(late / "Warm.xml"));
 }
 
+TEST_F(LookImport, TableThatIsThereIsNotLookedForAgain) {
+  // The files go while the tables are told.
+  class Remover final : public LookImportObserver {
+   public:
+    Remover(fs::path folder, LookImportObserver& next) : folder_(std::move(folder)), next_(next) {}
+    void onTable(const LookTableReport& table) override {
+      fs::remove(folder_ / lookFileNameOf(table.crc));
+      next_.onTable(table);
+    }
+
+   private:
+    fs::path folder_;
+    LookImportObserver& next_;
+  };
+  put(folder / "Warm.xml", "<look><LUT><size>1</size><a>0000803F</a><a>0000803F</a></LUT></look>");
+  Remover remover(looks, witness);
+  LookFileRef::initFromLookFile(folder / "Warm.xml", &remover);
+  ASSERT_EQ(witness.tables.size(), 2u);
+  EXPECT_TRUE(witness.tables[0].isNew);
+  EXPECT_FALSE(witness.tables[1].isNew);
+}
+
 TEST_F(LookImport, LinkThatLeadsNowhereIsLeftAlone) {
   fs::create_symlink(folder / "nowhere", looks / "Warm.xml");
   import(onePoint);
@@ -507,6 +529,13 @@ TEST_F(LookImport, WritesNoMoreThanItsLimit) {
   EXPECT_EQ(files().size(), 3u);
   EXPECT_TRUE(host->alerts.empty());
   EXPECT_EQ(maxImportedBytes, 1073741824u);
+
+  fs::remove_all(looks);
+  fs::create_directory(looks);
+  witness = {};
+  importLook(folder / "Warm.xml", &witness, 3 * 76);
+  EXPECT_EQ(witness.tables.size(), 3u);
+  EXPECT_TRUE(witness.stops.empty());
 }
 
 TEST_F(LookImport, WritesNoMoreFilesThanItsLimit) {
@@ -626,6 +655,17 @@ TEST(LookSamples, SecondImportDoesNothing) {
     EXPECT_EQ(look->version(), 0);
     EXPECT_EQ(look->displayName(), std::nullopt);
   }
+}
+
+TEST_F(LookImport, IsTheSameForAnObserverThatDoesNotListen) {
+  class Deaf final : public LookImportObserver {};
+  Deaf deaf;
+  put(folder / "Warm.xml", onePoint);
+  const auto look = LookFileRef::initFromLookFile(folder / "Warm.xml", &deaf);
+  ASSERT_TRUE(look);
+  EXPECT_EQ(look->displayName(), "Warm");
+  put(folder / "None.xml", "<look><LUT><a/></LUT></look>");
+  EXPECT_FALSE(LookFileRef::initFromLookFile(folder / "None.xml", &deaf));
 }
 
 }  // namespace

@@ -63,6 +63,20 @@ TEST(LookHeader, IsLoadedInEitherByteOrder) {
   }
 }
 
+TEST(LookHeader, NumbersOfTheOtherByteOrderHaveAllTheirBytes) {
+  Bytes bytes(lookHeaderSize);
+  storeLookHeader({}, bytes);
+  std::reverse(bytes.begin(), bytes.begin() + 4);
+  for (std::uint8_t i = 4; i < 24; ++i) bytes[i] = static_cast<std::uint8_t>(0xA0 + i);
+  const auto header = loadLookHeader(bytes);
+  ASSERT_TRUE(header);
+  EXPECT_EQ(header->version, 0xA4A5A6A7u);
+  EXPECT_EQ(header->headerSize, 0xA8A9AAABu);
+  EXPECT_EQ(header->lutSize, 0xACADAEAFu);
+  EXPECT_EQ(header->constantA, 0xB0B1B2B3u);
+  EXPECT_EQ(header->constantB, 0xB4B5B6B7u);
+}
+
 TEST(LookHeader, OfAnotherMagicOrTooFewBytesIsNothing) {
   EXPECT_FALSE(loadLookHeader(start("OXLX", {2, 0, 0, 0})));
   const Bytes bytes = start("OXLK", {2, 0, 0, 0});
@@ -174,6 +188,8 @@ TEST(CrcFromFileName, IsTheNumberAtTheStart) {
   EXPECT_EQ(crcFromFileName("0x00ff"), 0xFFu);
   EXPECT_EQ(crcFromFileName("0X1f"), 0x1Fu);
   EXPECT_EQ(crcFromFileName("beef-copy"), 0xBEEFu);
+  EXPECT_EQ(crcFromFileName("abcdef"), 0xABCDEFu);
+  EXPECT_EQ(crcFromFileName("ABCDEF09"), 0xABCDEF09u);
   EXPECT_EQ(crcFromFileName(" \t\n12"), 0x12u);
   EXPECT_EQ(crcFromFileName("0"), 0u);
   EXPECT_EQ(crcFromFileName("00000000FFFFFFFF"), 0xFFFFFFFFu);

@@ -1,6 +1,7 @@
 #include <cstdint>
 #include <limits>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -279,6 +280,24 @@ TEST(Losses, CodesReadBack) {
   }
   EXPECT_FALSE(lossCodeOf("text"));
   EXPECT_FALSE(lossCodeOf(""));
+}
+
+TEST(Losses, NamesWhatAListHasInPlaceOfAValue) {
+  const Dictionary tags = {{"REEL", "A001C002"}, {"KWRd", Array::of(Value())}};
+  EXPECT_EQ(losses(tags), Found{"wrong-kind KWRd[0]"});
+  EXPECT_TRUE(messageOf(tags).starts_with("is nothing")) << messageOf(tags);
+}
+
+TEST(Losses, SaysWhatStandsInPlaceOfAText) {
+  const std::pair<Value, std::string> values[] = {
+      {5, "is an integer"},        {0.5f, "is a float"},
+      {0.5, "is a double"},        {bytes(4), "is data"},
+      {Array::of(1), "is a list"}, {Dictionary{{"REEL", "A001"}}, "is a dictionary"},
+  };
+  for (const auto& [value, start] : values) {
+    const Dictionary tags = {{"REEL", value}, {"TIMC", "01:00:00:00"}};
+    EXPECT_TRUE(messageOf(tags).starts_with(start)) << messageOf(tags);
+  }
 }
 
 }  // namespace

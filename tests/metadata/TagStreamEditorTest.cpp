@@ -337,6 +337,7 @@ TEST(TagStreamEditor, EditsStreamsInStreams) {
   EXPECT_EQ(set(nest(1), "COL2/COL1/TAKE", 5), nest(5).bytes());
   EXPECT_EQ(set(StreamBuilder(), "COL2/COL1/TAKE", 5), nest(5).bytes());
   expectRefused(nest(1), "COL2/COL1/WBAL", 5, "not-stored at 16");
+  expectRefused(ordinary(), "COL2/WBAL", 5, "not-stored at 0");
 }
 
 TEST(TagStreamEditor, PadsWhatItWritesSoThatReadersFindWhatFollows) {

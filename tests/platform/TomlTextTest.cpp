@@ -327,5 +327,9 @@ TEST(TomlText, ReadsOrRefusesATextWhereverItIsCut) {
   }
 }
 
+TEST(TomlText, HasNoFormForNothingWithinAnArray) {
+  EXPECT_EQ(TomlText().with("a", Array::of(1, Value())), std::nullopt);
+}
+
 }  // namespace
 }  // namespace oxmv

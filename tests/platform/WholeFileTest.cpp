@@ -618,5 +618,12 @@ TEST(ReplaceWholeFile, WithoutMemoryLeavesTheOldFileAndNothingElse) {
             0u);
 }
 
+TEST(FileError, HasATextForEachCode) {
+  const std::error_code error = FileError::tooLarge;
+  EXPECT_STREQ(error.category().name(), "oxmv.file");
+  EXPECT_NE(error.message(), error.category().message(99));
+  EXPECT_EQ(error.category().message(99), "Unknown error");
+}
+
 }  // namespace
 }  // namespace oxmv
