@@ -50,7 +50,8 @@ class Scratch {
   }
 
  private:
-  void grow(std::size_t count) {
+  // Seldom: kept out of the way of what it is called from.
+  [[gnu::noinline]] void grow(std::size_t count) {
     const std::size_t capacity = std::max(2 * capacity_, size_ + count);
     auto memory = std::make_unique_for_overwrite<std::byte[]>(capacity * sizeof(T));
     T* items = reinterpret_cast<T*>(memory.get());
@@ -153,8 +154,10 @@ class BlockBuilder {
 
   // Where the entry of a list or group stands. Its slot is no value until the dictionary is closed.
   std::uint32_t gatheredAt(Id id, Key key) {
-    if (open_.placeOfId[id] == 0) put(id, key, {});
-    return open_.placeOfId[id];
+    if (const std::uint8_t place = open_.placeOfId[id]; place != 0) return place;
+    putOnce(key, {});
+    open_.placeOfId[id] = static_cast<std::uint8_t>(open_.count);
+    return static_cast<std::uint32_t>(open_.count);
   }
 
   void findOpen();
