@@ -2,6 +2,7 @@
 
 #include <new>
 
+#include "oxmv/values/ByteMasks.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::detail {
@@ -186,6 +187,11 @@ void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> e
 }
 
 Slot BlockBuilder::asUtf8(Slot text) {
+  constexpr std::size_t width = ByteMasks::width;
+  if (text.size() < width && bytes_.size() - text.body >= width) {  // nearly every name
+    const std::uint32_t inside = (1u << text.size()) - 1;
+    if ((masksOf(bytes_.data() + text.body).high & inside) == 0) return text;
+  }
   const std::string_view raw = textOf(text);
   return isUtf8(raw) ? text : addText(utf8FromLatin1(raw));
 }

@@ -41,8 +41,9 @@ class Scratch {
     return added;
   }
   void shrink(std::size_t size) { size_ = size; }
-  // Empty, and nothing of the heap.
+  // Gives back what it has of the heap, and with it what stands there.
   void release() {
+    if (heap_ == nullptr) return;
     heap_.reset();
     items_ = reinterpret_cast<T*>(own_.data());
     capacity_ = inItself;
