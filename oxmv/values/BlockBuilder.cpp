@@ -18,6 +18,9 @@ std::uint64_t startOf(std::string_view text) {
   return text.size() < 8 ? start << (64 - 8 * text.size()) % 64 : start;
 }
 
+// The index of an entry whose name came before.
+constexpr std::uint32_t inNoGroup = 0xFFFFFFFF;
+
 // With more keys than this a group's keys are followed by their order.
 constexpr std::size_t searchedInLine = 16;
 
@@ -162,7 +165,7 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
     Named& entry = entries[next.entry];
     if (first != nullptr && textOf(first->name) == textOf(entry.name)) {
       first->value = entry.value;
-      entry.place = 0;
+      entry.index = inNoGroup;
     } else {
       first = &entry;
       ranked[kept++] = next;
@@ -171,7 +174,7 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
   ranked_.shrink(kept);
   group_.shrink(0);
   for (Named& entry : entries) {
-    if (entry.place != place) continue;
+    if (entry.place != place || entry.index == inNoGroup) continue;
     entry.index = static_cast<std::uint32_t>(group_.size());
     group_.push(entry);
   }
