@@ -1,8 +1,13 @@
 #include "oxmv/values/Block.h"
 
 #include <algorithm>
+#include <bit>
 #include <memory>
 #include <new>
+
+#if defined(__SSE2__)
+#include <immintrin.h>
+#endif
 
 namespace oxmv::detail {
 namespace {
@@ -15,6 +20,32 @@ const T* put(std::byte*& place, std::span<const T> items) {
   place += items.size_bytes();
   return start;
 }
+
+// Where a key stands; `count` when it is nowhere.
+#if defined(__SSE2__)
+
+// Eight at a time. Behind the last key of a block as many more bytes can be read.
+std::size_t placeOf(Key wanted, const Key* keys, std::size_t count) {
+  static_assert(Block::readAhead >= 8 * sizeof(Key));
+  const __m128i eachWanted = _mm_set1_epi32(std::bit_cast<std::int32_t>(wanted));
+  for (std::size_t at = 0; at < count; at += 8) {
+    const auto* eight = reinterpret_cast<const __m128i*>(keys + at);
+    const __m128i low = _mm_cmpeq_epi32(_mm_loadu_si128(eight), eachWanted);
+    const __m128i high = _mm_cmpeq_epi32(_mm_loadu_si128(eight + 1), eachWanted);
+    const __m128i isWanted = _mm_packs_epi16(_mm_packs_epi32(low, high), _mm_setzero_si128());
+    const auto found = static_cast<std::uint32_t>(_mm_movemask_epi8(isWanted));
+    if (found != 0) return std::min(at + static_cast<std::size_t>(std::countr_zero(found)), count);
+  }
+  return count;
+}
+
+#else
+
+std::size_t placeOf(Key wanted, const Key* keys, std::size_t count) {
+  return static_cast<std::size_t>(std::find(keys, keys + count, wanted) - keys);
+}
+
+#endif
 
 }  // namespace
 
@@ -49,8 +80,8 @@ const Slot* Block::find(std::uint32_t headerIndex, std::string_view key) const {
     return isThere ? items(headerIndex) + found->slot() : nullptr;
   }
   if (Key::fits(key)) {
-    const Key* found = std::find(keys, end, Key::tag(key));
-    return found == end ? nullptr : items(headerIndex) + (found - keys);
+    const std::size_t place = placeOf(Key::tag(key), keys, dictionary.count);
+    return place == dictionary.count ? nullptr : items(headerIndex) + place;
   }
   for (std::uint32_t i = 0; i < dictionary.count; ++i) {
     if (!keys[i].isTag() && textOf(i) == key) return items(headerIndex) + i;

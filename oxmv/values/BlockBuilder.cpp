@@ -2,6 +2,7 @@
 
 #include <new>
 
+#include "oxmv/values/ByteMasks.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::detail {
@@ -16,6 +17,9 @@ std::uint64_t startOf(std::string_view text) {
   for (const char c : text.substr(0, 8)) start = start << 8 | static_cast<std::uint8_t>(c);
   return text.size() < 8 ? start << (64 - 8 * text.size()) % 64 : start;
 }
+
+// The index of an entry whose name came before.
+constexpr std::uint32_t inNoGroup = 0xFFFFFFFF;
 
 // With more keys than this a group's keys are followed by their order.
 constexpr std::size_t searchedInLine = 16;
@@ -161,7 +165,7 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
     Named& entry = entries[next.entry];
     if (first != nullptr && textOf(first->name) == textOf(entry.name)) {
       first->value = entry.value;
-      entry.place = 0;
+      entry.index = inNoGroup;
     } else {
       first = &entry;
       ranked[kept++] = next;
@@ -170,7 +174,7 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
   ranked_.shrink(kept);
   group_.shrink(0);
   for (Named& entry : entries) {
-    if (entry.place != place) continue;
+    if (entry.place != place || entry.index == inNoGroup) continue;
     entry.index = static_cast<std::uint32_t>(group_.size());
     group_.push(entry);
   }
@@ -186,6 +190,11 @@ void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> e
 }
 
 Slot BlockBuilder::asUtf8(Slot text) {
+  constexpr std::size_t width = ByteMasks::width;
+  if (text.size() < width && bytes_.size() - text.body >= width) {  // nearly every name
+    const std::uint32_t inside = (1u << text.size()) - 1;
+    if ((masksOf(bytes_.data() + text.body).high & inside) == 0) return text;
+  }
   const std::string_view raw = textOf(text);
   return isUtf8(raw) ? text : addText(utf8FromLatin1(raw));
 }

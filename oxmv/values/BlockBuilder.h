@@ -41,8 +41,9 @@ class Scratch {
     return added;
   }
   void shrink(std::size_t size) { size_ = size; }
-  // Empty, and nothing of the heap.
+  // Gives back what it has of the heap, and with it what stands there.
   void release() {
+    if (heap_ == nullptr) return;
     heap_.reset();
     items_ = reinterpret_cast<T*>(own_.data());
     capacity_ = inItself;
@@ -50,8 +51,11 @@ class Scratch {
   }
 
  private:
-  void grow(std::size_t count) {
-    const std::size_t capacity = std::max(2 * capacity_, size_ + count);
+  // Seldom: kept out of the way of what it is called from.
+  [[gnu::noinline]] void grow(std::size_t count) {
+    // What outgrows itself may well be long.
+    const std::size_t factor = heap_ == nullptr ? 4 : 2;
+    const std::size_t capacity = std::max(factor * capacity_, size_ + count);
     auto memory = std::make_unique_for_overwrite<std::byte[]>(capacity * sizeof(T));
     T* items = reinterpret_cast<T*>(memory.get());
     std::uninitialized_copy_n(items_, size_, items);
@@ -153,8 +157,10 @@ class BlockBuilder {
 
   // Where the entry of a list or group stands. Its slot is no value until the dictionary is closed.
   std::uint32_t gatheredAt(Id id, Key key) {
-    if (open_.placeOfId[id] == 0) put(id, key, {});
-    return open_.placeOfId[id];
+    if (const std::uint8_t place = open_.placeOfId[id]; place != 0) return place;
+    putOnce(key, {});
+    open_.placeOfId[id] = static_cast<std::uint8_t>(open_.count);
+    return static_cast<std::uint32_t>(open_.count);
   }
 
   void findOpen();
@@ -174,16 +180,18 @@ class BlockBuilder {
 
   Open open_;
 
+  // All that stand in themselves take half of the stack that decoding may need.
+
   // Inner ones behind outer ones.
   Scratch<Slot, 2 * (mostEntries + 1)> openSlots_;
   Scratch<Key, 2 * (mostEntries + 1)> openKeys_;
   Scratch<std::uint8_t, 2 * (mostEntries + 1)> places_;
-  Scratch<Element, 1024> elements_;
+  Scratch<Element, 320> elements_;
   Scratch<Named, 32> named_;
   Scratch<Named, 16> group_;    // the entries of one group, while it is put
   Scratch<Ranked, 16> ranked_;  // the same by name, where they are many
 
-  Scratch<Slot, 2048> slots_;  // of the block to be
+  Scratch<Slot, 1664> slots_;  // of the block to be
   Scratch<Key, 640> keys_;     // of the block to be
 };
 

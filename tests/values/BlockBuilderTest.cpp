@@ -1,3 +1,4 @@
+#include <algorithm>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -15,6 +16,7 @@
 namespace oxmv::test {
 namespace {
 
+using namespace std::string_literals;
 using detail::BlockBuilder;
 using detail::Form;
 using detail::Key;
@@ -39,6 +41,16 @@ TEST(Scratch, KeepsItsItemsWhenItOutgrowsItself) {
   *scratch.extend(1) = 7;
   EXPECT_EQ(std::vector(scratch.from(1).begin(), scratch.from(1).end()),
             (std::vector<std::uint32_t>{1, 2, 7}));
+}
+
+TEST(Scratch, StartsAgainInItselfOnceItsHeapIsGivenBack) {
+  Scratch<std::uint32_t, 4> scratch;
+  for (std::uint32_t i = 0; i < 100; ++i) scratch.push(i);
+  scratch.release();
+  EXPECT_EQ(scratch.size(), 0u);
+  for (std::uint32_t i = 0; i < 100; ++i) scratch.push(2 * i);
+  EXPECT_EQ(scratch.size(), 100u);
+  EXPECT_EQ(scratch[99], 198u);
 }
 
 TEST(BlockBuilder, LastValueOfAnIdWinsInTheFirstPlace) {
@@ -113,6 +125,52 @@ TEST(BlockBuilder, GroupsOfEverySizeKeepFirstPlacesAndLastValues) {
     ASSERT_EQ(made["1001"], Value(expected)) << count;
     ASSERT_EQ(keys(made["1001"].dictionary()), keys(expected)) << count;
     ASSERT_EQ(keys(made["1002"].dictionary()), keys(other)) << count;
+  }
+}
+
+// Names are told apart by their first eight bytes where these differ.
+TEST(BlockBuilder, ManyNamesThatBeginAlikeAreAllFound) {
+  const std::string letters = "abcdefgh\0\0ij"s;
+  const Bytes bytes = bytesOf(letters + letters + "\x7F\xC3\xA9");
+  std::vector<Slot> names;
+  for (std::uint32_t size = 0; size <= letters.size(); ++size) {
+    names.push_back(Slot::place(Form::text, size, 0));
+    if (size > 0) names.push_back(Slot::place(Form::text, size, 1));
+  }
+  names.push_back(Slot::place(Form::text, 1, 24));
+  names.push_back(Slot::place(Form::text, 2, 25));
+
+  BlockBuilder builder(bytes);
+  Dictionary expected;
+  const auto outer = builder.open();
+  for (int round = 0; round < 2; ++round) {
+    for (std::size_t i = 0; i < names.size(); ++i) {
+      const auto value = static_cast<std::int32_t>(1000 * round + static_cast<int>(i));
+      builder.putNamed(1, keyOf(1), names[i], number(value));
+      expected.set({reinterpret_cast<const char*>(bytes.data()) + names[i].body, names[i].size()},
+                   value);
+    }
+  }
+  const Slot root = builder.close(outer);
+  const Dictionary made = Value::in(*builder.block(), root).dictionary()["1001"].dictionary();
+  EXPECT_EQ(made.size(), names.size());
+  EXPECT_EQ(keys(made), keys(expected));
+  for (const auto& [key, value] : expected) EXPECT_EQ(made[key], value) << key;
+}
+
+TEST(BlockBuilder, NamesOfEveryLengthAreUtf8WhateverIsBehindThem) {
+  for (std::uint32_t size = 1; size <= 70; ++size) {
+    for (const std::size_t behind : {0u, 1u, 31u, 32u, 33u}) {
+      Bytes bytes(size + behind, 'x');
+      std::fill(bytes.begin() + size, bytes.end(), std::uint8_t{0xFF});
+      const Slot name = Slot::place(Form::text, size, 0);
+      EXPECT_EQ(BlockBuilder(bytes).asUtf8(name), name) << size << " and " << behind;
+      for (const std::uint32_t place : {0u, size / 2, size - 1}) {
+        bytes[place] = 0xE9;
+        EXPECT_EQ(BlockBuilder(bytes).asUtf8(name).size(), size + 1) << size << " and " << behind;
+        bytes[place] = 'x';
+      }
+    }
   }
 }
 

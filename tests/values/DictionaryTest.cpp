@@ -1,4 +1,5 @@
 #include <array>
+#include <bit>
 #include <cstdint>
 #include <functional>
 #include <iterator>
@@ -16,6 +17,7 @@
 #include "tests/support/CollidingNames.h"
 #include "tests/support/Decoding.h"
 #include "tests/support/Printing.h"
+#include "tests/support/StreamBuilder.h"
 
 namespace oxmv::test {
 namespace {
@@ -387,6 +389,25 @@ TEST(Dictionary, KeyThatIsNotUtf8IsReadAsLatin1) {
   EXPECT_EQ(dictionary.size(), 1u);
   EXPECT_TRUE(dictionary.remove("Caf\xE9"));
   EXPECT_TRUE(dictionary.empty());
+}
+
+TEST(Dictionary, DecodedFindsTheTagAtEveryPlaceAndNoOther) {
+  const std::array<std::string_view, 20> tags = {
+      "ACDL", "AFFI", "ATZM", "BMTX", "CACT", "CADN", "CALI", "CCRV", "CHFP", "CHNL",
+      "CLSF", "CLSR", "CLSY", "CMIX", "CMVL", "CPUM", "CQUL", "CSWP", "CV67", "DCRV"};
+  for (std::size_t count = 0; count < tags.size(); ++count) {
+    StreamBuilder stream;
+    for (std::size_t i = 0; i < count; ++i)
+      stream.record(tags[i], 'H', static_cast<std::int32_t>(i));
+    // The payload of the last is the tag that is not there, and stands where a search might go on.
+    stream.record("DEMO", 'H', std::bit_cast<std::int32_t>(std::array{'I', 'G', 'N', 'R'}));
+    const Dictionary dictionary = decoded(stream.bytes());
+    for (std::size_t i = 0; i < count; ++i)
+      EXPECT_EQ(dictionary[tags[i]], Value(static_cast<std::int32_t>(i))) << tags[i];
+    for (std::size_t i = count; i < tags.size(); ++i)
+      EXPECT_TRUE(dictionary[tags[i]].isNothing()) << tags[i];
+    EXPECT_TRUE(dictionary["IGNR"].isNothing());
+  }
 }
 
 // Many entries: from some number on look-ups go through an index.

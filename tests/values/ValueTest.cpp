@@ -271,7 +271,7 @@ TEST(Value, TextInABlockHasEveryLength) {
 }
 
 TEST(Value, TextInABlockEndsAtItsFirstNulOrGoesOn) {
-  for (std::size_t nul = 0; nul < 70; ++nul) {
+  for (std::size_t nul = 0; nul < 69; ++nul) {
     std::string bytes(70, 'x');
     bytes[nul] = '\0';
     bytes[69] = '\0';
