@@ -1,226 +1,281 @@
 // What importing a look costs. The description is one table of 64 points: 786,432 values in 6.3 MB of
-// text, in one line or in lines of twelve values.
+// text.
 //
-//   lookImport        -- the whole import: read, parse, convert, check, write the table and the copy
-//   lookImportLines   -- the same, the text in lines
-//   lookImportCrlf    -- the same, each line ends in carriage return and line feed
-//   lookFloor         -- the floor: the file read, 3 MB copied, that and the file written, no more
-//   lookParse         -- the description's nodes, long texts left out of the parsing
-//   lookParseCrlf     -- the same for the text in lines that end in carriage return and line feed
-//   lookParsePlain    -- the same, everything through the XML parser
-//   lookRuns          -- the search for long texts
-//   lookHex           -- the text into values; Portable: without vector instructions
-//   lookHexLines      -- the same in lines, and with a blank behind each value (Blanks)
-//   lookCrc           -- the CRC-32 of 3 MB of values
+//   import            the whole import: read, parse, convert, check, write the table and the copy
+//   import lines      the same, the text in lines of twelve values; import CRLF: those of another system
+//   import blanks     the same, with a blank behind each value
+//   hexadecimal       the text into values, and the same in lines and with blanks
+//   CRC-32            of 3 MB of values
 //
-// Files go to /dev/shm where there is one, because a disk's fsync takes longer than all the rest. The
-// floor writes through the same function as the import, so what fsync takes there is in both.
+// Beside them: OpenColorIO making a processor of the same table as .cube and as .clf, without its caches;
+// libdeflate's CRC-32; and digits taken one by one from a table of 256 entries. The floor of an import
+// reads the file, copies 3 MB, and writes that and the file through the same functions, so what fsync
+// takes is in both.
 
-#include <algorithm>
-#include <cstddef>
+#include <array>
+#include <bit>
 #include <cstdint>
-#include <cstdlib>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <memory>
 #include <random>
 #include <stdexcept>
-#include <string>
-#include <vector>
+#include <utility>
 
+#include <OpenColorIO/OpenColorIO.h>
 #include <benchmark/benchmark.h>
+#include <libdeflate.h>
 
-#include "oxmv/host/Host.h"
+#include "FilesBench.h"
 #include "oxmv/looks/Crc32.h"
 #include "oxmv/looks/HexTable.h"
-#include "oxmv/looks/LongRuns.h"
-#include "oxmv/looks/LookDescription.h"
 #include "oxmv/looks/LookFileRef.h"
 #include "oxmv/looks/LookTableFile.h"
 #include "oxmv/platform/WholeFile.h"
 
+namespace bench {
 namespace {
 
 using namespace oxmv;
 namespace fs = std::filesystem;
+namespace ocio = OCIO_NAMESPACE;
 using Bytes = std::vector<std::uint8_t>;
 
-constexpr std::size_t valueCount = lookValueCount(maxLookSize);
+constexpr int points = 64;
+constexpr std::size_t valueCount = lookValueCount(points);
+constexpr int rounds = 21;
 
-// Hexadecimal digits of random values, `separator` behind every `each`.
-std::string tableText(std::size_t each, std::string_view separator) {
-  std::mt19937 random(64);
+// What a host answers that has nothing but the look-table folder.
+class FolderHost final : public Host {
+ public:
+  explicit FolderHost(std::string folder) : folder_(std::move(folder)) {}
+  Value copyPreference(std::string_view, std::string_view) override { return {}; }
+  void setPreference(std::string_view, const Value&, std::string_view) override {}
+  bool synchronizePreferences(std::string_view, std::error_code*) override { return true; }
+  std::string localizedString(std::string_view, std::string_view) override { return folder_; }
+  void alert(std::string_view) override {}
+  void log(std::string_view) override {}
+
+ private:
+  std::string folder_;
+};
+
+std::span<const std::uint8_t> bytesOf(std::string_view text) {
+  return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+void putFile(const std::string& path, std::span<const std::uint8_t> content) {
+  std::error_code error;
+  if (!writeWholeFile(path, content, error)) throw std::system_error(error, path);
+}
+
+// The table as others have it.
+
+std::string triplesOf(const std::vector<float>& values) {
   std::string text;
-  for (std::size_t i = 0; i < valueCount; ++i) {
-    std::uint32_t value = static_cast<std::uint32_t>(random());
-    for (int k = 0; k < 8; ++k, value >>= 4) text += "0123456789ABCDEF"[value & 0xF];
+  char line[64];
+  for (std::size_t i = 0; i < values.size(); i += 3) {
+    std::snprintf(line, sizeof line, "%.6f %.6f %.6f\n", static_cast<double>(values[i]),
+                  static_cast<double>(values[i + 1]), static_cast<double>(values[i + 2]));
+    text += line;
+  }
+  return text;
+}
+
+std::string cubeOf(const std::vector<float>& values) {
+  return "LUT_3D_SIZE 64\n" + triplesOf(values);
+}
+
+std::string clfOf(const std::vector<float>& values) {
+  return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+         "<ProcessList compCLFversion=\"3\" id=\"look\">\n"
+         "<LUT3D id=\"table\" inBitDepth=\"32f\" outBitDepth=\"32f\" "
+         "interpolation=\"tetrahedral\">\n"
+         "<Array dim=\"64 64 64 3\">\n" +
+         triplesOf(values) + "</Array>\n</LUT3D>\n</ProcessList>\n";
+}
+
+void makeProcessor(const std::string& path) {
+  const auto config = ocio::Config::CreateRaw()->createEditableCopy();
+  config->setProcessorCacheFlags(ocio::PROCESSOR_CACHE_OFF);
+  const auto transform = ocio::FileTransform::Create();
+  transform->setSrc(path.c_str());
+  transform->setInterpolation(ocio::INTERP_TETRAHEDRAL);
+  const auto processor = config->getProcessor(transform);
+  if (processor->isNoOp()) throw std::logic_error("no table in " + path);
+}
+
+// A digit at a time, as one writes it first: a table says what it is worth.
+std::size_t hexByTable(std::string_view text, std::span<std::uint8_t> values) {
+  static const std::array<std::uint8_t, 256> worth = [] {
+    std::array<std::uint8_t, 256> table{};
+    table.fill(0xFF);
+    for (std::uint8_t i = 0; i < 16; ++i) {
+      table[static_cast<std::uint8_t>("0123456789ABCDEF"[i])] = i;
+      table[static_cast<std::uint8_t>("0123456789abcdef"[i])] = i;
+    }
+    return table;
+  }();
+  const auto worthOf = [&](std::size_t at) { return worth[static_cast<std::uint8_t>(text[at])]; };
+  std::size_t stored = 0;
+  for (std::size_t at = 0; at < text.size() && stored < values.size();) {
+    if (worthOf(at) == 0xFF) {
+      ++at;
+      continue;
+    }
+    if (text.size() - at < 8) break;
+    for (std::size_t i = 0; i < 8; i += 2)
+      values[stored++] = static_cast<std::uint8_t>(worthOf(at + i) << 4 | worthOf(at + i + 1));
+    at += 8;
+  }
+  return stored / 4;
+}
+
+// The floor, between the same folders.
+void moveThroughMemory(const LookFolder& folder, const Bytes& table) {
+  std::error_code error;
+  const auto file = readWholeFile(folder.description(), error);
+  if (!file) throw std::system_error(error, "the floor");
+  const auto copy = std::make_unique_for_overwrite<std::uint8_t[]>(table.size());
+  std::memcpy(copy.get(), table.data(), table.size());
+  putFile(folder.looks() + "/1.oxlook", {copy.get(), table.size()});
+  putFile(folder.looks() + "/Look.xml", *file);
+}
+
+std::vector<Line> measureImport(std::string_view name, const std::vector<float>& values,
+                                const std::string& text, bool withPeers) {
+  const LookFolder folder;
+  folder.put(lookDescription(points, {text}));
+  const Bytes table(lookFileSize(points), 0x5A);
+  const auto prepare = [&] {
+    folder.empty();
+    ocio::ClearAllCaches();
+  };
+  std::vector<Measured> all = {{"oxmv", [&] { folder.import(); }, prepare},
+                               {"floor", [&] { moveThroughMemory(folder, table); }, prepare}};
+  const MemoryFolder peers;
+  const std::string cube = peers.path() + "/Look.cube", clf = peers.path() + "/Look.clf";
+  if (withPeers) {
+    putFile(cube, bytesOf(cubeOf(values)));
+    putFile(clf, bytesOf(clfOf(values)));
+    all.push_back({"OpenColorIO .cube", [&] { makeProcessor(cube); }, prepare});
+    all.push_back({"OpenColorIO .clf", [&] { makeProcessor(clf); }, prepare});
+  }
+  measureSideBySide(all, rounds);
+
+  Line line{.name = std::string(name),
+            .ours = all[0].cpu,
+            .floor = all[1].cpu,
+            .floorAim = name == "import" ? 0.7 : 0.5};
+  if (!withPeers) return {line};
+  std::vector<Line> lines(2, line);
+  for (std::size_t i = 0; i < 2; ++i) {
+    lines[i].bestPeer = all[2 + i].cpu;
+    lines[i].peerName = all[2 + i].name;
+  }
+  lines[0].aim = 60;
+  lines[1].aim = 25;
+  return lines;
+}
+
+Line measureHex(std::string_view name, const std::string& text) {
+  Bytes values(valueCount * 4), others(valueCount * 4);
+  const auto check = [](std::size_t count) {
+    if (count != valueCount) throw std::logic_error("values were lost");
+  };
+  std::vector<Measured> all = {{"oxmv", [&] { check(readHexTable(text, values).stored); }},
+                               {"table of 256", [&] { check(hexByTable(text, others)); }}};
+  measureSideBySide(all, rounds);
+  if (values != others) throw std::logic_error("hexadecimal digits were read in two ways");
+  return {.name = std::string(name),
+          .ours = all[0].cpu,
+          .bestPeer = all[1].cpu,
+          .peerName = all[1].name,
+          .aim = 4};
+}
+
+Line measureCrc(const std::vector<float>& values) {
+  const auto* const bytes = reinterpret_cast<const std::uint8_t*>(values.data());
+  const std::size_t size = values.size() * sizeof(float);
+  std::uint32_t ours = 0, theirs = 0;
+  std::vector<Measured> all = {
+      {"oxmv", [&] { ours = calccrc(bytes, static_cast<std::ptrdiff_t>(size)); }},
+      {"libdeflate", [&] { theirs = libdeflate_crc32(0, bytes, size); }}};
+  measureSideBySide(all, 10 * rounds);
+  if (ours != theirs) throw std::logic_error("two CRC-32 of the same bytes");
+  return {.name = "CRC-32",
+          .ours = all[0].cpu,
+          .bestPeer = all[1].cpu,
+          .peerName = all[1].name,
+          .aim = 1};
+}
+
+}  // namespace
+
+std::vector<float> lookValues(int size) {
+  std::mt19937 random(64);
+  std::vector<float> values(lookValueCount(size));
+  for (float& value : values) value = static_cast<float>(random() % 1000001) / 1000000.0f;
+  return values;
+}
+
+std::string lookText(const std::vector<float>& values, std::size_t each,
+                     std::string_view separator) {
+  std::string text;
+  for (std::size_t i = 0; i < values.size(); ++i) {
+    const auto bits = std::bit_cast<std::uint32_t>(values[i]);
+    for (int shift = 0; shift < 32; shift += 8) {
+      text += "0123456789ABCDEF"[bits >> (shift + 4) & 0xF];
+      text += "0123456789ABCDEF"[bits >> shift & 0xF];
+    }
     if ((i + 1) % each == 0) text += separator;
   }
   return text;
 }
 
-const std::string oneLine = '"' + tableText(valueCount, "") + '"';
-const std::string lines = tableText(12, "\n");
-const std::string crlfLines = tableText(12, "\r\n");
-const std::string blanks = tableText(1, " ");
-
-Bytes descriptionOf(const std::string& text) {
-  const std::string file =
-      "<?xml version=\"1.0\" encoding=\"UTF-8\"?><look><LUT><size>64</size><data>" + text +
-      "</data></LUT></look>";
-  return {file.begin(), file.end()};
+std::string lookDescription(int size, const std::vector<std::string>& texts) {
+  std::string file = "<?xml version=\"1.0\" encoding=\"UTF-8\"?><look>";
+  for (const std::string& text : texts) {
+    file += "<LUT><size>" + std::to_string(size) + "</size><data>\"" + text + "\"</data></LUT>";
+  }
+  return file + "</look>";
 }
 
-// A look-table folder, and a host that names it.
-class Folder {
- public:
-  Folder() {
-    const fs::path memory = "/dev/shm";
-    std::string pattern =
-        (fs::is_directory(memory) ? memory : fs::temp_directory_path()) / "oxmv-bench-XXXXXX";
-    if (::mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("no folder");
-    path_ = pattern;
-    fs::create_directory(looks());
-    before_ = installHost(std::make_shared<FolderHost>(looks()));
-  }
-  Folder(const Folder&) = delete;
-  Folder& operator=(const Folder&) = delete;
-  ~Folder() {
-    installHost(before_);
-    std::error_code ignored;
-    fs::remove_all(path_, ignored);
-  }
-
-  fs::path description() const { return path_ / "Look.xml"; }
-  fs::path looks() const { return path_ / "looks"; }
-
-  void empty() const {
-    for (const auto& entry : fs::directory_iterator(looks())) fs::remove(entry.path());
-  }
-
- private:
-  class FolderHost final : public Host {
-   public:
-    explicit FolderHost(std::string folder) : folder_(std::move(folder)) {}
-    Value copyPreference(std::string_view, std::string_view) override { return {}; }
-    void setPreference(std::string_view, const Value&, std::string_view) override {}
-    bool synchronizePreferences(std::string_view, std::error_code*) override { return true; }
-    std::string localizedString(std::string_view, std::string_view) override { return folder_; }
-    void alert(std::string_view) override {}
-    void log(std::string_view) override {}
-
-   private:
-    std::string folder_;
-  };
-
-  fs::path path_;
-  std::shared_ptr<Host> before_;
-};
-
-void put(const fs::path& path, std::span<const std::uint8_t> content) {
-  std::error_code error;
-  if (!writeWholeFile(path, content, error)) throw std::system_error(error);
+LookFolder::LookFolder() {
+  fs::create_directory(looks());
+  before_ = installHost(std::make_shared<FolderHost>(looks()));
 }
 
-void import(benchmark::State& state, const std::string& text) {
-  const Folder folder;
-  put(folder.description(), descriptionOf(text));
-  for (auto _ : state) {
-    const auto look = LookFileRef::initFromLookFile(folder.description());
-    if (!look || look->version() != 2) state.SkipWithError("not imported");
-    state.PauseTiming();
-    folder.empty();
-    state.ResumeTiming();
-  }
+LookFolder::~LookFolder() { installHost(before_); }
+
+void LookFolder::put(std::string_view description) const {
+  putFile(this->description(), bytesOf(description));
 }
 
-void lookImport(benchmark::State& state) { import(state, oneLine); }
-BENCHMARK(lookImport)->Unit(benchmark::kMicrosecond);
-
-void lookImportLines(benchmark::State& state) { import(state, lines); }
-BENCHMARK(lookImportLines)->Unit(benchmark::kMicrosecond);
-
-void lookImportCrlf(benchmark::State& state) { import(state, crlfLines); }
-BENCHMARK(lookImportCrlf)->Unit(benchmark::kMicrosecond);
-
-void lookFloor(benchmark::State& state) {
-  const Folder folder;
-  put(folder.description(), descriptionOf(oneLine));
-  const Bytes table(lookFileSize(maxLookSize), 0x5A);
-  for (auto _ : state) {
-    std::error_code error;
-    const auto file = readWholeFile(folder.description(), error);
-    if (!file) state.SkipWithError("not read");
-    const auto copy = std::make_unique_for_overwrite<std::uint8_t[]>(table.size());
-    std::memcpy(copy.get(), table.data(), table.size());
-    put(folder.looks() / "1.oxlook", {copy.get(), table.size()});
-    put(folder.looks() / "Look.xml", *file);
-    state.PauseTiming();
-    folder.empty();
-    state.ResumeTiming();
-  }
-}
-BENCHMARK(lookFloor)->Unit(benchmark::kMicrosecond);
-
-void parse(benchmark::State& state, const std::string& text, LookParsing parsing) {
-  const Bytes file = descriptionOf(text);
-  for (auto _ : state) {
-    benchmark::DoNotOptimize(LookDescription::parse(file, nullptr, parsing)->nodeCount());
-  }
+void LookFolder::empty() const {
+  for (const auto& entry : fs::directory_iterator(looks())) fs::remove(entry.path());
 }
 
-void lookParse(benchmark::State& state) { parse(state, oneLine, LookParsing::quick); }
-BENCHMARK(lookParse)->Unit(benchmark::kMicrosecond);
-
-void lookParseCrlf(benchmark::State& state) { parse(state, crlfLines, LookParsing::quick); }
-BENCHMARK(lookParseCrlf)->Unit(benchmark::kMicrosecond);
-
-void lookParsePlain(benchmark::State& state) { parse(state, oneLine, LookParsing::plain); }
-BENCHMARK(lookParsePlain)->Unit(benchmark::kMicrosecond);
-
-void runs(benchmark::State& state, Instructions instructions) {
-  const Bytes file = descriptionOf(oneLine);
-  const std::string_view text(reinterpret_cast<const char*>(file.data()), file.size());
-  for (auto _ : state) benchmark::DoNotOptimize(withoutLongRuns(text, instructions).runs.size());
+void LookFolder::import() const {
+  const auto look = LookFileRef::initFromLookFile(description());
+  if (!look || look->version() != 2) throw std::logic_error("no look was imported");
 }
 
-void lookRuns(benchmark::State& state) { runs(state, Instructions::vector); }
-BENCHMARK(lookRuns)->Unit(benchmark::kMicrosecond);
-
-void lookRunsPortable(benchmark::State& state) { runs(state, Instructions::portable); }
-BENCHMARK(lookRunsPortable)->Unit(benchmark::kMicrosecond);
-
-void hex(benchmark::State& state, const std::string& text, Instructions instructions) {
-  Bytes values(valueCount * 4);
-  for (auto _ : state) {
-    if (readHexTable(text, values, instructions).stored != valueCount) state.SkipWithError("lost");
-  }
+std::vector<Line> measureLooks() {
+  const std::vector<float> values = lookValues(points);
+  const std::string dense = lookText(values, valueCount, "");
+  const std::string lines = lookText(values, 12, "\n");
+  const std::string blanks = lookText(values, 1, " ");
+  std::vector<Line> measured = measureImport("import", values, dense, true);
+  measured.push_back(measureImport("import lines", values, lines, false)[0]);
+  measured.push_back(measureImport("import CRLF", values, lookText(values, 12, "\r\n"), false)[0]);
+  measured.push_back(measureImport("import blanks", values, blanks, false)[0]);
+  measured.push_back(measureHex("hexadecimal", dense));
+  measured.push_back(measureHex("hex. lines", lines));
+  measured.push_back(measureHex("hex. blanks", blanks));
+  measured.push_back(measureCrc(values));
+  return measured;
 }
 
-void lookHex(benchmark::State& state) { hex(state, oneLine, Instructions::vector); }
-BENCHMARK(lookHex)->Unit(benchmark::kMicrosecond);
-
-void lookHexPortable(benchmark::State& state) { hex(state, oneLine, Instructions::portable); }
-BENCHMARK(lookHexPortable)->Unit(benchmark::kMicrosecond);
-
-void lookHexLines(benchmark::State& state) { hex(state, lines, Instructions::vector); }
-BENCHMARK(lookHexLines)->Unit(benchmark::kMicrosecond);
-
-void lookHexBlanks(benchmark::State& state) { hex(state, blanks, Instructions::vector); }
-BENCHMARK(lookHexBlanks)->Unit(benchmark::kMicrosecond);
-
-void crc(benchmark::State& state, Instructions instructions) {
-  const Bytes values(valueCount * 4, 0x5A);
-  for (auto _ : state) {
-    benchmark::DoNotOptimize(
-        update_crc(0, values.data(), static_cast<std::ptrdiff_t>(values.size()), instructions));
-  }
-}
-
-void lookCrc(benchmark::State& state) { crc(state, Instructions::vector); }
-BENCHMARK(lookCrc)->Unit(benchmark::kMicrosecond);
-
-void lookCrcPortable(benchmark::State& state) { crc(state, Instructions::portable); }
-BENCHMARK(lookCrcPortable)->Unit(benchmark::kMicrosecond);
-
-}  // namespace
+}  // namespace bench

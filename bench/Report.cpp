@@ -100,17 +100,27 @@ std::vector<Line> linesOf(std::span<const Operation> operations, const Times& ti
 }
 
 void printLines(std::span<const Line> lines) {
-  std::printf("\n%-16s %10s %10s  %-20s %6s %5s %4s %10s %10s\n", "", "oxmv ns", "peer ns",
-              "fastest peer", "ratio", "aim", "", "floor ns", "over floor");
-  for (const Line& line : lines) {
-    std::printf("%-16s %10.0f %10.0f  %-20s %6.2f", line.name.c_str(), line.ours, line.bestPeer,
-                line.peerName.c_str(), line.ratio());
-    if (line.aim > 0) {
-      std::printf(" %5.1f %4s", line.aim, line.ratio() >= line.aim ? "met" : "NOT");
+  const auto printAim = [](double aim, double reached) {
+    if (aim > 0) {
+      std::printf(" %5.4g %4s", aim, reached >= aim ? "met" : "NOT");
     } else {
       std::printf(" %5s %4s", "", "");
     }
-    if (line.floor > 0) std::printf(" %10.0f %10.2f", line.floor, line.overFloor());
+  };
+  std::printf("\n%-20s %10s %10s  %-20s %6s %5s %4s %10s %10s %5s\n", "", "oxmv ns", "peer ns",
+              "fastest peer", "ratio", "aim", "", "floor ns", "over floor", "speed");
+  for (const Line& line : lines) {
+    std::printf("%-20s %10.0f", line.name.c_str(), line.ours);
+    if (line.bestPeer > 0) {
+      std::printf(" %10.0f  %-20s %6.2f", line.bestPeer, line.peerName.c_str(), line.ratio());
+    } else {
+      std::printf(" %10s  %-20s %6s", "", "", "");
+    }
+    printAim(line.aim, line.ratio());
+    if (line.floor > 0) {
+      std::printf(" %10.0f %10.2f %5.2f", line.floor, line.overFloor(), line.partOfFloor());
+      printAim(line.floorAim, line.partOfFloor());
+    }
     std::printf("\n");
   }
 }
@@ -130,23 +140,38 @@ void printPeers(std::span<const Operation> operations, const Times& times) {
   }
 }
 
-void writeJson(const std::filesystem::path& file, std::span<const Line> lines) {
-  std::ofstream out(file);
+namespace {
+
+void putJson(const std::filesystem::path& file, std::ios::openmode mode,
+             std::span<const Line> lines) {
+  std::ofstream out(file, mode);
   for (const Line& line : lines) {
-    nlohmann::ordered_json object = {{"name", line.name},
-                                     {"ours", line.ours},
-                                     {"best peer", line.bestPeer},
-                                     {"its name", line.peerName},
-                                     {"ratio", line.ratio()}};
+    nlohmann::ordered_json object = {{"name", line.name}, {"ours", line.ours}};
+    if (line.bestPeer > 0) {
+      object["best peer"] = line.bestPeer;
+      object["its name"] = line.peerName;
+      object["ratio"] = line.ratio();
+    }
     if (line.floor > 0) {
       object["floor"] = line.floor;
       object["ratio to the floor"] = line.overFloor();
     }
     if (line.aim > 0) object["aim"] = line.aim;
+    if (line.floorAim > 0) object["aim for the part of the floor's speed"] = line.floorAim;
     out << object.dump() << '\n';
   }
   out.flush();
   if (!out) throw std::runtime_error("cannot write " + file.string());
+}
+
+}  // namespace
+
+void writeJson(const std::filesystem::path& file, std::span<const Line> lines) {
+  putJson(file, std::ios::out, lines);
+}
+
+void addJson(const std::filesystem::path& file, std::span<const Line> lines) {
+  putJson(file, std::ios::app, lines);
 }
 
 }  // namespace bench

@@ -1,91 +1,41 @@
 // What listing a database costs, beside what the system takes to hand over its files.
 //
-//   floor      -- the names in the folder, and each file opened, read into one buffer and closed
-//   twoFloors  -- the same on two threads, each with half of the files
-//   list       -- `oxmv db list`: the table of all clips
-//   listJson   -- `oxmv db list --ndjson`
-//   check      -- `oxmv db check`
+//   db list           `oxmv db list`: the table of all clips; the same as CSV and as NDJSON
+//   db check          `oxmv db check`
 //
-// 20,000 clips of one combined file, all in the system's memory. The output goes to /dev/null. What
-// counts is the ratio to `floor`, which every other line has as `floors`.
+// 20,000 clips of 2 KB, all in the system's memory. The output goes to /dev/null. The floor reads the
+// names in the folder, and opens, reads into one buffer and closes each file. On one processor time is
+// what the processor took; on two, where the floor has a thread for each half of the files, it is that
+// of the clock on the wall.
 
-#include <algorithm>
-#include <array>
-#include <atomic>
-#include <chrono>
-#include <cstddef>
 #include <cstdint>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <string>
+#include <future>
+#include <stdexcept>
 #include <thread>
-#include <vector>
 
 #include <benchmark/benchmark.h>
 #include <dirent.h>
 #include <fcntl.h>
+#include <sched.h>
 #include <unistd.h>
 
+#include "Corpus.h"
+#include "FilesBench.h"
 #include "cli/Run.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
 #include "oxmv/store/ClipFileName.h"
-#include "oxmv/values/Array.h"
 
+namespace bench {
 namespace {
 
 using namespace oxmv;
-using Seconds = std::chrono::duration<double>;
 
-constexpr std::uint32_t clipCount = 20000;
-
-std::vector<std::uint8_t> clip(std::uint32_t number) {
-  const std::string text = std::to_string(number);
-  Dictionary tags = {{"TIMC", "01:00:00:00"},
-                     {"REEL", "A001_C" + text},
-                     {"DATE", "2026-03-14"},
-                     {"TIME", "15:09:26"},
-                     {"LOGC", "second take, clouds"},
-                     {"SCEN", static_cast<std::int32_t>(number % 90)},
-                     {"SHOT", 4},
-                     {"TAKE", 2},
-                     {"LOOK", "Warm.oxlook"},
-                     {"WBAL", Array::of(1.0f, 1.2f, 1.05f, 1.5f)},
-                     {"SATU", 1.1f},
-                     {"CMDL", "QX Alpha"}};
-  for (const char* tag : {"GAIN", "SHUT", "PROJ", "ECRV", "DCRV", "PCRV", "PIXR", "CAMR"})
-    tags.set(tag, static_cast<std::int32_t>(number % 7));
-  return encodeStream(tags).value();
-}
-
-// A database in a folder of its own, for as long as the program runs.
-class Clips {
- public:
-  Clips() {
-    std::string pattern = std::filesystem::temp_directory_path() / "oxmv-bench-XXXXXX";
-    path_ = ::mkdtemp(pattern.data());
-    for (std::uint32_t i = 0; i < clipCount; ++i) {
-      const ClipFileName name{{i * 2654435761u, 1, 2, {3, 4, 5, 6, 7, 8, 9, 10}}, std::nullopt};
-      const std::vector<std::uint8_t> stream = clip(i);
-      std::ofstream(path_ + '/' + name.text(), std::ios::binary)
-          .write(reinterpret_cast<const char*>(stream.data()),
-                 static_cast<std::streamsize>(stream.size()));
-    }
-  }
-  Clips(const Clips&) = delete;
-  Clips& operator=(const Clips&) = delete;
-  ~Clips() { std::filesystem::remove_all(path_); }
-
-  const std::string& path() const { return path_; }
-
- private:
-  std::string path_;
-};
-
-const std::string& folder() {
-  static const Clips clips;
-  return clips.path();
-}
+constexpr std::size_t clipCount = 20000;
+constexpr int rounds = 15;
+constexpr double floorAim = 0.75;
 
 std::vector<std::string> names(int directory) {
   std::vector<std::string> found;
@@ -97,91 +47,119 @@ std::vector<std::string> names(int directory) {
   return found;
 }
 
-std::size_t readAll(int directory, const std::vector<std::string>& files, std::size_t first,
-                    std::size_t step) {
+std::size_t readAll(int directory, std::span<const std::string> files) {
   std::vector<std::uint8_t> buffer(65536);
   std::size_t bytes = 0;
-  for (std::size_t i = first; i < files.size(); i += step) {
-    const int file = ::openat(directory, files[i].c_str(), O_RDONLY);
+  for (const std::string& name : files) {
+    const int file = ::openat(directory, name.c_str(), O_RDONLY);
     bytes += static_cast<std::size_t>(::read(file, buffer.data(), buffer.size()));
     ::close(file);
   }
   return bytes;
 }
 
-void scan(std::size_t threads) {
-  const int directory = ::open(folder().c_str(), O_RDONLY | O_DIRECTORY);
+void readFolder(const std::string& folder, bool onTwoThreads) {
+  const int directory = ::open(folder.c_str(), O_RDONLY | O_DIRECTORY);
   const std::vector<std::string> files = names(directory);
-  std::atomic<std::size_t> bytes = 0;
-  std::vector<std::thread> others;
-  for (std::size_t i = 1; i < threads; ++i)
-    others.emplace_back([&, i] { bytes += readAll(directory, files, i, threads); });
-  bytes += readAll(directory, files, 0, threads);
-  for (std::thread& other : others) other.join();
-  ::close(directory);
-  benchmark::DoNotOptimize(bytes.load());
-}
-
-template <class Body>
-double secondsFor(Body body) {
-  const auto start = std::chrono::steady_clock::now();
-  body();
-  return Seconds(std::chrono::steady_clock::now() - start).count();
-}
-
-// Each run beside one of the floor, so that both meet the same machine.
-template <class Body>
-void besideFloor(benchmark::State& state, Body body) {
-  folder();
-  scan(1);
-  double floor = 0;
-  double all = 0;
-  for (auto _ : state) {
-    floor += secondsFor([] { scan(1); });
-    const double seconds = secondsFor(body);
-    all += seconds;
-    state.SetIterationTime(seconds);
+  const std::span all(files);
+  const std::size_t middle = onTwoThreads ? all.size() / 2 : all.size();
+  std::future<std::size_t> other;
+  if (onTwoThreads) {
+    other = std::async(std::launch::async, [&] { return readAll(directory, all.subspan(middle)); });
   }
-  state.counters["floors"] = all / floor;
-  state.SetItemsProcessed(state.iterations() * clipCount);
+  std::size_t bytes = readAll(directory, all.first(middle));
+  if (onTwoThreads) bytes += other.get();
+  ::close(directory);
+  benchmark::DoNotOptimize(bytes);
 }
 
-// The command, with its standard output in /dev/null.
-void command(std::vector<const char*> arguments) {
+// Keeps the process on one processor, of which the command then has one thread.
+class OneProcessor {
+ public:
+  OneProcessor() {
+    ::sched_getaffinity(0, sizeof before_, &before_);
+    cpu_set_t one;
+    CPU_ZERO(&one);
+    for (std::size_t i = 0; i < CPU_SETSIZE && CPU_COUNT(&one) == 0; ++i) {
+      if (CPU_ISSET(i, &before_)) CPU_SET(i, &one);
+    }
+    ::sched_setaffinity(0, sizeof one, &one);
+  }
+  OneProcessor(const OneProcessor&) = delete;
+  OneProcessor& operator=(const OneProcessor&) = delete;
+  ~OneProcessor() { ::sched_setaffinity(0, sizeof before_, &before_); }
+
+ private:
+  cpu_set_t before_;
+};
+
+}  // namespace
+
+void writeClips(const std::string& folder, std::size_t count) {
+  static const Corpus corpus = makeCorpus("typical", 2048);
+  for (std::size_t i = 0; i < count; ++i) {
+    const auto number = static_cast<std::uint32_t>(i);
+    Dictionary tags = corpus.clips[i % corpus.clips.size()];
+    tags.set("REEL", "A001_C" + std::to_string(number));
+    tags.set("TIMC", "01:00:00:00");
+    tags.set("DATE", "2026-03-14");
+    tags.set("SCEN", static_cast<std::int32_t>(number % 90));
+    tags.set("SHOT", 4);
+    tags.set("TAKE", 2);
+    tags.set("LOOK", "Warm.oxlook");
+    const Bytes stream = encodeStream(tags).value();
+    const ClipFileName name{{number * 2654435761u, 1, 2, {3, 4, 5, 6, 7, 8, 9, 10}}, std::nullopt};
+    std::ofstream file(folder + '/' + name.text(), std::ios::binary);
+    file.write(reinterpret_cast<const char*>(stream.data()),
+               static_cast<std::streamsize>(stream.size()));
+    if (!file.flush()) throw std::runtime_error("clips cannot be written");
+  }
+}
+
+void runCommand(std::vector<const char*> arguments) {
   arguments.insert(arguments.begin(), "oxmv");
-  arguments.insert(arguments.end(), {"--db", folder().c_str()});
   const int before = ::dup(STDOUT_FILENO);
   const int nothing = ::open("/dev/null", O_WRONLY);
   ::dup2(nothing, STDOUT_FILENO);
-  if (cli::run(arguments) != 0) std::abort();
+  const int exitCode = cli::run(arguments);
   ::dup2(before, STDOUT_FILENO);
   ::close(nothing);
   ::close(before);
+  if (exitCode != 0) throw std::runtime_error("the command failed");
 }
 
-void floor(benchmark::State& state) {
-  besideFloor(state, [] { scan(1); });
+std::vector<Line> measureScan() {
+  const MemoryFolder folder;
+  writeClips(folder.path(), clipCount);
+  const auto command = [&](std::vector<const char*> arguments) {
+    arguments.insert(arguments.end(), {"--db", folder.path().c_str()});
+    return [arguments] { runCommand(arguments); };
+  };
+  std::vector<Measured> all = {{"db list", command({"db", "list"})},
+                               {"db list CSV", command({"db", "list", "--csv"})},
+                               {"db list NDJSON", command({"db", "list", "--ndjson"})},
+                               {"db check", command({"db", "check"})},
+                               {"floor", [&] { readFolder(folder.path(), false); }}};
+  std::vector<Line> lines;
+  const auto addLines = [&](double Measured::*time, const char* suffix) {
+    for (const Measured& one : std::span(all).first(all.size() - 1)) {
+      lines.push_back({.name = one.name + suffix,
+                       .ours = one.*time,
+                       .floor = all.back().*time,
+                       .floorAim = floorAim});
+    }
+  };
+  {
+    const OneProcessor alone;
+    measureSideBySide(all, rounds);
+  }
+  addLines(&Measured::cpu, "");
+  if (std::thread::hardware_concurrency() > 1) {
+    all.back().run = [&] { readFolder(folder.path(), true); };
+    measureSideBySide(all, rounds);
+    addLines(&Measured::wall, ", two");
+  }
+  return lines;
 }
-BENCHMARK(floor)->UseManualTime()->Unit(benchmark::kMillisecond);
 
-void twoFloors(benchmark::State& state) {
-  besideFloor(state, [] { scan(2); });
-}
-BENCHMARK(twoFloors)->UseManualTime()->Unit(benchmark::kMillisecond);
-
-void list(benchmark::State& state) {
-  besideFloor(state, [] { command({"db", "list"}); });
-}
-BENCHMARK(list)->UseManualTime()->Unit(benchmark::kMillisecond);
-
-void listJson(benchmark::State& state) {
-  besideFloor(state, [] { command({"db", "list", "--ndjson"}); });
-}
-BENCHMARK(listJson)->UseManualTime()->Unit(benchmark::kMillisecond);
-
-void check(benchmark::State& state) {
-  besideFloor(state, [] { command({"db", "check"}); });
-}
-BENCHMARK(check)->UseManualTime()->Unit(benchmark::kMillisecond);
-
-}  // namespace
+}  // namespace bench

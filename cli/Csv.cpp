@@ -37,21 +37,21 @@ void endLine(std::string& line) {
 
 std::string csvField(std::string_view text) { return field(visible(text)); }
 
-CsvWriter::CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
+CsvWriter::CsvWriter(Sink& to, std::initializer_list<std::string_view> leading,
                      std::vector<Column> columns)
-    : sink_(sink), columns_(std::move(columns)) {
+    : columns_(std::move(columns)) {
   std::string line = fields(leading);
   for (const Column& column : columns_) line += field(column.name) + ',';
   endLine(line);
-  sink_.write(line);
+  to.write(line);
 }
 
-void CsvWriter::add(std::initializer_list<std::string_view> leading,
-                    std::span<const Value> values) {
+void CsvWriter::add(Sink& to, std::initializer_list<std::string_view> leading,
+                    std::span<const Value> values) const {
   std::string line = fields(leading);
   for (const Value& value : values) line += field(bare(value)) + ',';
   endLine(line);
-  sink_.write(line);
+  to.write(line);
 }
 
 }  // namespace oxmv::cli

@@ -20,18 +20,17 @@ class CsvWriter {
  public:
   // Writes the first line: what `leading` calls the fields before the tags, and the columns as they
   // were named.
-  CsvWriter(Sink& sink, std::initializer_list<std::string_view> leading,
-            std::vector<Column> columns);
+  CsvWriter(Sink& to, std::initializer_list<std::string_view> leading, std::vector<Column> columns);
 
   // `leading` are the fields before the tags, `values` those of the columns. Nothing leaves its field
   // empty. Numbers and texts stand bare, lists of numbers with blanks between them, everything else
   // as tag JSON.
-  void add(std::initializer_list<std::string_view> leading, std::span<const Value> values);
+  void add(Sink& to, std::initializer_list<std::string_view> leading,
+           std::span<const Value> values) const;
 
   const std::vector<Column>& columns() const { return columns_; }
 
  private:
-  Sink& sink_;
   std::vector<Column> columns_;
 };
 

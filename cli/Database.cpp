@@ -61,16 +61,22 @@ std::string Database::pathOf(std::string_view name) const {
   return fmt::format("{}/{}", path_, name);
 }
 
-std::span<const DatabaseFile> Database::firstClip(std::span<const DatabaseFile> files) {
-  const auto other = std::find_if(files.begin(), files.end(), [&](const DatabaseFile& file) {
-    return file.name.guid != files.front().name.guid;
-  });
-  return files.first(static_cast<std::size_t>(other - files.begin()));
+std::vector<std::span<const DatabaseFile>> Database::clips() const {
+  std::vector<std::span<const DatabaseFile>> clips;
+  for (auto rest = files(); !rest.empty();) {
+    const auto other = std::find_if(rest.begin(), rest.end(), [&](const DatabaseFile& file) {
+      return file.name.guid != rest.front().name.guid;
+    });
+    clips.push_back(rest.first(static_cast<std::size_t>(other - rest.begin())));
+    rest = rest.subspan(clips.back().size());
+  }
+  return clips;
 }
 
-std::variant<std::span<const std::uint8_t>, FileProblem> Database::read(const DatabaseFile& file) {
+std::variant<std::span<const std::uint8_t>, FileProblem> Database::read(
+    const DatabaseFile& file, std::vector<std::uint8_t>& buffer) const {
   std::error_code error;
-  const auto content = folder_.read(file.name.text(), file.kind, buffer_, error);
+  const auto content = folder_.read(file.name.text(), file.kind, buffer, error);
   if (!content) return problemOf(error);
   return *content;
 }

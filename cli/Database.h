@@ -46,11 +46,13 @@ class Database {
   // Ordered by name.
   std::span<const StrangeEntry> strangeEntries() const { return strange_; }
 
-  // The files of the clip that `files` begins with; it must have one.
-  static std::span<const DatabaseFile> firstClip(std::span<const DatabaseFile> files);
+  // The same by clip: the files of each.
+  std::vector<std::span<const DatabaseFile>> clips() const;
 
-  // A file's content: it holds until the next one is read.
-  std::variant<std::span<const std::uint8_t>, FileProblem> read(const DatabaseFile& file);
+  // A file's content, in `buffer`: it holds until that is used again. Different threads may read at the
+  // same time, each into a buffer of its own.
+  std::variant<std::span<const std::uint8_t>, FileProblem> read(
+      const DatabaseFile& file, std::vector<std::uint8_t>& buffer) const;
 
  private:
   Database(std::string path, Folder folder) : path_(std::move(path)), folder_(std::move(folder)) {}
@@ -59,7 +61,6 @@ class Database {
   Folder folder_;
   std::vector<DatabaseFile> files_;
   std::vector<StrangeEntry> strange_;
-  std::vector<std::uint8_t> buffer_;
 };
 
 // "combined", "left", "right", or the index of the eye.

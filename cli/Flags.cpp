@@ -1,9 +1,8 @@
 #include "cli/Flags.h"
 
 #include <algorithm>
-#include <utility>
+#include <optional>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 #include "cli/Nearest.h"
@@ -49,14 +48,6 @@ constexpr bool standsInOrder() {
 }
 static_assert(standsInOrder(), "every flag, in the order of the enumeration");
 
-CLI::Option* declare(CLI::App& app, const FlagRow& row) {
-  const std::string names =
-      fmt::format("{}{}{}", row.letter, row.letter.empty() ? "" : ",", row.name);
-  if (row.argument.empty()) return app.add_flag(names)->disable_flag_override();
-  // One value each time that it is given. Without this a flag takes the words behind it too.
-  return app.add_option(names)->expected(1)->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
-}
-
 [[noreturn]] void refuseFlag(std::string_view typed) {
   const std::string_view name = typed.substr(0, typed.find('='));
   using Names = std::vector<std::string_view>;
@@ -67,34 +58,17 @@ CLI::Option* declare(CLI::App& app, const FlagRow& row) {
   throw UsageError("unknown-flag", fmt::format("no flag {}{}", visible(name), didYouMean(choices)));
 }
 
-// A flag has a value too few or too many.
-[[noreturn]] void refuseValue(const CLI::ParseError& error) {
-  // Of what the parser says only the name at its start is of use to a user: "--json" or "json".
-  const std::string_view message = error.what();
-  const std::string_view name = message.substr(0, message.find_first_of(": "));
-  const auto row = std::find_if(rows.begin(), rows.end(), [&](const FlagRow& candidate) {
-    return candidate.name == name || candidate.name.substr(2) == name;
-  });
-  if (row == rows.end()) throw UsageError("bad-arguments", "these arguments mean nothing");
-  throw UsageError("bad-value", row->argument.empty() ? fmt::format("{} takes no value", row->name)
-                                                      : fmt::format("{} needs {} behind it",
-                                                                    row->name, row->argument));
+const FlagRow* rowNamed(std::string_view name) {
+  const auto row = std::find_if(rows.begin(), rows.end(),
+                                [&](const FlagRow& candidate) { return candidate.name == name; });
+  return row == rows.end() ? nullptr : &*row;
 }
 
-// The words among what the parser had no flag for.
-std::vector<std::string> wordsOf(const std::vector<std::string>& rest) {
-  std::vector<std::string> words;
-  bool isFlagPossible = true;
-  for (const std::string& word : rest) {
-    if (isFlagPossible && word == "--") {
-      isFlagPossible = false;
-    } else if (isFlagPossible && word.size() > 1 && word.starts_with('-')) {
-      refuseFlag(word);
-    } else {
-      words.push_back(word);
-    }
-  }
-  return words;
+const FlagRow* rowOfLetter(char letter) {
+  const auto row = std::find_if(rows.begin(), rows.end(), [&](const FlagRow& candidate) {
+    return !candidate.letter.empty() && candidate.letter.back() == letter;
+  });
+  return row == rows.end() ? nullptr : &*row;
 }
 
 }  // namespace
@@ -105,26 +79,60 @@ const FlagRow& rowOf(Flag flag) noexcept { return rows[static_cast<std::size_t>(
 
 Arguments Arguments::parse(std::span<const char* const> argv) {
   Arguments arguments;
-  CLI::App app;
-  app.set_help_flag();  // its own help knows nothing of verbs
-  // Words are not declared: the parser would take "[a,b]" apart. They come with the unknown flags.
-  app.allow_extras();
-  std::vector<CLI::Option*> options;
-  for (const FlagRow& row : rows) options.push_back(declare(app, row));
-  try {
-    // Wants them last to first, and without the program's name.
-    std::vector<std::string> reversed(argv.rbegin(), argv.rend());
-    if (!reversed.empty()) reversed.pop_back();
-    app.parse(std::move(reversed));
-  } catch (const CLI::ParseError& error) {
-    refuseValue(error);
-  }
-  arguments.words_ = wordsOf(app.remaining());
-  for (std::size_t i = 0; i < rows.size(); ++i) {
-    arguments.given_[i] = options[i]->count() != 0;
-    if (!rows[i].argument.empty()) arguments.values_[i] = options[i]->results();
+  bool isFlagPossible = true;
+  for (auto rest = argv.subspan(std::min<std::size_t>(argv.size(), 1)); !rest.empty();) {
+    const std::string_view word = rest.front();
+    rest = rest.subspan(1);
+    if (!isFlagPossible || word.size() < 2 || word.front() != '-') {
+      arguments.words_.emplace_back(word);
+    } else if (word == "--") {
+      isFlagPossible = false;
+    } else if (word.starts_with("--")) {
+      arguments.takeName(word, rest);
+    } else {
+      arguments.takeLetters(word, rest);
+    }
   }
   return arguments;
+}
+
+void Arguments::takeName(std::string_view word, std::span<const char* const>& rest) {
+  const std::size_t end = std::min(word.find('='), word.size());
+  const FlagRow* const row = rowNamed(word.substr(0, end));
+  if (row == nullptr) refuseFlag(word);
+  std::optional<std::string_view> value;
+  if (end < word.size()) value = word.substr(end + 1);
+  if (value && row->argument.empty())
+    throw UsageError("bad-value", fmt::format("{} takes no value", row->name));
+  give(*row, value, rest);
+}
+
+void Arguments::takeLetters(std::string_view word, std::span<const char* const>& rest) {
+  for (std::size_t i = 1; i < word.size(); ++i) {
+    const FlagRow* const row = rowOfLetter(word[i]);
+    // Those before it were good, and would only be in the way of finding the one that was meant.
+    if (row == nullptr) refuseFlag(fmt::format("-{}", word.substr(i)));
+    const std::string_view behind = word.substr(i + 1);
+    if (row->argument.empty()) {
+      give(*row, std::nullopt, rest);
+    } else {
+      return give(*row, behind.empty() ? std::nullopt : std::optional(behind), rest);
+    }
+  }
+}
+
+void Arguments::give(const FlagRow& row, std::optional<std::string_view> value,
+                     std::span<const char* const>& rest) {
+  const auto index = static_cast<std::size_t>(row.flag);
+  given_[index] = true;
+  if (row.argument.empty()) return;
+  if (!value) {
+    if (rest.empty())
+      throw UsageError("bad-value", fmt::format("{} needs {} behind it", row.name, row.argument));
+    value = rest.front();
+    rest = rest.subspan(1);
+  }
+  values_[index].emplace_back(*value);
 }
 
 std::size_t Arguments::choice(Flag flag, std::span<const std::string_view> choices) const {

@@ -5,6 +5,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <stdexcept>
 #include <string>
@@ -93,6 +94,14 @@ class Arguments {
   std::size_t choice(Flag flag, std::span<const std::string_view> choices) const;
 
  private:
+  // "--eye=left", "--eye left"; `rest` are the arguments behind it, of which it may take the first.
+  void takeName(std::string_view word, std::span<const char* const>& rest);
+  // "-q", "-vn", "-oOUT", "-o OUT".
+  void takeLetters(std::string_view word, std::span<const char* const>& rest);
+  // Notes the flag, with the value that stood at it or else the argument behind it, if it takes one.
+  void give(const FlagRow& row, std::optional<std::string_view> value,
+            std::span<const char* const>& rest);
+
   static constexpr std::size_t flagCount = static_cast<std::size_t>(Flag::color) + 1;
 
   std::vector<std::string> words_;

@@ -12,9 +12,18 @@ void JsonResults::begin() {
 }
 
 void JsonResults::end() {
-  if (!isLines_) return;
-  output_.write("\n");
-  output_.flush();  // whoever reads line by line need not wait for the next one
+  if (isLines_) output_.write("\n");
+  flush();
+}
+
+void JsonResults::add(std::string_view written) {
+  begin();
+  output_.write(written);
+  if (isLines_) output_.write("\n");
+}
+
+void JsonResults::flush() {
+  if (isLines_) output_.flush();  // whoever reads line by line need not wait for the next one
 }
 
 void JsonResults::finish() {

@@ -28,6 +28,10 @@ class JsonResults {
     end();
   }
 
+  // One that is written already. On lines it goes out with flush().
+  void add(std::string_view written);
+  void flush();
+
   // To be called behind the last one.
   void finish();
 

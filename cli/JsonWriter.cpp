@@ -9,6 +9,9 @@
 namespace oxmv::cli {
 namespace {
 
+// Nearly every character is one of these, and stands for itself.
+bool isPlain(char c) { return c >= ' ' && c < 0x7F && c != '"' && c != '\\'; }
+
 // A character's escape; empty for one that stands for itself.
 std::string escapeOf(const Character& character) {
   if (character.isByte) return fmt::format("\\\\x{:02X}", static_cast<unsigned>(character.code));
@@ -73,6 +76,10 @@ void JsonWriter::quoted(std::string_view text) {
   sink_.write("\"");
   std::size_t plain = 0;  // bytes at the start that stand for themselves
   while (plain < text.size()) {
+    if (isPlain(text[plain])) {
+      ++plain;
+      continue;
+    }
     const Character next = firstCharacter(text.substr(plain));
     const std::string escape = escapeOf(next);
     if (escape.empty()) {

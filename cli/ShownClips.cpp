@@ -113,13 +113,15 @@ class AsJson final : public Presentation {
 class AsCsv final : public Presentation {
  public:
   explicit AsCsv(Call& call)
-      : csv_(call.output, {"file"}, columnsFrom(call.arguments.value(Flag::columns))) {}
+      : output_(call.output),
+        csv_(output_, {"file"}, columnsFrom(call.arguments.value(Flag::columns))) {}
   void add(const ClipName& name, const Clip& clip) override {
-    csv_.add({name.word}, valuesOf(csv_.columns(), clip.tags));
+    csv_.add(output_, {name.word}, valuesOf(csv_.columns(), clip.tags));
   }
 
  private:
-  CsvWriter csv_;
+  Sink& output_;
+  const CsvWriter csv_;
 };
 
 void showEach(Call& call, const std::vector<ClipName>& names, Presentation& presentation) {

@@ -80,8 +80,9 @@ std::string textInLine(std::string_view text, Extent extent) {
   const std::size_t kept = text.find_last_not_of('\0') + 1;  // npos + 1 is 0: nothing but NULs
   const std::size_t nuls = text.size() - kept;
   const std::string_view bare = text.substr(0, kept);
-  const std::string_view shown =
-      extent == Extent::whole ? bare : firstCharacters(bare, shownCharacters);
+  // No text has more characters than bytes.
+  const bool isShort = extent == Extent::whole || bare.size() <= shownCharacters;
+  const std::string_view shown = isShort ? bare : firstCharacters(bare, shownCharacters);
   const bool needsQuotes = bare.empty() || bare.front() == ' ' || bare.back() == ' ';
   std::string line = visible(shown);
   if (needsQuotes) line = fmt::format("\"{}\"", line);

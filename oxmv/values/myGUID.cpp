@@ -18,10 +18,9 @@ void setByte(Word& word, std::size_t index, std::uint8_t byte) {
   word = static_cast<Word>((word & ~(Word{0xFF} << shift)) | (Word{byte} << shift));
 }
 
-void appendHex(std::string& text, unsigned long number, int digits) {
-  for (int shift = (digits - 1) * 4; shift >= 0; shift -= 4) {
-    text += "0123456789ABCDEF"[(number >> shift) & 0xF];
-  }
+// Writes the digits of a number up to `end`, the last of them in front of it.
+void putHex(char* end, unsigned long number, int digits) {
+  for (; digits > 0; --digits, number >>= 4) *--end = "0123456789ABCDEF"[number & 0xF];
 }
 
 // The value of a hexadecimal digit; 16 for any other character.
@@ -50,16 +49,14 @@ void copyOverImage(myGUID& guid, std::span<const std::uint8_t> image) noexcept {
 }
 
 std::string guidText(const myGUID& guid) {
-  std::string text;
-  appendHex(text, guid.Data1, 8);
-  text += '-';
-  appendHex(text, guid.Data2, 4);
-  text += '-';
-  appendHex(text, guid.Data3, 4);
-  for (std::size_t i = 0; i < guid.Data4.size(); ++i) {
-    if (i == 0 || i == 2) text += '-';
-    appendHex(text, guid.Data4[i], 2);
-  }
+  std::string text(36, '-');
+  char* const start = text.data();
+  putHex(start + 8, guid.Data1, 8);
+  putHex(start + 13, guid.Data2, 4);
+  putHex(start + 18, guid.Data3, 4);
+  const auto& last = guid.Data4;
+  putHex(start + 23, static_cast<unsigned long>(last[0] << 8 | last[1]), 4);
+  for (std::size_t i = 2; i < last.size(); ++i) putHex(start + 22 + 2 * i, last[i], 2);
   return text;
 }
 

@@ -1,9 +1,14 @@
+#include <algorithm>
+#include <cstddef>
+#include <cstdint>
 #include <filesystem>
 #include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
 
+#include "cli/Findings.h"
+#include "oxmv/metadata/TagStreamDecoder.h"
 #include "tests/cli/CommandRunner.h"
 #include "tests/cli/TemporaryDatabase.h"
 #include "tests/support/StreamBuilder.h"
@@ -161,6 +166,67 @@ TEST(DbCheck, NamesADatabaseThatIsNotThere) {
   EXPECT_EQ(outcome.exitCode, 3);
   EXPECT_EQ(outcome.err, "oxmv: error: " + database.folder().string() +
                              ": No such file or directory; oxmv db init makes it (missing)\n");
+}
+
+// Streams that are plainly whole are not decoded. Those that only seem to be must be.
+TEST(DbCheck, FindsTheDamageThatDecodingFinds) {
+  const Bytes nested = StreamBuilder().record("REEL", 'c', "A001").bytes();
+  const Bytes points =
+      StreamBuilder()
+          .record("CTLp", 0,
+                  std::string("\1\0\0\0\2\0\0\0", 8) + std::string(nested.begin(), nested.end()))
+          .bytes();
+  const std::string inner(points.begin(), points.end());
+  const Bytes whole = StreamBuilder()
+                          .record("ABCD", 'c', "unknown")
+                          .record("COL1", 0, inner)
+                          .record("TAKE", 'L', 7)
+                          .record("REEL", 'c', "A001_C003")
+                          .bytes();
+  const TemporaryDatabase database;
+  std::vector<std::string> damaged;
+  int number = 0;
+  const auto put = [&](const Bytes& stream) {
+    const std::string name = nthGuid(number++) + ".colr";
+    database.put(name, stream);
+    FindingCollector collector(stream);
+    if (stream.size() >= 12)
+      decodeStream(stream, static_cast<std::int32_t>(stream.size()), nullptr, &collector);
+    const auto findings = collector.finish();
+    const bool isDamaged = std::any_of(findings.begin(), findings.end(), [](const Finding& f) {
+      return f.oddity == Oddity::stopped || f.oddity == Oddity::cutPayload ||
+             (f.oddity == Oddity::tooShort && f.count > 0);
+    });
+    if (isDamaged) damaged.push_back(database.path(name));
+  };
+  for (std::size_t size = 0; size <= whole.size(); ++size)
+    put(Bytes(whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(size)));
+  for (std::size_t at = 0; at < whole.size(); ++at) {
+    for (const int byte : {0x00, 0x04, 0xBF, 0xFF}) {
+      Bytes changed = whole;
+      changed[at] = static_cast<std::uint8_t>(byte);
+      put(changed);
+    }
+  }
+  std::vector<std::string> found;
+  for (const std::string& line : findingsIn(database))
+    found.push_back(line.substr(0, line.find(": ")));
+  EXPECT_EQ(found, damaged);
+  EXPECT_GT(damaged.size(), whole.size());
+}
+
+TEST(DbCheck, LooksAtEveryOneOfThousandsOfFiles) {
+  const TemporaryDatabase database;
+  Lines expected;
+  for (int i = 0; i < 3000; ++i) {
+    const std::string name = nthGuid(i) + ".colr";
+    const bool isDamaged = i % 700 == 3;
+    database.put(name, isDamaged ? Bytes{1} : Bytes());
+    if (isDamaged)
+      expected.push_back(database.path(
+          name + ": byte 0: 1 bytes are too few: a clip with tags has 12 or more (damaged)"));
+  }
+  EXPECT_EQ(findingsIn(database), expected);
 }
 
 }  // namespace

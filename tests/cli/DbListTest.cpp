@@ -1,3 +1,4 @@
+#include <cstddef>
 #include <filesystem>
 #include <set>
 #include <string>
@@ -218,6 +219,52 @@ TEST(DbListOfNothing, NamesADatabaseThatIsNoFolder) {
   EXPECT_EQ(outcome.exitCode, 3);
   EXPECT_EQ(outcome.err,
             "oxmv: error: " + database.folder().string() + ": Not a directory (missing)\n");
+}
+
+// Two threads read them, in batches that grow.
+TEST(DbListOfThousands, KeepsTheirOrderInEveryForm) {
+  const TemporaryDatabase database;
+  std::vector<std::string> guids;
+  for (int i = 0; i < 3000; ++i) {
+    guids.push_back(nthGuid(i));
+    database.put(guids.back() + ".colr", i % 1000 == 999 ? Bytes(4, 1) : reel(guids.back()));
+  }
+  for (const std::string form : {"--no-progress", "--csv", "--ndjson"}) {
+    const Outcome outcome = database.run({"db", "list", "--columns", "REEL", form});
+    EXPECT_EQ(outcome.exitCode, 0);
+    auto lines = linesOf(outcome.out);
+    if (form != "--ndjson") lines.erase(lines.begin());
+    ASSERT_EQ(lines.size(), guids.size());
+    for (std::size_t i = 0; i < guids.size(); ++i) {
+      const std::size_t times = i % 1000 == 999 ? 1 : 2;
+      std::size_t found = 0;
+      const auto start = form == "--ndjson" ? lines[i].find("\"tags\"") : 0;
+      for (auto at = lines[i].find(guids[i]); at != std::string::npos;
+           at = lines[i].find(guids[i], at + 1))
+        found += at >= start || form != "--ndjson";
+      EXPECT_EQ(found, form == "--ndjson" ? times - 1 : times) << lines[i];
+    }
+  }
+  EXPECT_EQ(linesOf(database.run({"db", "list", "--json"}).out).size(), guids.size() + 2);
+}
+
+TEST(DbListOfThousands, NamesTheFilesThatCannotBeReadInTheirOrder) {
+  const TemporaryDatabase database;
+  std::vector<std::string> unread;
+  for (int i = 0; i < 3000; ++i) {
+    const std::string name = nthGuid(i) + ".colr";
+    if (i % 500 != 7) {
+      database.put(name, Bytes());
+    } else {
+      std::filesystem::create_symlink("nowhere", database.folder() / name);
+      unread.push_back("oxmv: error: " + database.path(name) +
+                       ": No such file or directory (missing)");
+    }
+  }
+  const Outcome outcome = database.run({"db", "list"});
+  EXPECT_EQ(outcome.exitCode, 3);
+  EXPECT_EQ(linesOf(outcome.err), unread);
+  EXPECT_EQ(linesOf(outcome.out).size(), 3001u);
 }
 
 }  // namespace

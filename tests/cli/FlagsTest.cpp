@@ -47,6 +47,56 @@ TEST(Flags, MayShareADash) {
   EXPECT_TRUE(arguments.has(Flag::null));
 }
 
+TEST(Flags, OfALetterTakeTheRestAsTheirValue) {
+  const Arguments arguments = parse({"-qoa=b", "x"});
+  EXPECT_TRUE(arguments.has(Flag::quiet));
+  EXPECT_EQ(arguments.value(Flag::output), "a=b");
+  EXPECT_EQ(arguments.words(), Words{"x"});
+}
+
+TEST(Flags, TakeAValueThatLooksLikeAFlag) {
+  EXPECT_EQ(parse({"-o", "--json"}).value(Flag::output), "--json");
+  EXPECT_FALSE(parse({"-o", "--json"}).has(Flag::json));
+  EXPECT_EQ(parse({"--output", "--", "-q"}).value(Flag::output), "--");
+  EXPECT_EQ(parse({"--output=-q"}).value(Flag::output), "-q");
+}
+
+TEST(Flags, TakeAnEmptyValue) {
+  for (const auto& words : {std::vector<const char*>{"--output=", "x"}, {"--output", "", "x"}}) {
+    EXPECT_TRUE(parse(words).has(Flag::output));
+    EXPECT_EQ(parse(words).value(Flag::output), "");
+    EXPECT_EQ(parse(words).words(), Words{"x"});
+  }
+}
+
+std::string refusal(const std::vector<const char*>& words) {
+  try {
+    parse(words);
+  } catch (const UsageError& error) {
+    return error.what();
+  }
+  return {};
+}
+
+TEST(Flags, RefuseAMissingValue) {
+  for (const char* word : {"-o", "-qo", "--output"})
+    EXPECT_EQ(refusal({"show", word}), "--output needs OUT behind it");
+}
+
+TEST(Flags, RefuseAValueThatTheyDoNotTake) {
+  for (const char* word : {"--json=x", "--json=true", "--json="})
+    EXPECT_EQ(refusal({"show", word}), "--json takes no value");
+}
+
+TEST(Flags, RefuseWhatIsNoneOfThem) {
+  EXPECT_EQ(refusal({"--jso"}), "no flag --jso; did you mean --json?");
+  EXPECT_EQ(refusal({"--jso=x"}), "no flag --jso; did you mean --json?");
+  EXPECT_EQ(refusal({"-qx"}), "no flag -x");
+  EXPECT_EQ(refusal({"-xq"}), "no flag -xq");
+  EXPECT_EQ(refusal({"-q=true"}), "no flag -");
+  EXPECT_EQ(refusal({"--=x"}), "no flag --");
+}
+
 TEST(Flags, EndAtTwoDashes) {
   EXPECT_EQ(parse({"show", "--", "--json", "--", "-q"}).words(),
             (Words{"show", "--json", "--", "-q"}));

@@ -12,6 +12,12 @@
 
 namespace oxmv::cli::test {
 
+// The GUIDs of clips by the dozen, in order; `number` has at most eight digits.
+inline std::string nthGuid(int number) {
+  const std::string digits = std::to_string(number);
+  return std::string(8 - digits.size(), '0') + digits + "-0000-0000-0000-000000000000";
+}
+
 class TemporaryDatabase {
  public:
   TemporaryDatabase() { std::filesystem::create_directory(folder()); }
