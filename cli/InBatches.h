@@ -6,9 +6,12 @@
 #include <chrono>
 #include <cstddef>
 #include <future>
-#include <thread>
 
 namespace oxmv::cli {
+
+// Whether the system lets this process run on more than one processor; on one a second thread is only in
+// the way.
+bool haveTwoProcessors() noexcept;
 
 // Calls make(first, last) for one part of the things 0 ... count - 1 after the other, on this thread
 // and on another, and take() with what it answers: on this thread, and in the order of the things. What
@@ -20,7 +23,7 @@ template <class Make, class Take>
 void inBatches(std::size_t count, Make make, Take take) {
   using Clock = std::chrono::steady_clock;
   constexpr std::chrono::milliseconds least{5}, most{20};
-  const bool isAlone = std::thread::hardware_concurrency() == 1;
+  const bool isAlone = !haveTwoProcessors();
   std::size_t size = 16;
   for (std::size_t first = 0; first < count;) {
     const auto start = Clock::now();
