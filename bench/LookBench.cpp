@@ -230,7 +230,7 @@ Line measureCrc(const std::vector<float>& values) {
           .ours = all[0].cpu,
           .bestPeer = all[1].cpu,
           .peerName = all[1].name,
-          .aim = 1};
+          .aim = 0.98};  // no slower, as far as two times of the same can be told apart
 }
 
 }  // namespace
