@@ -46,7 +46,7 @@ class LookFolder {
   void import() const;
 
  private:
-  MemoryFolder folder_;
+  OwnFolder folder_{true};
   std::shared_ptr<oxmv::Host> before_;
 };
 

@@ -4,14 +4,11 @@
 //
 //   allocations   of one decode and one encode, of every library, counted
 //   kept          the memory that a decoded dictionary holds, in multiples of its stream
-//   growth        processor time and peak memory of each of our paths over ten doublings of the
-//                 input: the exponent that fits, 1 for twice as much for twice the input
+//   growth        processor time and peak memory of each of our paths; see Growth.h
 
 #include <algorithm>
 #include <array>
-#include <cmath>
 #include <cstdio>
-#include <ctime>
 #include <exception>
 #include <stdexcept>
 #include <string>
@@ -20,6 +17,7 @@
 #include "Codec.h"
 #include "CodecOurs.h"
 #include "Corpus.h"
+#include "Growth.h"
 #include "Heap.h"
 #include "Operation.h"
 #include "oxmv/metadata/MetadataDictionary.h"
@@ -31,7 +29,6 @@ namespace {
 using namespace bench;
 
 constexpr double keptAim = 1.8;
-constexpr double exponentAim = 1.1;
 
 const char* verdict(bool met) { return met ? "met" : "NOT"; }
 
@@ -110,81 +107,28 @@ void metadataString(const Bytes& /*stream*/, const oxmv::Dictionary& clip) {
 constexpr Path paths[] = {
     {"decode", decode}, {"encode", encode}, {"edit", edit}, {"metadataString", metadataString}};
 
-struct Measure {
-  double seconds = 0;  // the least of its rounds
-  double peak = 0;     // bytes beyond those that were there
-};
-
-constexpr std::size_t doublings = 10;
-constexpr std::size_t sizes = doublings + 1;
-using Measures = std::array<Measure, sizes>;
-
 struct Inputs {
-  std::array<Bytes, sizes> streams;
-  std::array<oxmv::Dictionary, sizes> clips;
+  std::array<Bytes, growthSizes> streams;
+  std::array<oxmv::Dictionary, growthSizes> clips;
 
   Inputs() {
-    for (std::size_t i = 0; i < sizes; ++i) {
+    for (std::size_t i = 0; i < growthSizes; ++i) {
       streams[i] = CodecOurs::encode(growingClip(std::size_t{1} << i));
       clips[i] = CodecOurs::decode(streams[i]);
     }
   }
 };
 
-double processorSeconds() {
-  return static_cast<double>(std::clock()) / static_cast<double>(CLOCKS_PER_SEC);
-}
-
-// Each round takes all sizes in turn, the small ones so often that all take about the same time.
-Measures measure(const Path& path, const Inputs& inputs) {
-  constexpr int rounds = 15;
-  Measures measures;
-  for (int round = 0; round < rounds; ++round) {
-    for (std::size_t i = 0; i < sizes; ++i) {
-      const std::size_t times = std::size_t{1} << (doublings - i);
-      const std::size_t before = heapUse().bytes;
-      startPeak();
-      const double start = processorSeconds();
-      for (std::size_t n = 0; n < times; ++n) path.run(inputs.streams[i], inputs.clips[i]);
-      const double seconds = (processorSeconds() - start) / static_cast<double>(times);
-      Measure& least = measures[i];
-      least.seconds = round == 0 ? seconds : std::min(least.seconds, seconds);
-      least.peak = static_cast<double>(heapUse().peak - before);
-    }
-  }
-  return measures;
-}
-
-// The slope of the straight line that fits best where both axes are logarithmic.
-double exponentOf(const Measures& measures, const Inputs& inputs, double Measure::*quantity) {
-  double x = 0, y = 0, xx = 0, xy = 0;
-  for (std::size_t i = 0; i < sizes; ++i) {
-    const double a = std::log(static_cast<double>(inputs.streams[i].size()));
-    const double b = std::log(measures[i].*quantity);
-    x += a, y += b, xx += a * a, xy += a * b;
-  }
-  constexpr double n = sizes;
-  return (n * xy - x * y) / (n * xx - x * x);
-}
-
-void printGrowth() {
+void printGrowthOfCodec() {
   const Inputs inputs;
-  std::printf("\ngrowth from %zu to %zu bytes\n", inputs.streams.front().size(),
-              inputs.streams.back().size());
-  std::printf("  %-15s %10s %10s %8s %18s\n", "", "ns a byte", "the same", "exponent",
-              "peak, its exponent");
+  std::vector<GrowingPath> growing;
   for (const Path& path : paths) {
-    const Measures measures = measure(path, inputs);
-    const auto nanosecondsPerByte = [&](std::size_t i) {
-      return measures[i].seconds * 1e9 / static_cast<double>(inputs.streams[i].size());
-    };
-    const double time = exponentOf(measures, inputs, &Measure::seconds);
-    const double peak = exponentOf(measures, inputs, &Measure::peak);
-    std::printf("  %-15s %10.2f %10.2f %8.2f %9.2fx %7.2f   aim %.1f, %s\n", path.name,
-                nanosecondsPerByte(0), nanosecondsPerByte(sizes - 1), time,
-                measures.back().peak / static_cast<double>(inputs.streams.back().size()), peak,
-                exponentAim, verdict(std::max(time, peak) <= exponentAim));
+    growing.push_back(
+        {path.name, {}, [&](std::size_t i) { path.run(inputs.streams[i], inputs.clips[i]); }});
+    for (std::size_t i = 0; i < growthSizes; ++i)
+      growing.back().bytes[i] = static_cast<double>(inputs.streams[i].size());
   }
+  printGrowth(growing);
 }
 
 }  // namespace
@@ -194,7 +138,10 @@ int main() {
     addAll();
     printAllocations();
     printKept();
-    printGrowth();
+    printGrowthOfCodec();
+#ifdef OXMV_BENCH_FILES
+    printGrowthOfFiles();
+#endif
     return 0;
   } catch (const std::exception& error) {
     std::fprintf(stderr, "oxmv_bench_memory: %s\n", error.what());

@@ -129,7 +129,7 @@ void runCommand(std::vector<const char*> arguments) {
 }
 
 std::vector<Line> measureScan() {
-  const MemoryFolder folder;
+  const OwnFolder folder(false);
   writeClips(folder.path(), clipCount);
   const auto command = [&](std::vector<const char*> arguments) {
     arguments.insert(arguments.end(), {"--db", folder.path().c_str()});

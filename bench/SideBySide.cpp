@@ -44,13 +44,14 @@ void measureSideBySide(std::span<Measured> all, int rounds) {
   }
 }
 
-MemoryFolder::MemoryFolder() {
+OwnFolder::OwnFolder(bool inMemory) {
   const fs::path memory = "/dev/shm";
-  path_ = (fs::is_directory(memory) ? memory : fs::temp_directory_path()) / "oxmv-bench-XXXXXX";
+  path_ = (inMemory && fs::is_directory(memory) ? memory : fs::temp_directory_path()) /
+          "oxmv-bench-XXXXXX";
   if (::mkdtemp(path_.data()) == nullptr) throw std::runtime_error("no folder for measuring");
 }
 
-MemoryFolder::~MemoryFolder() {
+OwnFolder::~OwnFolder() {
   std::error_code ignored;
   fs::remove_all(path_, ignored);
 }

@@ -21,14 +21,14 @@ struct Measured {
 // Measures them all, after a round that nobody counts.
 void measureSideBySide(std::span<Measured> all, int rounds);
 
-// A folder of its own, gone with it: in memory where the system has such a place, because a disk's
-// fsync takes longer than all that is measured.
-class MemoryFolder {
+// A folder of its own, gone with it: where temporary files are, or in memory where the system has such
+// a place, because a disk's fsync takes longer than all that is measured.
+class OwnFolder {
  public:
-  MemoryFolder();
-  MemoryFolder(const MemoryFolder&) = delete;
-  MemoryFolder& operator=(const MemoryFolder&) = delete;
-  ~MemoryFolder();
+  explicit OwnFolder(bool inMemory);
+  OwnFolder(const OwnFolder&) = delete;
+  OwnFolder& operator=(const OwnFolder&) = delete;
+  ~OwnFolder();
 
   const std::string& path() const { return path_; }
 

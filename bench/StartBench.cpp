@@ -1,12 +1,14 @@
 // What starting the command costs, against a program that does nothing and, where they are
 // installed, commands of the same trade.
 //
-//   oxmv_bench_start OXMV EMPTY       the command and the empty program
+//   oxmv_bench_start OXMV EMPTY [REPORT]      the command and the empty program
 //
 // Each is asked for its version, in turn, many times. Printed are medians: processor time of the
-// process, user and system, and its largest resident memory.
+// process, user and system, and its largest resident memory. The comparison is also added to REPORT.
 
+#include <cstddef>
 #include <cstdio>
+#include <exception>
 #include <string>
 #include <vector>
 
@@ -60,11 +62,34 @@ bool run(Program& program) {
   return true;
 }
 
+// The line has the fastest of the same trade, and the empty program as its floor.
+bool addToReport(const char* report, const std::vector<Program>& programs) {
+  const auto nanoseconds = [](const Program& program) {
+    return bench::medianOf(program.milliseconds) * 1e6;
+  };
+  bench::Line line{
+      .name = "start", .ours = nanoseconds(programs[0]), .floor = nanoseconds(programs[1])};
+  for (std::size_t i = 2; i < programs.size(); ++i) {
+    const double time = nanoseconds(programs[i]);
+    if (line.bestPeer > 0 && time >= line.bestPeer) continue;
+    line.bestPeer = time;
+    line.peerName = programs[i].name;
+  }
+  if (line.peerName == "exiv2") line.aim = 1 / aim;
+  try {
+    bench::addJson(report, {&line, 1});
+    return true;
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "oxmv_bench_start: %s\n", error.what());
+    return false;
+  }
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
-  if (argc != 3) {
-    std::fprintf(stderr, "usage: oxmv_bench_start OXMV EMPTY\n");
+  if (argc != 3 && argc != 4) {
+    std::fprintf(stderr, "usage: oxmv_bench_start OXMV EMPTY [REPORT]\n");
     return 2;
   }
   std::vector<Program> programs = {{"oxmv", {argv[1], "version"}},
@@ -99,5 +124,5 @@ int main(int argc, char** argv) {
       std::printf(", aim %.1f, %s", aim, own / time <= aim ? "met" : "NOT");
     std::printf("\n");
   }
-  return 0;
+  return argc == 3 || addToReport(argv[3], programs) ? 0 : 1;
 }

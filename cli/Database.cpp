@@ -58,7 +58,7 @@ std::optional<Database> Database::open(Call& call) {
 }
 
 std::string Database::pathOf(std::string_view name) const {
-  return fmt::format("{}/{}", path_, name);
+  return std::string(path_).append(1, '/').append(name);
 }
 
 std::vector<std::span<const DatabaseFile>> Database::clips() const {

@@ -19,7 +19,7 @@ constexpr std::size_t shownCharacters = 256;
 constexpr std::size_t shownBytes = 16;
 
 std::string numberInLine(const Value& value) {
-  if (value.kind() == Value::Kind::integer) return fmt::format("{}", value.int64Value());
+  if (value.kind() == Value::Kind::integer) return std::to_string(value.int64Value());
   const double number = value.doubleValue();
   if (std::isnan(number)) return "nan";
   if (std::isinf(number)) return number < 0 ? "-inf" : "inf";

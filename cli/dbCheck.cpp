@@ -205,9 +205,8 @@ struct Batch {
 void checkFiles(Call& call, const Database& database, Report& report) {
   const auto clips = database.clips();
   Progress progress(call, database.files().size(), "files");
-  const auto make = [&](std::size_t first, std::size_t last) {
+  const auto make = [&](Bytes& buffer, std::size_t first, std::size_t last) {
     Batch batch;
-    Bytes buffer;
     for (; first < last; ++first) {
       for (const DatabaseFile& file : clips[first]) {
         auto faults = faultsOf(database, file, clips[first], buffer);
@@ -217,7 +216,7 @@ void checkFiles(Call& call, const Database& database, Report& report) {
     }
     return batch;
   };
-  inBatches(clips.size(), make, [&](const Batch& batch) {
+  inBatches(clips.size(), std::array<Bytes, 2>(), make, [&](const Batch& batch) {
     for (std::size_t i = 0; i < batch.files; ++i) progress.advance();
     for (const auto& [file, faults] : batch.faulty)
       report.add(database.pathOf(file->name.text()), &file->name, faults);

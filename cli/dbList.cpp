@@ -102,7 +102,9 @@ class Table final : public Listing {
   }
 
   void write(Sink& to, std::span<const DatabaseFile> files, const Picked& picked) const override {
-    std::string line = guidText(files.front().name.guid);
+    std::string line;
+    line.reserve(ordinaryLine);
+    line += guidText(files.front().name.guid);
     addCell(line, eyesOf(files), eyesWidth_);
     if (const auto* values = std::get_if<std::span<const Value>>(&picked)) {
       for (std::size_t i = 0; i < columns_.size(); ++i) {
@@ -120,6 +122,8 @@ class Table final : public Listing {
   void put(std::string_view item) override { output_.write(item); }
 
  private:
+  static constexpr std::size_t ordinaryLine = 160;
+
   static std::size_t widthOf(const Column& column) {
     const Read rule = column.row->read;
     return rule == Read::uint8 || rule == Read::uint16 ? 5 : 12;
@@ -207,9 +211,8 @@ struct Batch {
 void list(Call& call, const Database& database, const std::vector<Column>& columns,
           std::span<const std::span<const DatabaseFile>> items, Listing& listing) {
   Progress progress(call, database.files().size(), "files");
-  const auto make = [&](std::size_t first, std::size_t last) {
+  const auto make = [&](ColumnReader& reader, std::size_t first, std::size_t last) {
     Batch batch;
-    ColumnReader reader(database, columns);
     for (const auto& files : items.subspan(first, last - first)) {
       const Picked picked = reader.read(files.front());
       listing.write(batch.written, files, picked);
@@ -233,7 +236,8 @@ void list(Call& call, const Database& database, const std::vector<Column>& colum
     }
     listing.pause();
   };
-  inBatches(items.size(), make, take);
+  const ColumnReader reader(database, columns);
+  inBatches(items.size(), std::array{reader, reader}, make, take);
 }
 
 // One line a clip: what its combined file holds, or else that of its first eye.

@@ -53,28 +53,33 @@ bool interpret(const TagRow& row, std::span<const std::uint8_t> payload, Value& 
   return false;  // Not reached: every case is above.
 }
 
+// One of 64 bits for a tag. Most tags that nobody asked for have a bit of their own.
+std::uint64_t bitOf(std::uint32_t tag) { return std::uint64_t{1} << (tag * 0x9E3779B1u >> 26); }
+
 // Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or whose
 // length wraps, and for values of other kinds.
 bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
           std::span<Value> values) {
+  std::uint64_t bits = 0;
+  for (const Tag tag : tags) bits |= bitOf(static_cast<std::uint32_t>(tag));
   std::size_t at = 0;
   while (at < stream.size()) {
     const std::size_t left = stream.size() - at;
     if (left < recordHeaderSize) return false;
     const std::uint8_t* header = stream.data() + at;
+    const std::uint32_t tag = loadLe32(header);
+    const std::uint32_t size = loadLe32(header + 4) & maxRecordSize;
     const bool isMarker = at > 0 && header[0] == markerBytes[0] && header[1] == markerBytes[1];
-    const std::uint32_t size = loadLe24(header + 4);
-    const std::uint32_t length = recordLength(size);
-    if (isMarker || length < size || left - recordHeaderSize < size) return false;
-    const auto wanted = std::find(tags.begin(), tags.end(), Tag{loadLe32(header)});
+    if (isMarker || size > longestRecord || left - recordHeaderSize < size) return false;
+    const auto wanted =
+        (bits & bitOf(tag)) != 0 ? std::find(tags.begin(), tags.end(), Tag{tag}) : tags.end();
     if (wanted != tags.end()) {
       const TagRow* row = findTagRow(*wanted);
       const auto index = static_cast<std::size_t>(wanted - tags.begin());
       const auto payload = stream.subspan(at + recordHeaderSize, size);
       if (row == nullptr || !interpret(*row, payload, values[index])) return false;
     }
-    if (left <= length) return true;
-    at += length;
+    at += recordLength(size);
   }
   return true;
 }

@@ -37,8 +37,11 @@ std::optional<ClipFileName> ClipFileName::from(std::string_view name) noexcept {
 }
 
 std::string ClipFileName::text() const {
-  if (!eye) return guidText(guid).append(combined);
-  return guidText(guid).append(eyePrefix).append(std::to_string(*eye + 1));
+  std::string name;
+  name.reserve(guidSize + eyePrefix.size() + 10);
+  name += guidText(guid);
+  if (!eye) return name += combined;
+  return (name += eyePrefix) += std::to_string(*eye + 1);
 }
 
 }  // namespace oxmv
