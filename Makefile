@@ -13,8 +13,9 @@ sources = git ls-files -z --cached --others --exclude-standard -- '*.h' '*.cpp'
 
 MAKEFLAGS += --no-print-directory
 .NOTPARALLEL:
-.PHONY: help build demo test bench instructions install format format-check tidy fuzz \
-        clean packages-build packages-test packages-coverage packages-bench packages-ci
+.PHONY: help build demo test bench instructions install format format-check tidy fuzz locales valgrind \
+        coverage mutants clean packages-build packages-test packages-coverage packages-bench \
+        packages-ci
 
 help: ## list these targets
 	@sed -nE 's/^([a-z-]+):[^#]*## (.*)/  make \1\t\2/p' Makefile | expand -t 20
@@ -69,6 +70,16 @@ fuzz: packages-ci ## look for inputs that break something, FUZZ_SECONDS (60) a t
 	cmake --preset fuzz
 	cmake --build --preset fuzz
 	packaging/fuzz build/fuzz/fuzz $(FUZZ_SECONDS)
+
+locales: packages-ci ## run the tests in locales with another decimal point, another small i
+	cmake --preset dev
+	cmake --build --preset dev
+	tests/in-locales build
+
+valgrind: packages-bench ## run the tests of the library under valgrind, which takes an hour
+	cmake --preset dev
+	cmake --build --preset dev --target oxmv_tests
+	tests/under-valgrind build/dev/tests/oxmv_tests
 
 clean: ## remove everything that was built
 	rm -rf build

@@ -134,7 +134,11 @@ class Builder final : public nlohmann::json_sax<nlohmann::json> {
     if (number > std::numeric_limits<std::int64_t>::max()) return failInteger(startOfNumber());
     return add(Value(static_cast<std::int64_t>(number)), startOfNumber());
   }
-  bool number_float(double /*approximation*/, const std::string& digits) override {
+  bool number_float(double /*approximation*/, const std::string& text) override {
+    // The parser has put the decimal point of the process's locale in place of the one in the text.
+    std::string digits = text;
+    const std::size_t point = digits.find_first_not_of("0123456789+-eE");
+    if (point != digits.npos) digits[point] = '.';
     return addFloat(digits, startOfNumber());
   }
   bool string(std::string& text) override {

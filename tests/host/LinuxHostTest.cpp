@@ -270,8 +270,9 @@ TEST(LinuxHostStrings, AreTheBuiltInOnesForKeysThatAreNone) {
 
 TEST(LinuxHostStrings, ComeFromTheCatalogueOfTheTextDomain) {
   // In the plain C locale gettext looks into no catalogue.
+  const std::string before = std::setlocale(LC_ALL, nullptr);
   const char* const locale = std::setlocale(LC_ALL, "C.UTF-8");
-  std::setlocale(LC_ALL, "C");
+  std::setlocale(LC_ALL, before.c_str());
   if (locale == nullptr) GTEST_SKIP() << "there is no locale C.UTF-8";
 
   const test::TempDir dir;

@@ -68,7 +68,9 @@ std::size_t failEachAllocation(Work work, Check check, std::ptrdiff_t mayBeLost 
       failures += wasFelt;
     }
   }
+#ifndef OXMV_ALLOCATES_BY_SANITIZER
   EXPECT_GT(failures, 0u);
+#endif
   return failures;
 }
 

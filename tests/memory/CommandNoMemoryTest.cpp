@@ -127,7 +127,7 @@ TEST_F(CommandNoMemory, EditLeavesTheOldClipOrTheNew) {
 
 // An exception that nobody expects: thrown where memory is asked for, in place of the usual one.
 TEST_F(CommandNoMemory, UnexpectedExceptionIsABugWithoutItsName) {
-  for (const std::size_t nth : {1, 20, 100}) {
+  for (const std::size_t nth : {1u, 20u, 100u}) {
     const Ending ending = run({"show", example("typical-clip.colr")}, [&] {
       std::set_new_handler([] { throw 1; });
       armShortage(nth, Shortage::lasting);

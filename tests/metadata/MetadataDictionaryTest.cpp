@@ -1,12 +1,16 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <thread>
 #include <type_traits>
+#include <vector>
 
 #include <gtest/gtest.h>
 #include <sys/mman.h>
 
+#include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/MetadataDictionary.h"
+#include "oxmv/metadata/TagStreamEditor.h"
 #include "oxmv/values/Array.h"
 #include "tests/support/Decoding.h"
 #include "tests/support/Memory.h"
@@ -332,6 +336,34 @@ TEST(MetadataDictionary, WithoutMemoryThereIsNoStream) {
     stream = clip.metaDataData();
   }
   EXPECT_EQ(stream, std::nullopt);
+}
+
+// Threads.
+
+TEST(MetadataDictionary, ThreadsAtOnceUseTheirOwn) {
+  const Bytes stream = StreamBuilder()
+                           .record("REEL", 'c', "A001")
+                           .record("WBAL", 'f', Bytes(16, 0))
+                           .record("TAKE", 'B', Bytes{3, 0, 0, 0})
+                           .bytes();
+  std::vector<Dictionary> results(4);
+  std::vector<std::thread> threads;
+  for (std::size_t number = 0; number < results.size(); ++number) {
+    threads.emplace_back([&stream, &result = results[number]] {
+      for (int i = 0; i < 50; ++i) {
+        auto clip = MetadataDictionary().initWithData(stream);
+        clip.addObject("B002", "REEL");
+        TagStreamEditor editor(clip.metaDataData().value());
+        const auto error = editor.set("COL1/REEL", "nested");
+        clip.initWithData(editor.stream());
+        result = clip.metadata();
+        if (error || !findLosses(result, Layout::readable).empty()) result = {};
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  EXPECT_EQ(results[0]["REEL"], Value("B002"));
+  for (const Dictionary& result : results) EXPECT_EQ(result, results[0]);
 }
 
 }  // namespace

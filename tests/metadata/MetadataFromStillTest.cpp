@@ -1,5 +1,12 @@
 #include <fstream>
+#include <memory>
+#include <optional>
 #include <stdexcept>
+#include <string>
+#include <string_view>
+#include <system_error>
+#include <thread>
+#include <vector>
 
 #include <gtest/gtest.h>
 
@@ -84,6 +91,37 @@ TEST(MetadataFromStill, WhatItAnswersIsReadyForAClip) {
   Dictionary stored = *tags;
   stored.remove({"FOV", 4});  // streams have no such tag
   EXPECT_EQ(MetadataDictionary().initWithData(*stream).metadata(), stored);
+}
+
+// Threads.
+
+// The fake one remembers what it is told, and so is for one thread.
+class DeafHost final : public Host {
+ public:
+  Value copyPreference(std::string_view, std::string_view) override { return {}; }
+  void setPreference(std::string_view, const Value&, std::string_view) override {}
+  bool synchronizePreferences(std::string_view, std::error_code*) override { return true; }
+  std::string localizedString(std::string_view, std::string_view builtIn) override {
+    return std::string(builtIn);
+  }
+  void alert(std::string_view) override {}
+  void log(std::string_view) override {}
+};
+
+TEST(MetadataFromStill, ThreadsAtOnceGetTheSame) {
+  const auto before = installHost(std::make_shared<DeafHost>());
+  std::vector<std::optional<Dictionary>> results(4);
+  std::vector<std::thread> threads;
+  for (auto& result : results) {
+    threads.emplace_back([&result] {
+      for (int i = 0; i < 10; ++i) result = MetadataDictionary::metadataFromJPEGFile(example, "A1");
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  installHost(before);
+  ASSERT_TRUE(results[0]);
+  EXPECT_EQ((*results[0])["CMDL"], Value("QX Gamma"));
+  for (const auto& result : results) EXPECT_EQ(result, results[0]);
 }
 
 }  // namespace

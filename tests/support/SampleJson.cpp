@@ -48,7 +48,11 @@ class Builder final : public nlohmann::json_sax<nlohmann::json> {
   bool number_unsigned(number_unsigned_t number) override {
     return put(Value(static_cast<std::int64_t>(number)));
   }
-  bool number_float(number_float_t, const string_t& digits) override {
+  bool number_float(number_float_t, const string_t& text) override {
+    // With the decimal point of the process's locale in it.
+    std::string digits = text;
+    const auto point = digits.find_first_not_of("0123456789+-eE");
+    if (point != digits.npos) digits[point] = '.';
     return put(Value(numberFrom<float>(digits)));
   }
   bool string(string_t& text) override {
