@@ -61,6 +61,11 @@ constexpr std::uint8_t floats = 'f';
 constexpr std::uint8_t guid = 'G';
 }  // namespace recordType
 
+// A record's second word; `size` has 24 bits.
+constexpr std::uint32_t headerWord(std::uint8_t type, std::uint32_t size) {
+  return std::uint32_t{type} << 24 | size;
+}
+
 // How many streams may stand within one another, the outermost counted. Streams nest by payload,
 // and clips nest once or twice: deeper than this only hostile input goes. Decoder, encoder and tag
 // JSON keep to the same number.

@@ -6,6 +6,7 @@
 
 #include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Block.h"
+#include "oxmv/values/Bytes32.h"
 
 namespace oxmv {
 
@@ -328,6 +329,55 @@ constexpr detail::PlainRule plainRuleOf(const TagRow& row) {
   return {row.tag, row.read};
 }
 
+// Empty texts are not plain, as they are not written; nor are texts that end past a look.
+constexpr detail::PlainWrite plainWriteOf(const TagRow& row) {
+  constexpr std::uint32_t all = 0xFFFFFFFF;
+  detail::PlainWrite rule{.tag = row.tag};
+  rule.header = headerWord(recordTypeOf(row.write), 0);
+  if (row.when != When::inOrder) return rule;
+  const auto number = [&](Form form, std::uint32_t mask) {
+    rule.form = form;
+    rule.room = 4;
+    rule.least = 0;
+    rule.numberMask = mask;
+  };
+  switch (row.write) {
+    case Write::float32: number(Form::float32, all); break;
+    case Write::integerH:
+    case Write::integerL:
+    case Write::integerR: number(Form::integer, all); break;
+    case Write::word16: number(Form::integer, 0xFFFF); break;
+    case Write::byte8: number(Form::integer, 0xFF); break;
+    case Write::text:
+      rule.form = Form::textToNul;
+      rule.room = 1;
+      rule.least = 1;
+      rule.range = detail::Bytes32::size - 2;
+      rule.placeMask = rule.textMask = all;
+      break;
+    case Write::floatPair:
+    case Write::floats:
+      rule.form = Form::floats;
+      rule.least = static_cast<std::uint8_t>(row.count * 4);
+      rule.placeMask = all;
+      break;
+    case Write::none:
+    case Write::timecode:
+    case Write::fourCC:
+    case Write::guid:
+    case Write::data:
+    case Write::integerArray:
+    case Write::integerEach:
+    case Write::textEach:
+    case Write::nestedEach:
+    case Write::nested:
+    case Write::controlPoint:
+    case Write::tagGroup:
+    case Write::regGroup: break;
+  }
+  return rule;
+}
+
 }  // namespace
 
 namespace detail {
@@ -350,6 +400,12 @@ static_assert(static_cast<std::size_t>(std::count(rowOfSlot.begin(), rowOfSlot.e
 constexpr std::array<PlainRule, noRow + 1> plainRules = [] {
   std::array<PlainRule, noRow + 1> table{};
   std::transform(rows.begin(), rows.end(), table.begin(), plainRuleOf);
+  return table;
+}();
+
+constexpr std::array<PlainWrite, noRow + 1> plainWrites = [] {
+  std::array<PlainWrite, noRow + 1> table{};
+  std::transform(rows.begin(), rows.end(), table.begin(), plainWriteOf);
   return table;
 }();
 

@@ -10,6 +10,7 @@
 #include <string_view>
 
 #include "oxmv/metadata/Tag.h"
+#include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Block.h"
 
 namespace oxmv {
@@ -63,6 +64,35 @@ enum class Write : std::uint8_t {
   regGroup,      // REGN and REGV records
 };
 
+// The type of the records that a rule writes; of a group, of its names.
+constexpr std::uint8_t recordTypeOf(Write rule) {
+  switch (rule) {
+    case Write::timecode:
+    case Write::text:
+    case Write::data:
+    case Write::textEach:
+    case Write::tagGroup:
+    case Write::regGroup: return recordType::text;
+    case Write::float32:
+    case Write::floatPair:
+    case Write::floats: return recordType::floats;
+    case Write::integerH:
+    case Write::integerArray:
+    case Write::integerEach: return recordType::integerH;
+    case Write::integerL: return recordType::integerL;
+    case Write::integerR: return recordType::integerR;
+    case Write::word16:
+    case Write::byte8: return recordType::small;
+    case Write::fourCC: return recordType::fourCC;
+    case Write::guid: return recordType::guid;
+    case Write::none:
+    case Write::nestedEach:
+    case Write::nested:
+    case Write::controlPoint: break;
+  }
+  return recordType::nested;
+}
+
 // What may be stored under the tag by key.
 enum class Accept : std::uint8_t {
   unknown,  // not by key: enters a dictionary by decoding only, or whole dictionary at once
@@ -110,12 +140,28 @@ struct PlainRule {
   std::uint32_t placeMask = 0;   // of a place, all bits of its offset and size
 };
 
+// How a slot becomes a record, as numbers to calculate with: where it is of `form`, the masks make
+// its payload. A text ends at its first NUL. Lengths other than `least` to `least + range` are not
+// plain. The record's size is the length and `room`, padded.
+struct alignas(32) PlainWrite {
+  Tag tag{};
+  Form form = Form::arrayBox;  // which no slot is of
+  std::uint8_t least = 0xFF;
+  std::uint8_t range = 0;
+  std::uint8_t room = 0;
+  std::uint32_t header = 0;      // the second word of the record's, for a size of 0
+  std::uint32_t numberMask = 0;  // what counts of a number; of a place, none
+  std::uint32_t placeMask = 0;   // of a place, all bits of its offset
+  std::uint32_t textMask = 0;    // of a text, all its bytes may end it
+};
+
 // By the tag's slot, which is another one for each tag: the index of its row; noRow = of no tag.
 constexpr std::size_t tagSlotCount = 2048;
 constexpr std::uint8_t noRow = 0xFF;
 extern const std::array<std::uint8_t, tagSlotCount> rowOfSlot;
 // By the index of a row; at noRow, the rule of no tag.
 extern const std::array<PlainRule, noRow + 1> plainRules;
+extern const std::array<PlainWrite, noRow + 1> plainWrites;
 
 // One multiplication spreads the tags over the slots so that no two meet (found by trying; checked
 // where the table is).

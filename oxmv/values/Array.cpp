@@ -31,6 +31,11 @@ Array::Array(std::vector<Value> elements) {
   value_ = Value(Slot::scalar(Form::arrayBox, 0), new detail::ArrayBox(std::move(elements)));
 }
 
+Array Array::ofFloats(std::span<const std::uint8_t> words) {
+  const Slot slot = Slot::place(Form::floats, static_cast<std::uint32_t>(words.size()), 0);
+  return Array(Value(slot, detail::Block::make(words, {}, {}, {}).detach()));
+}
+
 std::size_t Array::sizeOfValues() const noexcept {
   const Slot slot = value_.slot_;
   if (value_.owner() == nullptr) return 0;

@@ -2,9 +2,13 @@
 
 #pragma once
 
+#include <array>
+#include <bit>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <iterator>
+#include <span>
 #include <utility>
 #include <vector>
 
@@ -24,6 +28,12 @@ class Array {
   // list of one.
   template <class... T>
   static Array of(const T&... elements) {
+    if constexpr (sizeof...(T) > 0 && (std::same_as<T, float> && ...)) {
+      std::array<std::uint8_t, sizeof...(T) * wordSize> words;
+      std::uint8_t* at = words.data();
+      (storeLe32(std::exchange(at, at + wordSize), std::bit_cast<std::uint32_t>(elements)), ...);
+      return ofFloats(words);
+    }
     std::vector<Value> values;
     values.reserve(sizeof...(elements));
     (values.emplace_back(elements), ...);
@@ -49,6 +59,8 @@ class Array {
  private:
   friend class Value;
   explicit Array(Value value) noexcept : value_(std::move(value)) {}
+  // Held in one piece, as in a decoded stream.
+  static Array ofFloats(std::span<const std::uint8_t> words);
 
   static constexpr std::size_t wordSize = 4;  // of a float or integer in a block
   bool isWords() const noexcept {

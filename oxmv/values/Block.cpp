@@ -21,10 +21,11 @@ const T* put(std::byte*& place, std::span<const T> items) {
   return start;
 }
 
-// Where a key stands; `count` when it is nowhere.
+}  // namespace
+
 #if defined(__SSE2__)
 
-// Eight at a time. Behind the last key of a block as many more bytes can be read.
+// Eight at a time.
 std::size_t placeOf(Key wanted, const Key* keys, std::size_t count) {
   static_assert(Block::readAhead >= 8 * sizeof(Key));
   const __m128i eachWanted = _mm_set1_epi32(std::bit_cast<std::int32_t>(wanted));
@@ -47,8 +48,6 @@ std::size_t placeOf(Key wanted, const Key* keys, std::size_t count) {
 
 #endif
 
-}  // namespace
-
 Ref<const Block> Block::make(std::span<const std::uint8_t> head, std::string_view tail,
                              std::span<const Slot> slots, std::span<const Key> keys) {
   static_assert(alignof(Block) >= alignof(Slot) && alignof(Slot) >= alignof(Key));
@@ -57,6 +56,7 @@ Ref<const Block> Block::make(std::span<const std::uint8_t> head, std::string_vie
   auto* block = new (trailing) Block;
   auto* place = reinterpret_cast<std::byte*>(block + 1);
   block->slots_ = put(place, slots);
+  block->slotCount_ = slots.size();
   block->keys_ = put(place, keys);
   block->bytes_ = put(place, head);
   put(place, std::span(reinterpret_cast<const std::uint8_t*>(tail.data()), tail.size()));

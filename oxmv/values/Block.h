@@ -149,7 +149,13 @@ class Block final : public Shared {
   const Key* keys(std::uint32_t headerIndex) const { return keys_ + header(headerIndex).firstKey; }
   // The key stands among those of this block.
   std::string_view keyText(const Key& key) const {
-    return key.isTag() ? key.tagText() : text(slots_[key.slot()]);
+    return key.isTag() ? key.tagText() : text(nameOf(key));
+  }
+  // Of a key that is no tag.
+  Slot nameOf(const Key& key) const { return slots_[key.slot()]; }
+  // Whether a dictionary holds all others: it is the last one made.
+  bool isOutermost(std::uint32_t headerIndex) const {
+    return headerIndex + 1 + header(headerIndex).count == slotCount_;
   }
   // The slot of the value under `key` in the dictionary of that header; null when it has no such
   // key.
@@ -167,7 +173,12 @@ class Block final : public Shared {
   const std::uint8_t* bytes_ = nullptr;
   std::size_t byteCount_ = 0;
   const Slot* slots_ = nullptr;
+  std::size_t slotCount_ = 0;
   const Key* keys_ = nullptr;
 };
+
+// Where a key that is a tag stands; `count` when it is nowhere. Reads up to Block::readAhead bytes
+// behind the last key.
+std::size_t placeOf(Key wanted, const Key* keys, std::size_t count);
 
 }  // namespace oxmv::detail

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <utility>
 
+#include "oxmv/values/HeldEntries.h"
 #include "oxmv/values/Value.h"
 
 namespace oxmv {
@@ -54,6 +55,10 @@ class Dictionary {
   Iterator begin() const;
   Iterator end() const noexcept;
 
+  // Internal: the entries of a dictionary that is a value; none of any other value.
+  static detail::HeldEntries entriesOf(const Value& value) noexcept;
+  detail::HeldEntries entries() const noexcept { return entriesOf(value_); }
+
   // Equal are dictionaries with equal values under the same keys, whatever their order.
   friend bool operator==(const Dictionary& a, const Dictionary& b);
 
@@ -64,7 +69,9 @@ class Dictionary {
   bool isTable() const noexcept { return value_.slot_.form() == detail::Form::dictionaryBox; }
   const detail::Table* table() const noexcept;
   bool ownsTable() const noexcept;
-  detail::Table& ownTable();
+  detail::Table& ownTable() noexcept;
+  Value renewTable(std::size_t more);
+  void compact() noexcept;
   // Places in the order, some of which are vacant in a dictionary that had keys removed.
   std::size_t places() const noexcept {
     if (isTable()) return placesOfTable();

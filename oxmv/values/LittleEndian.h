@@ -2,6 +2,9 @@
 
 #pragma once
 
+#include <algorithm>
+#include <array>
+#include <bit>
 #include <cstdint>
 
 namespace oxmv {
@@ -23,6 +26,12 @@ constexpr std::uint64_t loadLe64(const std::uint8_t* b) {
 }
 
 constexpr void storeLe32(std::uint8_t* b, std::uint32_t word) {
+  // What the shifts give here; compilers take two words after one another apart.
+  if constexpr (std::endian::native == std::endian::little) {
+    const auto bytes = std::bit_cast<std::array<std::uint8_t, sizeof word>>(word);
+    std::copy(bytes.begin(), bytes.end(), b);
+    return;
+  }
   b[0] = static_cast<std::uint8_t>(word);
   b[1] = static_cast<std::uint8_t>(word >> 8);
   b[2] = static_cast<std::uint8_t>(word >> 16);

@@ -148,6 +148,11 @@ class Value {
     lent.borrow(block, slot);
     return Value(std::move(lent));
   }
+  // Internal: a list of floats as words, if it is held in one piece; nothing else.
+  std::span<const std::uint8_t> floatWords() const noexcept {
+    if (slot_.form() != detail::Form::floats) return {};
+    return block().bytes(slot_);
+  }
   // Internal: becomes the value of a slot of `block`, or that of `other`, without a share in the
   // payload, whose owner has to stay. Whatever is copied or moved from it has a share.
   void borrow(const detail::Block& block, detail::Slot slot) {

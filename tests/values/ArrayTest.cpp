@@ -1,3 +1,4 @@
+#include <bit>
 #include <iterator>
 #include <optional>
 #include <string>
@@ -81,6 +82,15 @@ TEST(Array, WhatIsKeptFromALoopOutlivesTheArray) {
       decoded({'B', 'A', 'D', 'P', 8, 0, 0, 'H', 5, 0, 0, 0, 0xFF, 0xFF, 0xFF, 0xFF})["BADP"]
           .array(),
       {5, -1});
+}
+
+TEST(Array, OfFloatsEqualsOneOfItsValues) {
+  const float signalling = std::bit_cast<float>(0x7F800001u);
+  const Array array = Array::of(1.5f, -0.0f, std::bit_cast<float>(0x7FC12345u));
+  EXPECT_EQ(array, Array({Value(1.5f), Value(-0.0f), Value(std::bit_cast<float>(0x7FC12345u))}));
+  EXPECT_EQ(array[0].kind(), Value::Kind::float32);
+  EXPECT_EQ(Array::of(signalling)[0].floatBits(), Value(signalling).floatBits());
+  EXPECT_EQ(Array::of(1.5f, 2)[1].kind(), Value::Kind::integer);
 }
 
 TEST(Array, OfAnArrayHoldsThatArray) {

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <functional>
 #include <iterator>
+#include <new>
 #include <set>
 #include <string>
 #include <string_view>
@@ -16,6 +17,7 @@
 #include "oxmv/values/Dictionary.h"
 #include "tests/support/CollidingNames.h"
 #include "tests/support/Decoding.h"
+#include "tests/support/Memory.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
 
@@ -466,6 +468,78 @@ TEST(Dictionary, KeepsOrderAndValuesThroughManyRemovals) {
   for (int i = 0; i < 300; ++i) remove(numbered(i));
   check();
   EXPECT_TRUE(dictionary.empty());
+}
+
+// A dictionary over a block, of tags and of names, through changes of every sort.
+TEST(Dictionary, ChangedDecodedOneIsAsIfItHadBeenSet) {
+  Bytes stream = ofEveryPayload;
+  for (const char first : {'a', 'b', 'c'}) {
+    for (const Bytes& record : {Bytes{'T', 'A', 'G', 'N', 8, 0, 0, 'c', 'a', ' ', 'n', 'a', 'm',
+                                      'e', ' ', static_cast<std::uint8_t>(first)},
+                                Bytes{'T', 'A', 'G', 'V', 4, 0, 0, 'L', 1, 0, 0, 0}})
+      stream.insert(stream.end(), record.begin(), record.end());
+  }
+  for (const Dictionary& start : {decoded(stream), decoded(stream)["TAG "].dictionary()}) {
+    Dictionary changed = start;
+    Dictionary made;
+    for (const auto& [key, value] : start) made.set(key, value);
+    std::uint32_t random = 1;
+    for (int i = 0; i < 2000; ++i) {
+      random = random * 1664525 + 1013904223;
+      const std::string key = random >> 31 ? "K" + std::to_string(random % 97)
+                                           : "K" + std::to_string(100 + random % 97);
+      const Dictionary before = changed;
+      if ((random >> 20) % 3 == 0) {
+        EXPECT_EQ(changed.remove(key), made.remove(key));
+        EXPECT_FALSE(changed.contains(key));
+      } else {
+        const Value value = i % 2 == 0 ? Value(i) : Value("text " + std::to_string(i));
+        changed.set(key, value);
+        made.set(key, value);
+        EXPECT_EQ(changed[key], value);
+      }
+      ASSERT_EQ(keys(changed), keys(made));
+      ASSERT_EQ(changed, made);
+      if (i % 7 == 0) changed = before;
+      if (i % 7 == 0) made = before;
+    }
+  }
+}
+
+TEST(Dictionary, ShortageOfMemoryChangesNothing) {
+  for (const std::size_t count : {0u, 7u, 8u, 9u, 256u, 300u}) {
+    Dictionary start = decoded(ofEveryPayload);
+    for (std::size_t i = 0; i < count; ++i) start.set("name " + std::to_string(i), "a text");
+    bool wasEnough = false;
+    for (std::size_t granted = 0; !wasEnough; ++granted) {
+      ASSERT_LT(granted, 2000u);
+      const Dictionary before = start;
+      Dictionary changed = start;
+      bool wasFelt = false;
+      try {
+        const MemoryShortage shortage(granted);
+        changed.set("one more key", "its text");
+        changed.set("REEL", 5);
+        changed.remove("LOOK");
+        wasEnough = true;
+      } catch (const std::bad_alloc&) {
+        wasFelt = true;
+      }
+      EXPECT_NE(wasFelt, wasEnough);
+      EXPECT_EQ(start, before);
+      if (!wasEnough && !changed.contains("one more key")) EXPECT_EQ(changed, before);
+    }
+    EXPECT_FALSE(start.contains("one more key"));
+  }
+}
+
+TEST(Dictionary, ChangeOfADecodedOneTakesMemoryOnce) {
+  Dictionary dictionary = decoded(ofEveryPayload);
+  const Value number = 7;
+  const MemoryMeter meter;
+  dictionary.set("TAKE", number);
+  dictionary.set("SHOT", number);
+  EXPECT_EQ(meter.allocations(), 1u);
 }
 
 TEST(Dictionary, CopyOfAnIndexedOneIsIndexedToo) {
