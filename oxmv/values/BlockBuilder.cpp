@@ -2,7 +2,7 @@
 
 #include <new>
 
-#include "oxmv/values/ByteMasks.h"
+#include "oxmv/values/Bytes32.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::detail {
@@ -190,10 +190,10 @@ void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> e
 }
 
 Slot BlockBuilder::asUtf8(Slot text) {
-  constexpr std::size_t width = ByteMasks::width;
-  if (text.size() < width && bytes_.size() - text.body >= width) {  // nearly every name
+  // What nearly every name is: short, and not at the end of the bytes.
+  if (text.size() < Bytes32::size && bytes_.size() - text.body >= Bytes32::size) {
     const std::uint32_t inside = (1u << text.size()) - 1;
-    if ((masksOf(bytes_.data() + text.body).high & inside) == 0) return text;
+    if ((Bytes32::at(bytes_.data() + text.body).notAscii() & inside) == 0) return text;
   }
   const std::string_view raw = textOf(text);
   return isUtf8(raw) ? text : addText(utf8FromLatin1(raw));

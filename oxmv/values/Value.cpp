@@ -5,7 +5,7 @@
 #include <limits>
 
 #include "oxmv/values/Array.h"
-#include "oxmv/values/ByteMasks.h"
+#include "oxmv/values/Bytes32.h"
 #include "oxmv/values/Dictionary.h"
 #include "oxmv/values/Numbers.h"
 #include "oxmv/values/Text.h"
@@ -13,6 +13,7 @@
 namespace oxmv {
 
 using detail::Block;
+using detail::Bytes32;
 using detail::Form;
 using detail::Slot;
 
@@ -30,16 +31,17 @@ struct Cut {
 };
 
 Cut cutAt(const std::uint8_t* text, std::uint32_t size, bool endsAtNul) {
-  constexpr std::uint32_t width = detail::ByteMasks::width;
+  constexpr auto width = static_cast<std::uint32_t>(Bytes32::size);
   static_assert(Block::readAhead >= width);
-  const std::uint32_t ends = endsAtNul ? ~0u : 0u;
+  const std::uint32_t nulsCount = endsAtNul ? ~0u : 0u;
   std::uint32_t high = 0;
   for (std::uint32_t at = 0;; at += width) {
-    const detail::ByteMasks masks = detail::masksOf(text + at);
+    const Bytes32 bytes = Bytes32::at(text + at);
+    const std::uint32_t nuls = bytes.ends() & ~bytes.notAscii() & nulsCount;
     const std::uint32_t left = std::min(size - at, width);
-    const std::uint64_t end = (masks.nul & ends) | std::uint64_t{1} << left;
-    const auto taken = static_cast<std::uint32_t>(std::countr_zero(end));
-    high |= masks.high & static_cast<std::uint32_t>((std::uint64_t{1} << taken) - 1);
+    const auto taken =
+        static_cast<std::uint32_t>(std::countr_zero(nuls | std::uint64_t{1} << left));
+    high |= bytes.notAscii() & static_cast<std::uint32_t>((std::uint64_t{1} << taken) - 1);
     if (taken < width || size - at == width) return {at + taken, high == 0};
   }
 }
