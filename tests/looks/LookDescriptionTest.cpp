@@ -412,26 +412,34 @@ TEST(LookDescription, SamplesAreReadAlikeInBothWays) {
   }
 }
 
-TEST(LookDescription, TextsInUtf16ThatHoldALongRunOfAnOddLengthAreTheSame) {
-  // U+4E30 and many U+3030 are 'N', and then '0' an odd number of times: with one character in the
-  // place of those the rest would be UTF-16 still.
-  const std::size_t count = minLongRun;
-  for (const std::string& mark : {std::string("\xFE\xFF"), std::string()}) {
-    std::string file = mark;
-    const auto add = [&](char32_t c) {
-      file += static_cast<char>(c >> 8);
-      file += static_cast<char>(c & 0xFF);
-    };
-    for (const char c : std::string_view("<?xml version='1.0' encoding='UTF-16'?><look><LUT>"))
-      add(static_cast<unsigned char>(c));
-    add(0x4E30);
-    std::string text = "\u4E30";
-    for (std::size_t i = 0; i < count; ++i) {
-      add(0x3030);
-      text += "\u3030";
+// In UTF-16 characters can look like a long run between '>' and '<'. One of an odd length would leave
+// the document well-formed without it.
+TEST(LookDescription, CharactersOfUtf16ThatLookLikeALongRunAreNone) {
+  for (const bool isBig : {false, true}) {
+    for (const bool hasMark : {false, true}) {
+      std::string file;
+      const auto add = [&](char32_t c) {
+        const char high = static_cast<char>(c >> 8);
+        const char low = static_cast<char>(c & 0xFF);
+        file += isBig ? high : low;
+        file += isBig ? low : high;
+      };
+      const auto addAll = [&](std::string_view ascii) {
+        for (const char c : ascii) add(static_cast<unsigned char>(c));
+      };
+      if (hasMark) add(0xFEFF);
+      addAll("<look><LUT>");
+      add(0x303E);  // its last byte, or the one before, is '>'
+      for (std::size_t i = 0; i < minLongRun; ++i) add(0x3030);
+      if (isBig) add(0x303C);  // ends with '<'
+      addAll("</LUT></look>");
+      ASSERT_EQ(withoutLongRuns(file).runs.size(), 1u);
+      EXPECT_EQ(withoutLongRuns(file).runs[0].text.size() % 2, 1u);
+      std::string text = "\u303E";
+      for (std::size_t i = 0; i < minLongRun; ++i) text += "\u3030";
+      if (isBig) text += "\u303C";
+      EXPECT_EQ(nodesOf(file), "LUT\ntable: " + text + "\n");
     }
-    for (const char c : std::string_view("</LUT></look>")) add(static_cast<unsigned char>(c));
-    EXPECT_EQ(nodesOf(file), "LUT\ntable: " + text + "\n");
   }
 }
 
