@@ -14,7 +14,7 @@ sources = git ls-files -z --cached --others --exclude-standard -- '*.h' '*.cpp'
 MAKEFLAGS += --no-print-directory
 .NOTPARALLEL:
 .PHONY: help build demo test bench instructions install format format-check tidy fuzz locales valgrind \
-        coverage mutants clean packages-build packages-test packages-coverage packages-bench \
+        coverage mutants thorough clean packages-build packages-test packages-coverage packages-bench \
         packages-ci
 
 help: ## list these targets
@@ -80,6 +80,9 @@ valgrind: packages-bench ## run the tests of the library under valgrind, which t
 	cmake --preset dev
 	cmake --build --preset dev --target oxmv_tests
 	tests/under-valgrind build/dev/tests/oxmv_tests
+
+thorough: ## everything that can find a bug, for hours: .ci/run, then what takes too long for it
+	packaging/thorough
 
 clean: ## remove everything that was built
 	rm -rf build
