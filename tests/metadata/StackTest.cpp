@@ -25,7 +25,7 @@ namespace {
 constexpr std::size_t stackSize = 1024 * 1024;
 constexpr std::size_t mayTake = stackSize;
 #else
-constexpr std::size_t stackSize = 128 * 1024;
+constexpr std::size_t stackSize = 256 * 1024;
 #ifdef __OPTIMIZE__
 constexpr std::size_t mayTake = 64 * 1024;  // what we promise hosts
 #else
