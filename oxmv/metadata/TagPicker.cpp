@@ -56,6 +56,12 @@ bool interpret(const TagRow& row, std::span<const std::uint8_t> payload, Value& 
 // One of 64 bits for a tag. Most tags that nobody asked for have a bit of their own.
 std::uint64_t bitOf(std::uint32_t tag) { return std::uint64_t{1} << (tag * 0x9E3779B1u >> 26); }
 
+// The key of a group: its value comes from records of other tags.
+bool isGroup(Tag tag) {
+  const TagRow* row = findTagRow(tag);
+  return row != nullptr && (row->write == Write::tagGroup || row->write == Write::regGroup);
+}
+
 // Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or whose
 // length wraps, and for values of other kinds.
 bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
@@ -89,7 +95,7 @@ bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
 void pickTags(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
               std::vector<Value>& values) {
   values.assign(tags.size(), Value());
-  if (step(stream, tags, values)) {
+  if (std::none_of(tags.begin(), tags.end(), isGroup) && step(stream, tags, values)) {
     // Of a tag that is asked for twice the first one has it.
     for (std::size_t i = 0; i < tags.size(); ++i)
       values[i] = values[static_cast<std::size_t>(std::find(tags.begin(), tags.end(), tags[i]) -

@@ -54,6 +54,19 @@ TEST(TagPicker, GivesOtherKindsToo) {
   EXPECT_FALSE(picked(stream, tags)[0].isNothing());
 }
 
+// No record has the tag that is asked for.
+TEST(TagPicker, GivesAGroupThatIsAskedForAlone) {
+  const Bytes stream = StreamBuilder()
+                           .record("TAGN", 'c', "ISO")
+                           .record("TAGV", 'L', 400)
+                           .record("REGN", 'c', "gain")
+                           .record("REGV", 'L', 3)
+                           .bytes();
+  EXPECT_EQ(picked(stream, {"TAG "_tag}), (std::vector<Value>{Dictionary{{"ISO", 400}}}));
+  EXPECT_EQ(picked(stream, {"REEL"_tag, "REG "_tag}),
+            (std::vector<Value>{Value(), Dictionary{{"gain", 3}}}));
+}
+
 TEST(TagPicker, LastOfSeveralRecordsCounts) {
   const Bytes stream =
       StreamBuilder().record("REEL", 'c', "first").record("REEL", 'c', "second").bytes();
