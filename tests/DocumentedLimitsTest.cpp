@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <fstream>
 #include <map>
-#include <regex>
+#include <sstream>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -23,17 +23,26 @@ namespace {
 
 using Limits = std::map<std::string, std::uint64_t>;
 
-// The rows of the table: "| of what | 256 MiB | `constant` | because |".
+// The rows of the table: "| of what | 256 MiB | `constant` | because |". Others have no number.
 Limits documented() {
   std::ifstream document(OXMV_SOURCE_DIR "/SECURITY.md");
   EXPECT_TRUE(document);
-  const std::regex row(R"(\| [^|]+ \| (\d+)( bytes| KiB| MiB)? \| `(\w+)` \| [^|]+ \|)");
-  const std::map<std::string, int> bits = {{"", 0}, {" bytes", 0}, {" KiB", 10}, {" MiB", 20}};
+  const std::map<std::string, int> bits = {{"", 0}, {"bytes", 0}, {"KiB", 10}, {"MiB", 20}};
   Limits limits;
-  std::smatch parts;
   for (std::string line; std::getline(document, line);) {
-    if (!std::regex_match(line, parts, row)) continue;
-    limits[parts[3]] = std::stoull(parts[1]) << bits.at(parts[2]);
+    std::istringstream cells(line);
+    std::string before, what, limit, constant;
+    std::getline(cells, before, '|');
+    std::getline(cells, what, '|');
+    std::getline(cells, limit, '|');
+    std::getline(cells, constant, '|');
+    std::uint64_t number = 0;
+    std::string unit;
+    std::istringstream words(limit);
+    if (!(words >> number)) continue;
+    words >> unit;
+    const std::size_t start = constant.find('`') + 1;
+    limits[constant.substr(start, constant.rfind('`') - start)] = number << bits.at(unit);
   }
   return limits;
 }

@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
+#include <limits>
 #include <string_view>
 
 #include "oxmv/metadata/TagStreamDecoder.h"
@@ -92,8 +94,11 @@ bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
 
 }  // namespace
 
-void pickTags(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
+void pickTags(std::span<const std::uint8_t> bytes, std::span<const Tag> tags,
               std::vector<Value>& values) {
+  // As much as a decoder looks at.
+  constexpr std::size_t most = std::numeric_limits<std::int32_t>::max();
+  const auto stream = bytes.first(std::min(bytes.size(), most));
   values.assign(tags.size(), Value());
   if (std::none_of(tags.begin(), tags.end(), isGroup) && step(stream, tags, values)) {
     // Of a tag that is asked for twice the first one has it.

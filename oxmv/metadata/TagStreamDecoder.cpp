@@ -158,8 +158,8 @@ class Decoder {
     giveUp(names.reg, stream, level);
   }
 
-  // The same with nobody listening, for as long as each record is whole, at least 12 bytes are
-  // there and no length wraps: what a clip's stream is from beginning to end. Answers how many bytes
+  // The same with nobody listening, for as long as each record is whole, a word is there behind its
+  // header and no length wraps: what a clip's stream is from beginning to end. Answers how many bytes
   // it has taken, all of them or up to a record or marker that the walk has to look at.
   std::int64_t readWholeRecords(Extent stream, std::int64_t length, int level,
                                 PendingNames& names) {
@@ -170,7 +170,7 @@ class Decoder {
             : stream.end;
     fetch(stream.begin, end);
     std::size_t at = stream.begin;
-    while (at + shortestData <= end) {
+    while (at + recordHeaderSize + sizeof(std::uint32_t) <= end) {
       const std::uint8_t* header = bytes_.data() + at;
       const Tag tag{loadLe32(header)};
       const std::uint32_t size = loadLe32(header + 4) & maxRecordSize;
