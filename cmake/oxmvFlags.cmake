@@ -8,6 +8,9 @@ target_compile_options(oxmv_flags INTERFACE
 
 # Files of 2 GiB and more have sizes also where a word has 32 bits.
 target_compile_definitions(oxmv_flags INTERFACE _FILE_OFFSET_BITS=64)
+# Nor do the years end in 2038 there.
+target_compile_definitions(oxmv_flags INTERFACE
+  $<$<EQUAL:${CMAKE_SIZEOF_VOID_P},4>:_TIME_BITS=64>)
 
 # An index out of bounds in a standard container ends a debug build at once.
 target_compile_definitions(oxmv_flags INTERFACE $<$<CONFIG:Debug>:_GLIBCXX_ASSERTIONS>)
