@@ -163,20 +163,20 @@ Bytes otherBytes(const TagRow& row, const std::vector<StreamPart>& parts) {
   return bytes;
 }
 
-std::vector<Bytes> recordsOf(Tag tag, const std::vector<StreamPart>& parts) {
-  std::vector<Bytes> records;
+std::vector<StreamPart> recordsOf(Tag tag, const std::vector<StreamPart>& parts) {
+  std::vector<StreamPart> records;
   for (const StreamPart& part : parts) {
-    if (part.tag == tag) records.push_back(part.bytes);
+    if (part.tag == tag) records.push_back(part);
   }
   return records;
 }
 
 // The nested stream that counts: the last one that is all there and has a byte.
-std::optional<BytesView> nestedIn(const std::vector<Bytes>& records) {
+std::optional<BytesView> nestedIn(const std::vector<StreamPart>& records) {
   for (auto record = records.rbegin(); record != records.rend(); ++record) {
-    const std::size_t size = loadLe32(record->data() + 4) & maxRecordSize;
-    if (size > 0 && size <= record->size() - recordHeaderSize)
-      return BytesView(*record).subspan(recordHeaderSize, size);
+    const std::size_t size = loadLe32(record->bytes.data() + 4) & maxRecordSize;
+    if (size > 0 && size <= record->there - recordHeaderSize)
+      return BytesView(record->bytes).subspan(recordHeaderSize, size);
   }
   return std::nullopt;
 }
@@ -196,7 +196,7 @@ void requireOtherBytes(const Edit& edit, std::string_view path, BytesView before
           ownAfter.size() == own.size() + 1);
   if (own.size() == ownAfter.size()) {
     std::size_t changed = 0;
-    for (std::size_t i = 0; i < own.size(); ++i) changed += own[i] != ownAfter[i];
+    for (std::size_t i = 0; i < own.size(); ++i) changed += own[i].bytes != ownAfter[i].bytes;
     require(changed <= 1);
   }
   const auto nested = nestedIn(own);

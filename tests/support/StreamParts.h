@@ -18,6 +18,7 @@ namespace oxmv::test {
 struct StreamPart {
   std::optional<Tag> tag;
   std::vector<std::uint8_t> bytes;
+  std::size_t there;  // how many of the bytes are in the stream; padding may lack
 };
 
 // All of them together are the stream, and the padding that may lack at its end.
@@ -41,7 +42,7 @@ inline std::vector<StreamPart> partsOf(std::span<const std::uint8_t> stream) {
     void add(std::optional<Tag> tag, std::size_t begin, std::size_t length) {
       const auto part = bytes_.subspan(begin, std::min(length, bytes_.size() - begin));
       end_ = begin + part.size();
-      parts_.push_back({tag, {part.begin(), part.end()}});
+      parts_.push_back({tag, {part.begin(), part.end()}, part.size()});
       parts_.back().bytes.resize((part.size() + 3) / 4 * 4);
     }
 
@@ -59,9 +60,9 @@ inline std::vector<StreamPart> partsOf(std::span<const std::uint8_t> stream) {
 inline std::vector<std::uint8_t> bytesWithout(std::span<const Tag> tags,
                                               const std::vector<StreamPart>& parts) {
   std::vector<std::uint8_t> bytes;
-  for (const auto& [tag, some] : parts) {
-    const bool isNamed = tag && std::find(tags.begin(), tags.end(), *tag) != tags.end();
-    if (!isNamed) bytes.insert(bytes.end(), some.begin(), some.end());
+  for (const StreamPart& part : parts) {
+    const bool isNamed = part.tag && std::find(tags.begin(), tags.end(), *part.tag) != tags.end();
+    if (!isNamed) bytes.insert(bytes.end(), part.bytes.begin(), part.bytes.end());
   }
   return bytes;
 }
