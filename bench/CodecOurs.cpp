@@ -10,20 +10,34 @@ namespace {
 
 using namespace oxmv;
 
+// Of a dictionary or of the entries of a value.
+template <class Content>
+void readContent(const Content& content, Checksum& checksum);
+
+void readElements(const Value& array, Checksum& checksum);
+
 void readValue(const Value& value, Checksum& checksum) {
   switch (value.kind()) {
     case Value::Kind::integer: return checksum.integer(value.int64Value());
     case Value::Kind::float32: return checksum.number(value.floatValue());
     case Value::Kind::float64: return checksum.number(value.doubleValue());
     case Value::Kind::text: return checksum.text(value.text());
-    case Value::Kind::array: {
-      const Array array = value.array();
-      for (const Value& element : array) readValue(element, checksum);
-      return;
-    }
-    case Value::Kind::dictionary: return CodecOurs::read(value.dictionary(), checksum);
+    case Value::Kind::array: return readElements(value, checksum);
+    case Value::Kind::dictionary: return readContent(value.entries(), checksum);
     case Value::Kind::nothing:
     case Value::Kind::data: return;  // in no clip of the corpora
+  }
+}
+
+void readElements(const Value& array, Checksum& checksum) {
+  for (const Value& element : array.elements()) readValue(element, checksum);
+}
+
+template <class Content>
+void readContent(const Content& content, Checksum& checksum) {
+  for (const auto& [key, value] : content) {
+    checksum.key(key);
+    readValue(value, checksum);
   }
 }
 
@@ -36,10 +50,7 @@ Dictionary CodecOurs::decode(const Bytes& stream) {
 }
 
 void CodecOurs::read(const Dictionary& document, Checksum& checksum) {
-  for (const auto& [key, value] : document) {
-    checksum.key(key);
-    readValue(value, checksum);
-  }
+  readContent(document, checksum);
 }
 
 std::size_t CodecOurs::lookUp(const Dictionary& document) {

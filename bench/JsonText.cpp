@@ -36,7 +36,7 @@ void add(std::string& json, const Value& value) {
     case Value::Kind::dictionary: return add(json, value.dictionary());
     case Value::Kind::array: {
       char before = '[';
-      for (const Value& element : value.array()) {
+      for (const Value& element : value.elements()) {
         json += before;
         before = ',';
         add(json, element);

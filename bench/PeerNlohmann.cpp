@@ -23,7 +23,7 @@ json jsonOf(const Value& value) {
     case Value::Kind::dictionary: return jsonOf(value.dictionary());
     case Value::Kind::array: {
       json array = json::array();
-      for (const Value& element : value.array()) array.push_back(jsonOf(element));
+      for (const Value& element : value.elements()) array.push_back(jsonOf(element));
       return array;
     }
     default: return value.int64Value();

@@ -22,7 +22,7 @@ void fill(proto::Value& made, const Value& value) {
     case Value::Kind::text: made.set_text(std::string(value.text())); return;
     case Value::Kind::dictionary: return fill(*made.mutable_clip(), value.dictionary());
     case Value::Kind::array:
-      for (const Value& element : value.array()) {
+      for (const Value& element : value.elements()) {
         switch (element.kind()) {
           case Value::Kind::float32:
             made.mutable_floats()->add_element(element.floatValue());

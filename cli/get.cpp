@@ -69,7 +69,7 @@ void writeAnswer(Call& call, const Answer& answer) {
     write(call, answer.value);
     return;
   }
-  for (const Value& element : answer.value.array()) {
+  for (const Value& element : answer.value.elements()) {
     if (!write(call, element)) return;
   }
 }

@@ -144,7 +144,7 @@ class Assigner {
   static std::optional<EditError> edit(TagStreamEditor& editor, const TagPath& path,
                                        const Value& value, bool isAppended, Fidelity fidelity) {
     if (!isAppended) return editor.set(path.text(), value, fidelity);
-    for (const Value& element : value.array()) {
+    for (const Value& element : value.elements()) {
       if (auto error = editor.append(path.text(), element, fidelity)) return error;
     }
     return std::nullopt;

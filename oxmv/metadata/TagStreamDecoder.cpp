@@ -340,7 +340,7 @@ class Decoder {
 
   // A text without the NULs at its end.
   Slot withoutPadding(Slot text) const {
-    const std::uint8_t* const bytes = bytes_.data() + text.body;
+    const std::uint8_t* const bytes = bytes_.data() + text.body();
     std::uint32_t size = text.size();
     // By the word: names end with 0 to 3 of them, which no processor foresees.
     while (size >= 4) {
@@ -349,7 +349,7 @@ class Decoder {
       if (last != 0) break;
     }
     while (size > 0 && bytes[size - 1] == 0) --size;
-    return Slot::place(Form::text, size, text.body);
+    return Slot::place(Form::text, size, text.body());
   }
 
   // A number takes its own bytes whatever the record's size, also from behind the payload, while
@@ -453,7 +453,7 @@ class Decoder {
   }
   Value valueOf(Slot slot) const {
     const bool isScalar = slot.form() == Form::integer || slot.form() == Form::float32;
-    const auto payload = isScalar ? bytes_.first(0) : bytes_.subspan(slot.body, slot.size());
+    const auto payload = isScalar ? bytes_.first(0) : bytes_.subspan(slot.body(), slot.size());
     const auto block = Block::make(payload, {}, {}, {});
     return Value::in(*block, isScalar ? slot : Slot::place(slot.form(), slot.size(), 0));
   }

@@ -179,7 +179,7 @@ class Encoder {
   // rule: which comes next cannot be foreseen. Answers false for whatever is not plain.
   bool putPlain(const PlainWrite& rule, Slot slot, const std::uint8_t* blockBytes) {
     if (slot.form() != rule.form) return false;
-    const std::uint8_t* const payload = blockBytes + (slot.body & rule.placeMask);
+    const std::uint8_t* const payload = blockBytes + (slot.body() & rule.placeMask);
     const Bytes32 bytes = Bytes32::at(payload);
     const std::uint32_t ends = bytes.ends() & rule.textMask;
     const auto length = static_cast<std::uint32_t>(
@@ -187,7 +187,7 @@ class Encoder {
     const bool isWide = (payload[length] & rule.textMask) >= 0x80;
     if (length - rule.least > rule.range || isWide) return false;
     putBytes(rule.tag, rule.header, paddedToFour(length + rule.room), bytes, length,
-             slot.body & rule.numberMask);
+             slot.body() & rule.numberMask);
     return true;
   }
 
@@ -287,11 +287,11 @@ class Encoder {
         if (value.kind() == Value::Kind::array) putIntegerArray(row.tag, value.array());
         break;
       case Write::integerEach:
-        for (const Value& element : value.array())
+        for (const Value& element : value.elements())
           putNumber(row.tag, recordType::integerH, integer(element));
         break;
       case Write::textEach:
-        for (const Value& element : value.array()) putText(row.tag, element.text(), 0);
+        for (const Value& element : value.elements()) putText(row.tag, element.text(), 0);
         break;
       case Write::nestedEach: putNestedEach(row.tag, value.array(), level); break;
       case Write::tagGroup: putTagGroup(Dictionary::entriesOf(value)); break;
@@ -336,8 +336,8 @@ class Encoder {
 
   // The texts of a list in the block.
   void putTexts(Tag tag, const Block& block, Slot list) {
-    const Slot* const elements = block.items(list.body);
-    const std::uint32_t count = block.header(list.body).count;
+    const Slot* const elements = block.items(list.body());
+    const std::uint32_t count = block.header(list.body()).count;
     Value value;
     for (std::uint32_t i = 0; i < count; ++i) {
       if (putShortText(tag, elements[i], &block, 0)) continue;

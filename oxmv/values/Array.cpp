@@ -40,7 +40,7 @@ std::size_t Array::sizeOfValues() const noexcept {
   const Slot slot = value_.slot_;
   if (value_.owner() == nullptr) return 0;
   if (slot.form() == Form::arrayBox) return boxed(*value_.owner()).size();
-  return value_.block().header(slot.body).count;
+  return value_.block().header(slot.body()).count;
 }
 
 void Array::borrowFromBox(Value& element, std::size_t index) const noexcept {

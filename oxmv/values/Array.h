@@ -57,6 +57,7 @@ class Array {
   friend bool operator==(const Array& a, const Array& b);
 
  private:
+  friend class Elements;
   friend class Value;
   explicit Array(Value value) noexcept : value_(std::move(value)) {}
   // Held in one piece, as in a decoded stream.
@@ -71,7 +72,7 @@ class Array {
     using detail::Form;
     if (value_.slot_.form() == Form::arrayBox) return borrowFromBox(element, index);
     const detail::Block& block = value_.block();
-    if (!isWords()) return element.borrow(block, block.items(value_.slot_.body)[index]);
+    if (!isWords()) return element.borrow(block, block.items(value_.slot_.body())[index]);
     const Form form = value_.slot_.form() == Form::floats ? Form::float32 : Form::integer;
     const std::uint8_t* words = block.bytes(value_.slot_).data();
     element.borrow(block, detail::Slot::scalar(form, loadLe32(words + index * wordSize)));
@@ -106,9 +107,8 @@ class Array::Iterator {
     ++*this;
     return old;
   }
-  bool operator==(const Iterator& other) const {
-    return index_ == other.index_ && array_ == other.array_;
-  }
+  // Of iterators through the same array.
+  bool operator==(const Iterator& other) const { return index_ == other.index_; }
 
  private:
   friend class Array;
@@ -116,6 +116,8 @@ class Array::Iterator {
       : array_(array), index_(index), end_(end) {
     arrive();
   }
+  // The end, which holds nothing.
+  explicit Iterator(std::size_t end) : index_(end), end_(end) {}
   void arrive() {
     if (index_ != end_) array_->borrowTo(element_, index_);
   }
@@ -128,9 +130,32 @@ class Array::Iterator {
 
 inline Array::Iterator Array::begin() const { return {this, 0, size()}; }
 
-inline Array::Iterator Array::end() const noexcept {
-  const std::size_t end = size();
-  return {this, end, end};
-}
+inline Array::Iterator Array::end() const noexcept { return Iterator(size()); }
+
+// The elements of the array that a value is, to go through; see Value::elements().
+class Elements {
+ public:
+  Elements(const Elements&) = delete;
+  Elements& operator=(const Elements&) = delete;
+
+  std::size_t size() const noexcept { return array_.size(); }
+  bool empty() const noexcept { return array_.empty(); }
+  // `index` must be below size().
+  Value operator[](std::size_t index) const { return array_[index]; }
+
+  Array::Iterator begin() const { return array_.begin(); }
+  Array::Iterator end() const noexcept { return array_.end(); }
+
+ private:
+  friend class Value;
+  explicit Elements(const Value& value) noexcept {
+    if (value.kind() == Value::Kind::array) array_.value_.borrow(value);
+  }
+
+  Array array_;  // has no share in its payload
+};
+
+inline Elements Value::elements() const& noexcept { return Elements(*this); }
+inline Array Value::elements() const&& { return array(); }
 
 }  // namespace oxmv

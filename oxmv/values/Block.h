@@ -26,35 +26,43 @@
 
 namespace oxmv::detail {
 
-// How a value is held. From `text` on it needs the owner of its payload.
+// How a value is held. A form has its Value::Kind in its upper bits, so that asking for that takes no
+// branch and no table. From `text` on it needs the owner of its payload.
+constexpr int kindShift = 2;
 enum class Form : std::uint8_t {
   nothing,
-  integer,
-  float32,
-  float64,
-  text,              // place: UTF-8 (checked before it is handed out)
-  textToNul,         // place: as `text`, but ends at its first NUL; in slots only
-  data,              // place
-  floats,            // place: little-endian binary32
-  integers,          // place: little-endian 32-bit two's complement
-  list,              // body: index of the header slot
-  dictionary,        // body: index of the header slot
-  wholeText,         // all bytes of the owner, a Block
-  wholeDerivedText,  // the same, of a derived string kind
-  wholeData,         // all bytes of the owner, a Block
-  arrayBox,          // the owner, an ArrayBox
-  dictionaryBox,     // the owner, a Table
+  integer = 1 << kindShift,     // body: two's complement
+  integer64,                    // in Value only: one that needs more bits
+  float32 = 2 << kindShift,     // body: its bits
+  float64 = 3 << kindShift,     // in Value only
+  text = 4 << kindShift,        // place: UTF-8 (checked before it is handed out)
+  textToNul,                    // place: as `text`, but ends at its first NUL; in slots only
+  wholeText,                    // all bytes of the owner, a Block
+  wholeDerivedText,             // the same, of a derived string kind
+  data = 5 << kindShift,        // place
+  wholeData,                    // all bytes of the owner, a Block
+  floats = 6 << kindShift,      // place: little-endian binary32
+  integers,                     // place: little-endian 32-bit two's complement
+  list,                         // body: index of the header slot
+  arrayBox,                     // the owner, an ArrayBox
+  dictionary = 7 << kindShift,  // body: index of the header slot
+  dictionaryBox,                // the owner, a Table
 };
 
 // A value in 8 bytes: a scalar in `body`, or a place: `size` bytes at offset `body` of the block's
 // bytes.
-struct Slot {
-  std::uint32_t formAndSize = 0;
-  std::uint32_t body = 0;
+//
+// They are the halves of one word. As two members they would go through other registers on the way to a
+// Value, and whoever asks for its kind would wait for them.
+class Slot {
+ public:
+  constexpr Slot() = default;
+  constexpr Slot(std::uint32_t formAndSize, std::uint32_t body)
+      : word_(formAndSize | std::uint64_t{body} << 32) {}
 
   // Sizes come from records, whose size field has 24 bits; a name that had to be converted to UTF-8
   // may take twice as many bytes.
-  static constexpr std::uint32_t maxSize = 0x7FFFFFF;
+  static constexpr std::uint32_t maxSize = 0x3FFFFFF;
 
   static constexpr Slot scalar(Form form, std::uint32_t body) {
     return {static_cast<std::uint32_t>(form), body};
@@ -63,20 +71,27 @@ struct Slot {
     return {static_cast<std::uint32_t>(form) | size << sizeShift, offset};
   }
 
-  constexpr Form form() const { return static_cast<Form>(formAndSize & (lentBit - 1)); }
-  constexpr std::uint32_t size() const { return formAndSize >> sizeShift; }
+  constexpr Form form() const { return static_cast<Form>(word_ & (lentBit - 1)); }
+  constexpr std::uint32_t size() const { return formAndSize() >> sizeShift; }
+  constexpr std::uint32_t body() const { return static_cast<std::uint32_t>(word_ >> 32); }
+  constexpr std::uint32_t formAndSize() const { return static_cast<std::uint32_t>(word_); }
 
   // The mark of a Value that has no share in its payload. No slot of a block has it.
-  constexpr bool isLent() const { return (formAndSize & lentBit) != 0; }
-  constexpr Slot lent() const { return {formAndSize | lentBit, body}; }
-  constexpr Slot kept() const { return {formAndSize & ~lentBit, body}; }
+  constexpr bool isLent() const { return (word_ & lentBit) != 0; }
+  constexpr Slot lent() const { return Slot(word_ | lentBit); }
+  constexpr Slot kept() const { return Slot(word_ & ~std::uint64_t{lentBit}); }
 
   constexpr bool operator==(const Slot&) const = default;
 
-  static constexpr int formBits = 4;
+  static constexpr int formBits = 5;
   static constexpr std::uint32_t lentBit = 1u << formBits;
   static constexpr int sizeShift = formBits + 1;
   static_assert(static_cast<int>(Form::dictionaryBox) < 1 << formBits, "every form fits");
+
+ private:
+  constexpr explicit Slot(std::uint64_t word) : word_(word) {}
+
+  std::uint64_t word_ = 0;
 };
 
 // A dictionary's key in 4 bytes: the characters of a key of four ASCII characters, or where the
@@ -123,7 +138,7 @@ struct Header {
 
   constexpr Slot slot() const { return {count | (sorted ? sortedBit : 0u), firstKey}; }
   static constexpr Header of(Slot slot) {
-    return {slot.formAndSize & ~sortedBit, (slot.formAndSize & sortedBit) != 0, slot.body};
+    return {slot.formAndSize() & ~sortedBit, (slot.formAndSize() & sortedBit) != 0, slot.body()};
   }
   static constexpr std::uint32_t sortedBit = 0x80000000u;
 };
@@ -138,10 +153,10 @@ class Block final : public Shared {
 
   std::span<const std::uint8_t> bytes() const { return {bytes_, byteCount_}; }
   std::span<const std::uint8_t> bytes(Slot place) const {
-    return {bytes_ + place.body, place.size()};
+    return {bytes_ + place.body(), place.size()};
   }
   std::string_view text(Slot place) const {
-    return {reinterpret_cast<const char*>(bytes_) + place.body, place.size()};
+    return {reinterpret_cast<const char*>(bytes_) + place.body(), place.size()};
   }
   Header header(std::uint32_t index) const { return Header::of(slots_[index]); }
   const Slot* items(std::uint32_t headerIndex) const { return slots_ + headerIndex + 1; }

@@ -78,11 +78,11 @@ void BlockBuilder::putLists() {
     const std::uint32_t place = element->place;
     Slot& list = open_.slots[place - 1];
     if (list.form() == Form::nothing) {
-      const std::size_t count = list.body;
+      const std::size_t count = list.body();
       list = putHeader(Form::list, 0, false);
       slots_.extend(count);
     }
-    Slot* const header = &slots_[list.body];
+    Slot* const header = &slots_[list.body()];
     std::uint32_t count = Header::of(*header).count;
     for (; element != elements.end() && element->place == place; ++element)
       header[++count] = element->slot;
@@ -191,9 +191,9 @@ void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> e
 
 Slot BlockBuilder::asUtf8(Slot text) {
   // What nearly every name is: short, and not at the end of the bytes.
-  if (text.size() < Bytes32::size && bytes_.size() - text.body >= Bytes32::size) {
+  if (text.size() < Bytes32::size && bytes_.size() - text.body() >= Bytes32::size) {
     const std::uint32_t inside = (1u << text.size()) - 1;
-    if ((Bytes32::at(bytes_.data() + text.body).notAscii() & inside) == 0) return text;
+    if ((Bytes32::at(bytes_.data() + text.body()).notAscii() & inside) == 0) return text;
   }
   const std::string_view raw = textOf(text);
   return isUtf8(raw) ? text : addText(utf8FromLatin1(raw));
@@ -213,9 +213,9 @@ Key BlockBuilder::keyOf(Slot name) {
 }
 
 std::string_view BlockBuilder::textOf(Slot place) const {
-  if (place.body >= bytes_.size())
-    return std::string_view(extra_).substr(place.body - bytes_.size(), place.size());
-  return {reinterpret_cast<const char*>(bytes_.data()) + place.body, place.size()};
+  if (place.body() >= bytes_.size())
+    return std::string_view(extra_).substr(place.body() - bytes_.size(), place.size());
+  return {reinterpret_cast<const char*>(bytes_.data()) + place.body(), place.size()};
 }
 
 Ref<const Block> BlockBuilder::block() {

@@ -115,7 +115,8 @@ class BlockBuilder {
   // One more element of the list that is the key's value.
   void append(Id id, Key key, Slot element) {
     const std::uint32_t place = gatheredAt(id, key);
-    ++open_.slots[place - 1].body;
+    Slot& list = open_.slots[place - 1];
+    list = Slot(list.formAndSize(), list.body() + 1);
     elements_.push({element, place});
   }
   // An entry of the group that is the key's value. `name` is in UTF-8.
@@ -134,7 +135,7 @@ class BlockBuilder {
   Slot addText(std::string_view text);
   Key keyOf(Slot name);
 
-  bool isEmpty(Slot dictionary) { return Header::of(slots_[dictionary.body]).count == 0; }
+  bool isEmpty(Slot dictionary) { return Header::of(slots_[dictionary.body()]).count == 0; }
   Ref<const Block> block();
 
  private:

@@ -32,6 +32,9 @@ class PortableBytes32 {
     // A byte of ASCII reaches the highest bit with 0x7F added, unless it is NUL.
     return bitsOf([](std::uint64_t word) { return ~((word & ~highBits) + ~highBits) | word; });
   }
+  std::uint32_t nuls() const {
+    return bitsOf([](std::uint64_t word) { return ~(((word & ~highBits) + ~highBits) | word); });
+  }
   // Those of 0x80 and above.
   std::uint32_t notAscii() const {
     return bitsOf([](std::uint64_t word) { return word; });
@@ -82,6 +85,10 @@ class Bytes32 {
   std::uint32_t ends() const {
     const __m128i one = _mm_set1_epi8(1);
     return bitsOf(_mm_cmpgt_epi8(one, first_), _mm_cmpgt_epi8(one, second_));
+  }
+  std::uint32_t nuls() const {
+    const __m128i zero = _mm_setzero_si128();
+    return bitsOf(_mm_cmpeq_epi8(first_, zero), _mm_cmpeq_epi8(second_, zero));
   }
   std::uint32_t notAscii() const { return bitsOf(first_, second_); }
 

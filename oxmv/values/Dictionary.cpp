@@ -73,7 +73,7 @@ void Dictionary::compact() noexcept {
 
 detail::HeldEntries Dictionary::entriesOf(const Value& value) noexcept {
   const Form form = value.slot_.form();
-  if (form == Form::dictionary) return detail::HeldEntries::of(value.block(), value.slot_.body);
+  if (form == Form::dictionary) return detail::HeldEntries::of(value.block(), value.slot_.body());
   const bool isTable = form == Form::dictionaryBox && value.owner() != nullptr;
   return isTable ? static_cast<const detail::Table*>(value.owner())->held() : detail::HeldEntries();
 }
@@ -104,7 +104,7 @@ Value Dictionary::operator[](std::string_view key) const {
     return place ? table()->held().value(*place) : Value();
   }
   if (value_.isNothing()) return {};
-  const Slot* slot = value_.block().find(value_.slot_.body, wanted.text());
+  const Slot* slot = value_.block().find(value_.slot_.body(), wanted.text());
   return slot == nullptr ? Value() : Value::in(value_.block(), *slot);
 }
 

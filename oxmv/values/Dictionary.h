@@ -63,6 +63,7 @@ class Dictionary {
   friend bool operator==(const Dictionary& a, const Dictionary& b);
 
  private:
+  friend class Entries;
   friend class Value;
   explicit Dictionary(Value value) noexcept : value_(std::move(value)) {}
 
@@ -75,7 +76,7 @@ class Dictionary {
   // Places in the order, some of which are vacant in a dictionary that had keys removed.
   std::size_t places() const noexcept {
     if (isTable()) return placesOfTable();
-    return value_.isNothing() ? 0 : value_.block().header(value_.slot_.body).count;
+    return value_.isNothing() ? 0 : value_.block().header(value_.slot_.body()).count;
   }
   std::size_t placesOfTable() const noexcept;
 
@@ -113,9 +114,8 @@ class Dictionary::Iterator {
     ++*this;
     return old;
   }
-  bool operator==(const Iterator& other) const {
-    return place_ == other.place_ && dictionary_ == other.dictionary_;
-  }
+  // Of iterators through the same dictionary.
+  bool operator==(const Iterator& other) const { return place_ == other.place_; }
 
  private:
   friend class Dictionary;
@@ -123,13 +123,15 @@ class Dictionary::Iterator {
       : dictionary_(dictionary), place_(place), end_(end) {
     if (place_ == end_) return;
     if (!dictionary->isTable()) {
-      const std::uint32_t header = dictionary->value_.slot_.body;
+      const std::uint32_t header = dictionary->value_.slot_.body();
       block_ = &dictionary->value_.block();
       slots_ = block_->items(header);
       keys_ = block_->keys(header);
     }
     arrive();
   }
+  // The end, which holds nothing.
+  explicit Iterator(std::size_t end) : place_(end), end_(end) {}
   // Borrows the entry of the place; from a vacant one it goes on to the next that is not.
   void arrive() {
     if (place_ == end_) return;
@@ -150,9 +152,30 @@ class Dictionary::Iterator {
 
 inline Dictionary::Iterator Dictionary::begin() const { return {this, 0, places()}; }
 
-inline Dictionary::Iterator Dictionary::end() const noexcept {
-  const std::size_t end = places();
-  return {this, end, end};
-}
+inline Dictionary::Iterator Dictionary::end() const noexcept { return Iterator(places()); }
+
+// The entries of the dictionary that a value is, to go through; see Value::entries().
+class Entries {
+ public:
+  Entries(const Entries&) = delete;
+  Entries& operator=(const Entries&) = delete;
+
+  std::size_t size() const noexcept { return dictionary_.size(); }
+  bool empty() const noexcept { return dictionary_.empty(); }
+
+  Dictionary::Iterator begin() const { return dictionary_.begin(); }
+  Dictionary::Iterator end() const noexcept { return dictionary_.end(); }
+
+ private:
+  friend class Value;
+  explicit Entries(const Value& value) noexcept {
+    if (value.kind() == Value::Kind::dictionary) dictionary_.value_.borrow(value);
+  }
+
+  Dictionary dictionary_;  // has no share in its payload
+};
+
+inline Entries Value::entries() const& noexcept { return Entries(*this); }
+inline Dictionary Value::entries() const&& { return dictionary(); }
 
 }  // namespace oxmv

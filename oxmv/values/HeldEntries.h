@@ -61,7 +61,7 @@ struct HeldEntries {
   void lend(Value& value, std::size_t place) const {
     const Slot slot = slots[place];
     if (slot.form() == ownForm) {
-      value.borrow(own[slot.body]);
+      value.borrow(own[slot.body()]);
     } else {
       value.borrow(*block, slot);
     }

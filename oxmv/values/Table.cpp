@@ -69,7 +69,7 @@ void Table::takeOverEach(const HeldEntries& from) {
     const Slot slot = from.slots[place];
     const bool isOwn = slot.form() == HeldEntries::ownForm;
     std::construct_at(keys_ + places_, key.isTag() ? key : keptName(from.nameValue(place)));
-    std::construct_at(slots_ + places_, isOwn ? kept(from.own[slot.body]) : slot);
+    std::construct_at(slots_ + places_, isOwn ? kept(from.own[slot.body()]) : slot);
     ++places_;
   }
 }
@@ -95,7 +95,7 @@ std::optional<std::size_t> Table::find(std::string_view key) const {
 void Table::set(std::string_view key, Value value) {
   const auto place = find(key);
   if (place && slots_[*place].form() == HeldEntries::ownForm) {
-    own_[slots_[*place].body] = std::move(value);
+    own_[slots_[*place].body()] = std::move(value);
   } else if (place) {
     slots_[*place] = kept(std::move(value));
   } else {
@@ -126,7 +126,7 @@ void Table::append(std::string_view key, Value value) {
 void Table::remove(std::size_t place) noexcept {
   if (index_) index_->erase(static_cast<std::uint32_t>(place));
   Slot& slot = slots_[place];
-  if (slot.form() == HeldEntries::ownForm) own_[slot.body] = Value();
+  if (slot.form() == HeldEntries::ownForm) own_[slot.body()] = Value();
   slot = Slot();
   ++vacant_;
 }
@@ -136,7 +136,7 @@ Slot Table::kept(Value value) noexcept {
   return Slot::scalar(HeldEntries::ownForm, static_cast<std::uint32_t>(owned_++));
 }
 
-Key Table::keptName(Value name) noexcept { return Key::textAt(kept(std::move(name)).body); }
+Key Table::keptName(Value name) noexcept { return Key::textAt(kept(std::move(name)).body()); }
 
 void Table::buildIndex() {
   Index index(ByKey{this});

@@ -23,8 +23,8 @@ std::span<const std::uint8_t> asBytes(std::string_view text) {
   return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
-// How much of a text counts, and whether that is all ASCII: both in one pass, nearly every text in
-// one step. Bytes behind the text are read, too; a block has enough of them.
+// How much of a text counts, and whether that is all ASCII: both in one pass. Bytes behind the text are
+// read, too; a block has enough of them.
 struct Cut {
   std::uint32_t size;
   bool isAscii;
@@ -37,7 +37,7 @@ Cut cutAt(const std::uint8_t* text, std::uint32_t size, bool endsAtNul) {
   std::uint32_t high = 0;
   for (std::uint32_t at = 0;; at += width) {
     const Bytes32 bytes = Bytes32::at(text + at);
-    const std::uint32_t nuls = bytes.ends() & ~bytes.notAscii() & nulsCount;
+    const std::uint32_t nuls = bytes.nuls() & nulsCount;
     const std::uint32_t left = std::min(size - at, width);
     const auto taken =
         static_cast<std::uint32_t>(std::countr_zero(nuls | std::uint64_t{1} << left));
@@ -78,32 +78,42 @@ Value Value::wholeText(Form form, std::string_view text) {
   return isUtf8(text) ? whole(form, asBytes(text)) : whole(form, asBytes(utf8FromLatin1(text)));
 }
 
+// Nearly every text is short and ASCII, and there one step finds where it ends.
 void Value::borrowText(const Block& block, Slot slot) {
-  const Cut cut = cutAt(block.bytes(slot).data(), slot.size(), slot.form() == Form::textToNul);
-  slot = Slot::place(Form::text, cut.size, slot.body);
-  if (!cut.isAscii && !isUtf8(block.text(slot))) {
-    *this = wholeText(Form::wholeText, block.text(slot));
-    return;
+  const std::uint32_t size = slot.size();
+  if (size < Bytes32::size && !hasShare()) {
+    const Bytes32 bytes = Bytes32::at(block.bytes(slot).data());
+    const std::uint32_t nulsCount = slot.form() == Form::textToNul ? ~0u : 0u;
+    const int taken = std::countr_zero((bytes.nuls() & nulsCount) | 1u << size);
+    if ((bytes.notAscii() & ((1u << taken) - 1)) == 0) {
+      slot = Slot::place(Form::text, static_cast<std::uint32_t>(taken), slot.body());
+      return becomeLent(block, slot);
+    }
   }
-  release();
-  slot_ = slot.lent();
-  content_.owner = &block;
+  borrowOddText(block, slot);
+}
+
+void Value::borrowOddText(const Block& block, Slot slot) {
+  const Cut cut = cutAt(block.bytes(slot).data(), slot.size(), slot.form() == Form::textToNul);
+  slot = Slot::place(Form::text, cut.size, slot.body());
+  if (cut.isAscii || isUtf8(block.text(slot))) return lend(block, slot);
+  *this = wholeText(Form::wholeText, block.text(slot));
 }
 
 bool Value::isNumber() const noexcept {
-  const Form form = slot_.form();
-  return form == Form::integer || form == Form::float32 || form == Form::float64;
+  const Kind kind = this->kind();
+  return kind == Kind::integer || kind == Kind::float32 || kind == Kind::float64;
 }
 
 std::int32_t Value::intOfOther() const noexcept {
   switch (kind()) {
     case Kind::float32:
     case Kind::float64: return truncated<std::int32_t>(doubleValue());
+    case Kind::integer: return static_cast<std::int32_t>(content_.integer);
     case Kind::text: {
       constexpr std::int64_t lowest = std::numeric_limits<std::int32_t>::min();
       return static_cast<std::int32_t>(std::clamp(leadingInteger(text()), lowest, -(lowest + 1)));
     }
-    case Kind::integer:
     case Kind::nothing:
     case Kind::data:
     case Kind::array:
@@ -117,7 +127,7 @@ std::int64_t Value::int64OfOther() const noexcept {
     case Kind::float32:
     case Kind::float64: return truncated<std::int64_t>(doubleValue());
     case Kind::text: return leadingInteger(text());
-    case Kind::integer:
+    case Kind::integer: return content_.integer;
     case Kind::nothing:
     case Kind::data:
     case Kind::array:
@@ -128,7 +138,7 @@ std::int64_t Value::int64OfOther() const noexcept {
 
 float Value::floatOfOther() const noexcept {
   switch (kind()) {
-    case Kind::integer: return static_cast<float>(content_.integer);
+    case Kind::integer: return static_cast<float>(int64Value());
     case Kind::float64: return static_cast<float>(content_.float64);
     case Kind::text: return leadingFloat(text());
     case Kind::float32:
@@ -142,8 +152,8 @@ float Value::floatOfOther() const noexcept {
 
 double Value::doubleOfOther() const noexcept {
   switch (kind()) {
-    case Kind::integer: return static_cast<double>(content_.integer);
-    case Kind::float32: return static_cast<double>(std::bit_cast<float>(slot_.body));
+    case Kind::integer: return static_cast<double>(int64Value());
+    case Kind::float32: return static_cast<double>(std::bit_cast<float>(slot_.body()));
     case Kind::text: return leadingDouble(text());
     case Kind::float64:
     case Kind::nothing:
@@ -172,8 +182,8 @@ bool Value::equalOutside(const Value& a, const Value& b, Pairs& rest) {
   if (a.kind() != b.kind()) return false;
   switch (a.kind()) {
     case Kind::nothing: return true;
-    case Kind::integer: return a.content_.integer == b.content_.integer;
-    case Kind::float32: return a.slot_.body == b.slot_.body;
+    case Kind::integer: return a.int64Value() == b.int64Value();
+    case Kind::float32: return a.slot_.body() == b.slot_.body();
     case Kind::float64:
       return std::bit_cast<std::uint64_t>(a.content_.float64) ==
              std::bit_cast<std::uint64_t>(b.content_.float64);

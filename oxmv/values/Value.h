@@ -20,6 +20,8 @@ namespace oxmv {
 
 class Array;
 class Dictionary;
+class Elements;
+class Entries;
 
 // A value is nothing, an integer (64 bits), a float (binary32), a double, a text (UTF-8), data
 // (bytes), an array of values or a dictionary. It never changes once made; copies share the
@@ -90,7 +92,9 @@ class Value {
   }
   ~Value() { release(); }
 
-  Kind kind() const noexcept { return kinds[static_cast<std::size_t>(slot_.form())]; }
+  Kind kind() const noexcept {
+    return static_cast<Kind>(static_cast<std::uint8_t>(slot_.form()) >> detail::kindShift);
+  }
   bool isNothing() const noexcept { return slot_.form() == detail::Form::nothing; }
   bool isNumber() const noexcept;  // an integer, a float or a double
   bool isText() const noexcept { return kind() == Kind::text; }
@@ -100,13 +104,13 @@ class Value {
   // saturate (not a number gives 0); text is read like a number at its start (white space, sign,
   // digits); every other kind gives 0.
   std::int32_t intValue() const noexcept {
-    return isInteger() ? static_cast<std::int32_t>(content_.integer) : intOfOther();
+    return isInteger() ? static_cast<std::int32_t>(slot_.body()) : intOfOther();
   }
   std::int64_t int64Value() const noexcept {
-    return isInteger() ? content_.integer : int64OfOther();
+    return isInteger() ? static_cast<std::int32_t>(slot_.body()) : int64OfOther();
   }
   float floatValue() const noexcept {
-    return isFloat32() ? std::bit_cast<float>(slot_.body) : floatOfOther();
+    return isFloat32() ? std::bit_cast<float>(slot_.body()) : floatOfOther();
   }
   double doubleValue() const noexcept {
     return slot_.form() == detail::Form::float64 ? content_.float64 : doubleOfOther();
@@ -114,7 +118,7 @@ class Value {
   // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a signalling
   // not-a-number would arrive as a quiet one.
   std::uint32_t floatBits() const noexcept {
-    return isFloat32() ? slot_.body : std::bit_cast<std::uint32_t>(floatOfOther());
+    return isFloat32() ? slot_.body() : std::bit_cast<std::uint32_t>(floatOfOther());
   }
 
   // The characters of a text; empty for every other kind. The view holds as long as this value.
@@ -137,6 +141,14 @@ class Value {
   // The array or dictionary; an empty one for every other kind.
   Array array() const;
   Dictionary dictionary() const;
+  // The same to go through: views, which hold as long as this value and count nothing in or out.
+  //
+  //   for (const Value& element : value.elements()) ...
+  //   for (const auto& [key, entry] : value.entries()) ...
+  Elements elements() const& noexcept;
+  Array elements() const&&;
+  Entries entries() const& noexcept;
+  Dictionary entries() const&&;
 
   // Equal are values of the same kind and content: floats and doubles bit for bit (so a
   // not-a-number equals itself), dictionaries whatever their order, text whether derived or not.
@@ -159,12 +171,7 @@ class Value {
     using detail::Form;
     const Form form = slot.form();
     if (form == Form::text || form == Form::textToNul) return borrowText(block, slot);
-    release();
-    slot_ = slot.lent();
-    // Which of them no processor foresees: no branch, but a table of both.
-    const std::array contents = {Content{.owner = &block},
-                                 Content{.integer = static_cast<std::int32_t>(slot.body)}};
-    content_ = contents[form == Form::integer];
+    lend(block, slot);
   }
   void borrow(const Value& other) noexcept {
     release();
@@ -173,25 +180,33 @@ class Value {
   }
 
  private:
-  // Of the forms, in their order.
-  static constexpr std::array kinds = {
-      Kind::nothing, Kind::integer, Kind::float32, Kind::float64,   Kind::text,       Kind::text,
-      Kind::data,    Kind::array,   Kind::array,   Kind::array,     Kind::dictionary, Kind::text,
-      Kind::text,    Kind::data,    Kind::array,   Kind::dictionary};
   friend class Array;
   friend class Dictionary;
   struct IntegerTag {};
   union Content {
-    std::int64_t integer;
+    std::int64_t integer;  // of `integer64`
     double float64;
     const detail::Shared* owner;  // null: an empty whole or box
   };
 
   Value(IntegerTag, std::int64_t number) noexcept
-      : slot_(detail::Slot::scalar(detail::Form::integer, 0)), content_{.integer = number} {}
+      : slot_(detail::Slot::scalar(
+            std::in_range<std::int32_t>(number) ? detail::Form::integer : detail::Form::integer64,
+            static_cast<std::uint32_t>(number))),
+        content_{.integer = number} {}
   Value(detail::Slot slot, const detail::Shared* owner) noexcept
       : slot_(slot), content_{.owner = owner} {}
   void borrowText(const detail::Block& block, detail::Slot slot);
+  void borrowOddText(const detail::Block& block, detail::Slot slot);
+  void lend(const detail::Block& block, detail::Slot slot) noexcept {
+    release();
+    becomeLent(block, slot);
+  }
+  // Of a value that has no share in anything.
+  void becomeLent(const detail::Block& block, detail::Slot slot) noexcept {
+    slot_ = slot.lent();
+    content_.owner = &block;
+  }
 
   bool isInteger() const noexcept { return slot_.form() == detail::Form::integer; }
   bool isFloat32() const noexcept { return slot_.form() == detail::Form::float32; }

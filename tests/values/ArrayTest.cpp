@@ -1,7 +1,9 @@
 #include <bit>
+#include <concepts>
 #include <iterator>
 #include <optional>
 #include <string>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -83,6 +85,52 @@ TEST(Array, WhatIsKeptFromALoopOutlivesTheArray) {
           .array(),
       {5, -1});
 }
+
+// The elements of values.
+
+std::vector<Value> elementsOf(const Value& value) {
+  std::vector<Value> elements;
+  for (const Value& element : value.elements()) elements.push_back(element);
+  EXPECT_EQ(value.elements().size(), elements.size());
+  EXPECT_EQ(value.elements().empty(), elements.empty());
+  for (std::size_t i = 0; i < elements.size(); ++i) EXPECT_EQ(value.elements()[i], elements[i]);
+  return elements;
+}
+
+TEST(Elements, AreThoseOfTheArray) {
+  EXPECT_EQ(elementsOf(Array::of(3, "two", 1.5f)), (std::vector<Value>{3, "two", 1.5f}));
+  EXPECT_EQ(elementsOf(Array::of(1.5f, 2.0f)), (std::vector<Value>{1.5f, 2.0f}));
+  EXPECT_EQ(elementsOf(decoded({'B', 'A', 'D', 'P', 8, 0, 0, 'H', 5, 0, 0, 0, 7, 0, 0, 0})["BADP"]),
+            (std::vector<Value>{5, 7}));
+  EXPECT_EQ(elementsOf(decoded({'K', 'W', 'R', 'd', 4, 0, 0, 'c', 'C', 'a', 'f', 0xE9})["KWRd"]),
+            (std::vector<Value>{"Caf\xC3\xA9"}));
+  EXPECT_EQ(elementsOf(Array()), std::vector<Value>());
+}
+
+TEST(Elements, AreNoneOfOtherKinds) {
+  for (const Value& value : {Value(), Value(1), Value(1.5f), Value("text"), Value::data({}),
+                             Value(Dictionary{{"key", 1}})})
+    EXPECT_EQ(elementsOf(value), std::vector<Value>());
+}
+
+TEST(Elements, OfATemporaryAreAnArray) {
+  const Array array = Value(Array::of("one", 2)).elements();
+  EXPECT_EQ(array, Array::of("one", 2));
+}
+
+TEST(Elements, WhatIsKeptOfThemOutlivesTheValue) {
+  std::optional<Value> value = Array::of("one", Array::of("two"));
+  std::vector<Value> kept;
+  for (const Value& element : value->elements()) {
+    kept.push_back(element);
+    for (const Value& inner : element.elements()) kept.push_back(inner);
+  }
+  value.reset();
+  EXPECT_EQ(kept, (std::vector<Value>{"one", Array::of("two"), "two"}));
+}
+
+static_assert(!std::copy_constructible<Elements> && !std::is_copy_assignable_v<Elements>,
+              "a view stays where its value is");
 
 TEST(Array, OfFloatsEqualsOneOfItsValues) {
   const float signalling = std::bit_cast<float>(0x7F800001u);

@@ -147,7 +147,7 @@ TEST(BlockBuilder, ManyNamesThatBeginAlikeAreAllFound) {
     for (std::size_t i = 0; i < names.size(); ++i) {
       const auto value = static_cast<std::int32_t>(1000 * round + static_cast<int>(i));
       builder.putNamed(1, keyOf(1), names[i], number(value));
-      expected.set({reinterpret_cast<const char*>(bytes.data()) + names[i].body, names[i].size()},
+      expected.set({reinterpret_cast<const char*>(bytes.data()) + names[i].body(), names[i].size()},
                    value);
     }
   }
@@ -179,9 +179,9 @@ TEST(BlockBuilder, TextThatIsNotUtf8IsConvertedBehindTheBytes) {
   BlockBuilder builder(bytes);
   const auto outer = builder.open();
   const Slot name = builder.asUtf8(Slot::place(Form::text, 4, 0));
-  EXPECT_EQ(name.body, 4u);
+  EXPECT_EQ(name.body(), 4u);
   builder.putNamed(1, keyOf(1), name, number(1));
-  EXPECT_EQ(builder.asUtf8(Slot::place(Form::text, 3, 0)).body, 0u) << "needs no copy";
+  EXPECT_EQ(builder.asUtf8(Slot::place(Form::text, 3, 0)).body(), 0u) << "needs no copy";
   const Slot root = builder.close(outer);
   EXPECT_EQ(Value::in(*builder.block(), root),
             Value(Dictionary{{"1001", Dictionary{{"Caf\xC3\xA9", 1}}}}));

@@ -22,7 +22,7 @@ TEST(Slot, HoldsFormSizeAndPlace) {
   const Slot slot = Slot::place(Form::data, Slot::maxSize, 0xFFFFFFFEu);
   EXPECT_EQ(slot.form(), Form::data);
   EXPECT_EQ(slot.size(), Slot::maxSize);
-  EXPECT_EQ(slot.body, 0xFFFFFFFEu);
+  EXPECT_EQ(slot.body(), 0xFFFFFFFEu);
 }
 
 TEST(Slot, MarkOfALentValueLeavesTheRest) {
@@ -31,7 +31,7 @@ TEST(Slot, MarkOfALentValueLeavesTheRest) {
   EXPECT_TRUE(slot.lent().isLent());
   EXPECT_EQ(slot.lent().form(), Form::wholeData);
   EXPECT_EQ(slot.lent().size(), Slot::maxSize);
-  EXPECT_EQ(slot.lent().body, 0xFFFFFFFEu);
+  EXPECT_EQ(slot.lent().body(), 0xFFFFFFFEu);
   EXPECT_EQ(slot.lent().kept(), slot);
 }
 

@@ -49,6 +49,7 @@ TYPED_TEST(Bytes32Kinds, TellsWhatIsNoCharacterOfAscii) {
     const auto bytes = TypeParam::at(sample.data());
     ASSERT_EQ(bytes.ends(),
               bitsThat(sample, [](std::uint8_t byte) { return byte == 0 || byte >= 0x80; }));
+    ASSERT_EQ(bytes.nuls(), bitsThat(sample, [](std::uint8_t byte) { return byte == 0; }));
     ASSERT_EQ(bytes.notAscii(), bitsThat(sample, [](std::uint8_t byte) { return byte >= 0x80; }));
   }
 }

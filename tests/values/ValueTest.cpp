@@ -122,6 +122,22 @@ TEST(Value, IntegerKeepsAll64Bits) {
   EXPECT_EQ(Value(std::int8_t{-100}).int64Value(), -100);
 }
 
+TEST(Value, IntegersAreTheSameWhereTheyNeedMoreThan32Bits) {
+  for (const std::int64_t number : {std::int64_t{int32Min} - 1, std::int64_t{int32Min},
+                                    -(std::int64_t{int32Min} + 1), -std::int64_t{int32Min}}) {
+    const Value value(number);
+    EXPECT_EQ(value.kind(), Value::Kind::integer) << number;
+    EXPECT_TRUE(value.isNumber()) << number;
+    EXPECT_EQ(value.int64Value(), number);
+    EXPECT_EQ(value.doubleValue(), static_cast<double>(number));
+    EXPECT_EQ(value.floatValue(), static_cast<float>(number));
+    EXPECT_EQ(value, Value(number));
+    EXPECT_NE(value, Value(number ^ std::int64_t{1} << 32)) << number;
+    EXPECT_EQ(Value(value).int64Value(), number) << "a copy";
+    EXPECT_EQ(Array::of(value)[0].int64Value(), number) << "an element";
+  }
+}
+
 TEST(Value, IntegerAsFloatIsTheNearest) {
   EXPECT_EQ(Value(-3).floatValue(), -3.0f);
   EXPECT_EQ(Value(16'777'217).floatValue(), 16'777'216.0f);  // 2^24 + 1 has no float
