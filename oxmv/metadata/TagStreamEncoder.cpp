@@ -5,10 +5,13 @@
 #include <bit>
 #include <cstddef>
 #include <cstring>
+#include <limits>
 #include <new>
+#include <set>
 #include <span>
 #include <stdexcept>
 #include <string_view>
+#include <tuple>
 #include <utility>
 
 #include "oxmv/metadata/TagStreamFormat.h"
@@ -95,10 +98,11 @@ class Output {
     return offset < stream_.size() ? stream_.data() + offset
                                    : chunk_.data() + (offset - stream_.size());
   }
-  // Takes back all bytes from `size` on.
+  // Takes back all bytes from `size` on. They are more than a chunk holds, so that it begins among
+  // them.
   void cut(std::size_t size) {
-    filled_ = size > stream_.size() ? size - stream_.size() : 0;
-    stream_.resize(std::min(size, stream_.size()));
+    filled_ = 0;
+    stream_.resize(size);
   }
 
   std::vector<std::uint8_t> take() {
@@ -419,18 +423,24 @@ class Encoder {
   // A nested stream, with the two integers of a control point before it unless `point` is null.
   // Left out if it is nested too deep or too large. Answers the stream's length, 0 if left out.
   std::uint32_t putNested(Tag tag, const HeldEntries& entries, int level, const Point* point) {
-    if (level + 1 >= maxNesting) return 0;
+    if (level + 1 >= maxNesting || stream_.size() > doomedFrom_) return 0;
     const std::size_t start = stream_.size();
     const std::uint32_t before = point == nullptr ? 0 : controlPointSize;
+    const TooLarge asIfTooLarge = {entries.slots, level, before};
+    if (tooLarge_.contains(asIfTooLarge)) return 0;
     putHeader(tag, recordType::nested, 0);
     if (point != nullptr) {
       for (const std::uint32_t word : *point) putWord(word);
     }
     const std::size_t nestedStart = stream_.size();
+    const std::size_t mostLength = maxRecordSize - before;
+    const std::size_t outerDoomedFrom = std::exchange(doomedFrom_, nestedStart + mostLength);
     putEntries(entries, level + 1);
+    doomedFrom_ = outerDoomedFrom;
     const std::size_t length = stream_.size() - nestedStart;
-    if (before + length > maxRecordSize) {
+    if (length > mostLength) {
       stream_.cut(start);
+      tooLarge_.insert(asIfTooLarge);
       return 0;
     }
     // Kept on purpose in the exact layout: the length keeps 16 bits.
@@ -493,8 +503,18 @@ class Encoder {
     stream_.add(4);
   }
 
+  // A nested dictionary, known by its slots, that takes too many bytes at a level, with so many before
+  // it.
+  using TooLarge = std::tuple<const Slot*, int, std::uint32_t>;
+
   const bool isExact_;
   Output stream_;
+  // The size past which the nested stream that is being written will be left out, whatever follows:
+  // no more streams are nested in it then.
+  std::size_t doomedFrom_ = std::numeric_limits<std::size_t>::max();
+  // One dictionary may stand in many places. What is left out in one of them is not tried again in
+  // the others: where each holds the next one twice, that would never end.
+  std::set<TooLarge> tooLarge_;
 };
 
 }  // namespace

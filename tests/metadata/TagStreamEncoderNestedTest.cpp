@@ -200,6 +200,68 @@ TEST(TagStreamEncoderNested, OneThatIsTooLargeLeavesTheOthers) {
             encoded(Dictionary{{"DSPm", Array::of(small, small)}}));
 }
 
+// One dictionary in many places.
+
+// Each level holds the one within it twice.
+Dictionary doubled(int levels) {
+  Dictionary tags;
+  for (int level = 0; level < levels; ++level) {
+    const Dictionary inner = tags;
+    tags.set("COL1", inner);
+    tags.set("COL2", inner);
+  }
+  return tags;
+}
+
+TEST(TagStreamEncoderNested, DoublesWithEveryLevelWhileThatFits) {
+  EXPECT_EQ(encoded(doubled(2)), (Bytes{'C', 'O', 'L', '1', 16, 0, 0, 0,  //
+                                        'C', 'O', 'L', '1', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 16, 0, 0, 0,  //
+                                        'C', 'O', 'L', '1', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 0,  0, 0, 0}));
+}
+
+// The twenty-first from within would take 32 MB, and is left out half a million times: as if the
+// twenty-second were empty.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeInManyPlacesIsTriedOnce) {
+  for (const Layout layout : bothLayouts) {
+    const Bytes stream = encoded(doubled(40), layout);
+    EXPECT_EQ(stream.size(), 16u * ((1u << 18) - 1));
+    EXPECT_TRUE(stream == encoded(doubled(18), layout));
+  }
+}
+
+// A list that holds the same dictionary a million times: no more of them are written than it takes to
+// see that they are too many.
+TEST(TagStreamEncoderNested, ListThatIsTooLargeIsNotWrittenToItsEnd) {
+  const Dictionary element{{"FREE", dataOf(1'000'000)}};
+  const Dictionary list{{"DSPm", Array(std::vector<Value>(1'000'000, Value(element)))}};
+  EXPECT_EQ(encoded(Dictionary{{"COL1", list}, {"TAKE", 1}}),
+            StreamBuilder().record("TAKE", 'B', 1).bytes());
+}
+
+// What is too large at one level need not be so a level deeper, where less of it is written.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeAtALevelIsTriedAtOthers) {
+  const Value tenMegabytes = dataOf(10'000'000);
+  Dictionary inner{{"FREE", tenMegabytes}};
+  for (int level = 1; level < 62; ++level) inner = {{"COL1", inner}};
+  const Dictionary tags{{"FREE", tenMegabytes}, {"COL1", inner}};
+  EXPECT_EQ(encoded(Dictionary{{"COL1", tags}}), Bytes());
+  const Bytes deeper = encoded(Dictionary{{"COL2", Dictionary{{"COL1", tags}}}});
+  EXPECT_GT(deeper.size(), 10'000'000u);
+  EXPECT_TRUE(encoded(Dictionary{{"COL1", tags}, {"COL2", Dictionary{{"COL1", tags}}}}) == deeper);
+}
+
+// What is too large behind the two integers of a control point need not be so without them.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeAsAControlPointIsTriedElsewhere) {
+  const Dictionary large{{"FREE", dataOf(0xFFFFFC - 8)}};
+  const Dictionary tags{{"COL1", Dictionary{{"CTLp", Array::of(large)}}},
+                        {"COL2", Dictionary{{"COL1", large}, {"TAKE", 1}}}};
+  // So the second is too large with it, and not written without it.
+  EXPECT_EQ(encoded(tags), StreamBuilder().record("COL1", 0, Bytes(8, 0)).bytes());
+}
+
 // Depth: the outermost stream is level 0, and there are 64.
 
 TEST(TagStreamEncoderNested, NestsSixtyFourLevelsAndNoMore) {
