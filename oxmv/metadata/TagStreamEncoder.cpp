@@ -155,7 +155,9 @@ class Deferred {
 class Encoder {
  public:
   Encoder(Layout layout, std::size_t likelySize)
-      : isExact_(layout == Layout::exact), stream_(likelySize) {}
+      : isExact_(layout == Layout::exact),
+        mostSize_(isExact_ ? maxRecordSize : longestRecord),
+        stream_(likelySize) {}
 
   std::vector<std::uint8_t> encode(const HeldEntries& entries) {
     putEntries(entries, 0);
@@ -351,7 +353,7 @@ class Encoder {
   }
 
   void putData(const TagRow& row, std::span<const std::uint8_t> bytes) {
-    if (bytes.size() > maxRecordSize) return;
+    if (bytes.size() > mostSize_) return;
     const auto size = static_cast<std::uint32_t>(bytes.size());
     // Kept on purpose in the exact layout: a GUID's size is always 16, other sizes keep 16 bits; no
     // padding.
@@ -379,7 +381,7 @@ class Encoder {
   // Kept on purpose: the elements all go into the first word, so the last one stays there and the
   // others are zeros.
   void putIntegerArray(Tag tag, const Array& array) {
-    if (array.size() > maxRecordSize / 4) return;
+    if (array.size() > mostSize_ / 4) return;
     putHeader(tag, recordType::integerH, static_cast<std::uint32_t>(array.size() * 4));
     if (array.empty()) return;
     putWord(integer(array[array.size() - 1]));
@@ -433,7 +435,7 @@ class Encoder {
       for (const std::uint32_t word : *point) putWord(word);
     }
     const std::size_t nestedStart = stream_.size();
-    const std::size_t mostLength = maxRecordSize - before;
+    const std::size_t mostLength = mostSize_ - before;
     const std::size_t outerDoomedFrom = std::exchange(doomedFrom_, nestedStart + mostLength);
     putEntries(entries, level + 1);
     doomedFrom_ = outerDoomedFrom;
@@ -508,6 +510,7 @@ class Encoder {
   using TooLarge = std::tuple<const Slot*, int, std::uint32_t>;
 
   const bool isExact_;
+  const std::uint32_t mostSize_;  // of a payload
   Output stream_;
   // The size past which the nested stream that is being written will be left out, whatever follows:
   // no more streams are nested in it then.
