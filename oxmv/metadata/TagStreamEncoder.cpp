@@ -108,6 +108,8 @@ class Output {
   std::vector<std::uint8_t> take() {
     likelySize_ = 0;
     flush();
+    // Where much was taken out of what was decoded.
+    if (stream_.capacity() > 2 * stream_.size()) stream_.shrink_to_fit();
     return std::move(stream_);
   }
 
@@ -115,12 +117,21 @@ class Output {
   static constexpr std::size_t chunkSize = 4096;
 
   void flush() {
-    if (stream_.empty()) stream_.reserve(std::max(likelySize_, filled_));
+    reserveLikely();
     stream_.insert(stream_.end(), chunk_.data(), chunk_.data() + filled_);
     filled_ = 0;
   }
+  // Without memory for so much there may be enough for what it really takes.
+  void reserveLikely() {
+    const std::size_t size = std::exchange(likelySize_, 0);
+    if (size <= filled_) return;
+    try {
+      stream_.reserve(size);
+    } catch (const std::bad_alloc&) {
+    }
+  }
 
-  std::size_t likelySize_;
+  std::size_t likelySize_;  // 0 once it has been asked for
   std::vector<std::uint8_t> stream_;
   std::size_t filled_ = 0;  // of the chunk
   std::array<std::uint8_t, chunkSize> chunk_;

@@ -122,6 +122,11 @@ TEST(TagStreamEncoderNested, ControlPointWithoutExactlyTwoIntegersHasZeros) {
         << testing::PrintToString(data);
   }
   EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(Dictionary())}}), zeros);
+  EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(Dictionary{{"another name", Array::of(5, 6)}})}}),
+            zeros);
+  Dictionary removed{{"CTLPData", Array::of(5, 6)}};
+  removed.remove("CTLPData");
+  EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(removed)}}), zeros);
 }
 
 TEST(TagStreamEncoderNested, KeepsControlPointsUnpadded) {
@@ -197,6 +202,28 @@ TEST(TagStreamEncoderNested, IsWrittenExactlyWhileItsSizeHas24Bits) {
     };
     EXPECT_EQ(headerOf(encodedOf(largest)), header(tag, written)) << tag;
     EXPECT_EQ(encodedOf(largest + 1), tag == "CTLp"sv ? Bytes(8, 0) : Bytes()) << tag;
+  }
+}
+
+// The encoder gathers records in pieces of some thousand bytes, and a stream's size is known only when
+// its header may have left: it stands at every place at the end of such a piece, and across it.
+TEST(TagStreamEncoderNested, HasItsSizeWhereverItsHeaderStands) {
+  const Dictionary inner{{"KWRd", Array(std::vector<Value>(1000, Value("ABCDEFGH")))}};
+  StreamBuilder keywords;
+  for (int i = 0; i < 1000; ++i) keywords.record("KWRd", 'c', "ABCDEFGH"sv);
+  for (std::size_t more = 0; more <= 512; ++more) {
+    Dictionary tags;
+    StreamBuilder expected;
+    const auto fill = [&](const char* tag, std::size_t size) {
+      tags.set(tag, dataOf(size));
+      expected.header(tag, static_cast<std::uint32_t>(size), 'c').raw(Bytes(size, 0xAB));
+    };
+    for (const char* tag : {"FREE", "NOPP", "DPXI", "DPXM", "DPXO", "DPXT"}) fill(tag, 508);
+    fill("DPXU", more);  // from 3104 to 3616 bytes
+    tags.set("COL1", Dictionary{{"COL2", inner}, {"DSPm", Array::of(inner)}});
+    expected.header("COL1", 2 * (8 + 16'000), 0);
+    for (const char* tag : {"DSPm", "COL2"}) expected.header(tag, 16'000, 0).raw(keywords.bytes());
+    ASSERT_TRUE(encoded(tags, Layout::exact) == expected.bytes()) << more;
   }
 }
 
