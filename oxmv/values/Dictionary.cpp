@@ -62,9 +62,9 @@ Value Dictionary::renewTable(std::size_t more) {
   return std::exchange(value_, Value(Slot::scalar(Form::dictionaryBox, 0), table.detach()));
 }
 
-// Without memory for it the table stays as it is; the next removal tries again.
+// Without memory for it the table stays as it is; the next change tries again.
 void Dictionary::compact() noexcept {
-  if (!ownTable().isSparse()) return;
+  if (!ownTable().isWasteful()) return;
   try {
     renewTable(fewMore);
   } catch (const std::bad_alloc&) {
@@ -136,6 +136,7 @@ bool Dictionary::set(std::string_view key, Value value) {
     before = renewTable(std::max(fewMore, size()));
   }
   ownTable().set(wanted.text(), std::move(value));
+  compact();
   return true;
 }
 
