@@ -500,8 +500,8 @@ class LossFinder {
 
   const Layout layout_;
   std::vector<Loss> losses_;
-  // Nested streams that have to be explained in their turn: a stack frame for each would not do, they
-  // may stand 64 deep.
+  // Nested streams that have to be explained in their turn: a stack frame for each would not do,
+  // they may stand 64 deep.
   struct Nested {
     Dictionary tags;
     std::string prefix;

@@ -116,7 +116,8 @@ class Output {
  private:
   static constexpr std::size_t chunkSize = 4096;
 
-  void flush() {
+  // Seldom: kept out of the way of what it is called from.
+  [[gnu::noinline]] void flush() {
     reserveLikely();
     stream_.insert(stream_.end(), chunk_.data(), chunk_.data() + filled_);
     filled_ = 0;
@@ -311,8 +312,8 @@ class Encoder {
         for (const Value& element : value.array()) putText(row.tag, element.text(), 0);
         break;
       case Write::nestedEach: putNestedEach(row.tag, value.array(), level); break;
-      case Write::tagGroup: putTagGroup(Dictionary::entriesOf(value)); break;
-      case Write::regGroup: putRegGroup(Dictionary::entriesOf(value)); break;
+      case Write::tagGroup: putGroup(tagRule, Dictionary::entriesOf(value)); break;
+      case Write::regGroup: putGroup(regRule, Dictionary::entriesOf(value)); break;
     }
   }
 
@@ -327,9 +328,9 @@ class Encoder {
     putNumber(tag, recordTypeOf(rule), word);
   }
 
-  // Texts go out in ASCII: one that is not, as zeros. `room` is what the size leaves for a NUL: with
-  // 0, kept on purpose for TIMC and for the elements of lists, a text whose length is a multiple of
-  // 4 fills its payload to the end.
+  // Texts go out in ASCII: one that is not, as zeros. `room` is what the size leaves for a NUL:
+  // with 0, kept on purpose for TIMC and for the elements of lists, a text whose length is a
+  // multiple of 4 fills its payload to the end.
   void putText(Tag tag, std::string_view text, std::uint32_t room) {
     const std::string_view kept = text.substr(0, maxCharacters);
     const bool isKept = isAscii(kept);
@@ -439,8 +440,7 @@ class Encoder {
     if (level + 1 >= maxNesting || stream_.size() > doomedFrom_) return 0;
     const std::size_t start = stream_.size();
     const std::uint32_t before = point == nullptr ? 0 : controlPointSize;
-    const TooLarge asIfTooLarge = {entries.slots, level, before};
-    if (tooLarge_.contains(asIfTooLarge)) return 0;
+    if (isTooLarge({entries.slots, level, before})) return 0;
     putHeader(tag, recordType::nested, 0);
     if (point != nullptr) {
       for (const std::uint32_t word : *point) putWord(word);
@@ -452,8 +452,7 @@ class Encoder {
     doomedFrom_ = outerDoomedFrom;
     const std::size_t length = stream_.size() - nestedStart;
     if (length > mostLength) {
-      stream_.cut(start);
-      tooLarge_.insert(asIfTooLarge);
+      leaveOut(start, {entries.slots, level, before});
       return 0;
     }
     // Kept on purpose in the exact layout: the length keeps 16 bits.
@@ -463,33 +462,38 @@ class Encoder {
     return static_cast<std::uint32_t>(length);
   }
 
-  void putTagGroup(const HeldEntries& group) {
-    for (std::size_t place = 0; place < group.count; ++place) {
-      if (group.isVacant(place)) continue;
-      putName("TAGN"_tag, group, place);
-      if (putShortText("TAGV"_tag, group.slots[place], group.block, 1)) continue;
-      Value value;
-      group.lend(value, place);
-      if (value.isText()) {
-        putText("TAGV"_tag, value.text(), 1);
-      } else {
-        putNumber("TAGV"_tag, recordType::integerL, integer(value));
-      }
-    }
+  // A nested dictionary, known by its slots, at a level, with so many bytes before it.
+  using Nested = std::tuple<const Slot*, int, std::uint32_t>;
+
+  bool isTooLarge(const Nested& nested) const {
+    return !tooLarge_.empty() && tooLarge_.contains(nested);
+  }
+  [[gnu::noinline]] void leaveOut(std::size_t start, const Nested& nested) {
+    stream_.cut(start);
+    tooLarge_.insert(nested);
   }
 
+  // How a group is written: the tag of its names, those of its values, and whether a text of a
+  // derived kind is written as text.
+  struct GroupRule {
+    Tag name, text, number;
+    bool takesDerivedText;
+  };
+  static constexpr GroupRule tagRule = {"TAGN"_tag, "TAGV"_tag, "TAGV"_tag, true};
   // Kept on purpose: a text goes out as a second name, and text of a derived kind as a number.
-  void putRegGroup(const HeldEntries& group) {
+  static constexpr GroupRule regRule = {"REGN"_tag, "REGN"_tag, "REGV"_tag, false};
+
+  void putGroup(const GroupRule& rule, const HeldEntries& group) {
     for (std::size_t place = 0; place < group.count; ++place) {
       if (group.isVacant(place)) continue;
-      putName("REGN"_tag, group, place);
-      if (putShortText("REGN"_tag, group.slots[place], group.block, 1)) continue;
+      putName(rule.name, group, place);
+      if (putShortText(rule.text, group.slots[place], group.block, 1)) continue;
       Value value;
       group.lend(value, place);
-      if (value.isText() && !value.isDerivedText()) {
-        putText("REGN"_tag, value.text(), 1);
+      if (value.isText() && (rule.takesDerivedText || !value.isDerivedText())) {
+        putText(rule.text, value.text(), 1);
       } else {
-        putNumber("REGV"_tag, recordType::integerL, integer(value));
+        putNumber(rule.number, recordType::integerL, integer(value));
       }
     }
   }
@@ -516,10 +520,6 @@ class Encoder {
     stream_.add(4);
   }
 
-  // A nested dictionary, known by its slots, that takes too many bytes at a level, with so many before
-  // it.
-  using TooLarge = std::tuple<const Slot*, int, std::uint32_t>;
-
   const bool isExact_;
   const std::uint32_t mostSize_;  // of a payload
   Output stream_;
@@ -528,7 +528,7 @@ class Encoder {
   std::size_t doomedFrom_ = std::numeric_limits<std::size_t>::max();
   // One dictionary may stand in many places. What is left out in one of them is not tried again in
   // the others: where each holds the next one twice, that would never end.
-  std::set<TooLarge> tooLarge_;
+  std::set<Nested> tooLarge_;
 };
 
 }  // namespace

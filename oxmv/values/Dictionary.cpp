@@ -95,35 +95,34 @@ void Dictionary::Iterator::arriveInTable() {
   entries.lend(entry_.value, place_);
 }
 
-std::optional<std::size_t> Dictionary::findInTable(std::string_view key) const {
-  return isTable() && table() != nullptr ? table()->find(key) : std::nullopt;
-}
-
-const Slot* Dictionary::findInBlock(std::string_view key) const {
-  if (isTable() || value_.isNothing()) return nullptr;
-  return value_.block().find(value_.slot_.body, key);
-}
-
-bool Dictionary::holds(std::string_view key) const {
-  return isTable() ? findInTable(key).has_value() : findInBlock(key) != nullptr;
+std::optional<std::size_t> Dictionary::placeOf(std::string_view key) const {
+  if (isTable()) return table() == nullptr ? std::nullopt : table()->find(key);
+  if (value_.isNothing()) return std::nullopt;
+  const std::uint32_t header = value_.slot_.body;
+  const Slot* slot = value_.block().find(header, key);
+  if (slot == nullptr) return std::nullopt;
+  return static_cast<std::size_t>(slot - value_.block().items(header));
 }
 
 bool Dictionary::lend(Value& value, std::string_view key) const {
-  if (const auto place = findInTable(key)) {
-    table()->held().lend(value, *place);
-    return true;
-  }
-  const Slot* slot = findInBlock(key);
-  if (slot != nullptr) value.borrow(value_.block(), *slot);
-  return slot != nullptr;
+  const auto place = placeOf(key);
+  if (place) entries().lend(value, *place);
+  return place.has_value();
 }
 
-bool Dictionary::contains(std::string_view key) const { return holds(KeyText(key).text()); }
+bool Dictionary::contains(std::string_view key) const {
+  return placeOf(KeyText(key).text()).has_value();
+}
 
 Value Dictionary::operator[](std::string_view key) const {
-  Value lent;
-  lend(lent, KeyText(key).text());
-  return Value(std::move(lent));  // a share of its own
+  const KeyText wanted(key);
+  if (isTable()) {
+    const auto place = table() == nullptr ? std::nullopt : table()->find(wanted.text());
+    return place ? table()->held().value(*place) : Value();
+  }
+  if (value_.isNothing()) return {};
+  const Slot* slot = value_.block().find(value_.slot_.body, wanted.text());
+  return slot == nullptr ? Value() : Value::in(value_.block(), *slot);
 }
 
 bool Dictionary::set(std::string_view key, Value value) {
@@ -142,7 +141,7 @@ bool Dictionary::set(std::string_view key, Value value) {
 
 bool Dictionary::remove(std::string_view key) {
   const KeyText wanted(key);
-  if (!holds(wanted.text())) return false;
+  if (!placeOf(wanted.text())) return false;
   Value before;  // whose own key this may be
   if (!ownsTable()) before = renewTable(fewMore);
   ownTable().remove(*ownTable().find(wanted.text()));

@@ -68,11 +68,8 @@ class Dictionary {
   explicit Dictionary(Value value) noexcept : value_(std::move(value)) {}
 
   bool isTable() const noexcept { return value_.slot_.form() == detail::Form::dictionaryBox; }
-  // Where `key`, in UTF-8, stands in the table; nowhere if there is none.
-  std::optional<std::size_t> findInTable(std::string_view key) const;
-  // Its slot in the block; null if there is none.
-  const detail::Slot* findInBlock(std::string_view key) const;
-  bool holds(std::string_view key) const;
+  // Where `key`, in UTF-8, stands in the order.
+  std::optional<std::size_t> placeOf(std::string_view key) const;
   // `value` becomes that of `key`, in UTF-8, and stays as it was if there is none; see
   // Value::borrow. Answers whether there is.
   bool lend(Value& value, std::string_view key) const;

@@ -24,10 +24,13 @@ std::size_t countInBlock(const HeldEntries& entries) {
 // How many values and names a table of `entries` has for itself.
 std::size_t countOwned(const HeldEntries& entries, bool keepsBlock) {
   const auto isName = [](const Key& key) { return !key.isTag(); };
-  const auto isTaken = [&](Slot slot) { return isOwn(slot) || !keepsBlock; };
-  const auto names = std::count_if(entries.keys, entries.keys + entries.count, isName);
-  const auto values = std::count_if(entries.slots, entries.slots + entries.count, isTaken);
-  return static_cast<std::size_t>(names + values);
+  auto count = std::count_if(entries.keys, entries.keys + entries.count, isName);
+  if (!keepsBlock) {
+    count += static_cast<std::ptrdiff_t>(entries.count);
+  } else if (entries.own != nullptr) {
+    count += std::count_if(entries.slots, entries.slots + entries.count, isOwn);
+  }
+  return static_cast<std::size_t>(count);
 }
 
 }  // namespace

@@ -36,8 +36,8 @@ class Table final : public Shared {
   std::size_t size() const { return places_ - vacant_; }
   // Whether one more value may be set, under whatever key.
   bool hasRoom() const { return places_ < mostPlaces_ && owned_ + 2 <= mostOwned_; }
-  // Whether to make it anew would spare something: going through the entries means going past vacant
-  // places most of the time, or nothing stands in the block any more.
+  // Whether to make it anew would spare something: going through the entries means going past
+  // vacant places most of the time, or nothing stands in the block any more.
   bool isWasteful() const { return vacant_ >= size() + 32 || (base_ && inBlock_ == 0); }
 
   // `key` is in UTF-8.
