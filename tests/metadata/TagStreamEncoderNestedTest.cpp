@@ -205,8 +205,9 @@ TEST(TagStreamEncoderNested, IsWrittenExactlyWhileItsSizeHas24Bits) {
   }
 }
 
-// The encoder gathers records in pieces of some thousand bytes, and a stream's size is known only when
-// its header may have left: it stands at every place at the end of such a piece, and across it.
+// The encoder gathers records in pieces of some thousand bytes, and a stream's size is known only
+// when its header may have left: it stands at every place at the end of such a piece, and across
+// it.
 TEST(TagStreamEncoderNested, HasItsSizeWhereverItsHeaderStands) {
   const Dictionary inner{{"KWRd", Array(std::vector<Value>(1000, Value("ABCDEFGH")))}};
   StreamBuilder keywords;
@@ -265,8 +266,8 @@ TEST(TagStreamEncoderNested, OneThatIsTooLargeInManyPlacesIsTriedOnce) {
   EXPECT_TRUE(encoded(doubled(34), Layout::readable) == encoded(doubled(12), Layout::readable));
 }
 
-// A list that holds the same dictionary a million times: no more of them are written than it takes to
-// see that they are too many.
+// A list that holds the same dictionary a million times: no more of them are written than it takes
+// to see that they are too many.
 TEST(TagStreamEncoderNested, ListThatIsTooLargeIsNotWrittenToItsEnd) {
   const Dictionary element{{"FREE", dataOf(1'000'000)}};
   const Dictionary list{{"DSPm", Array(std::vector<Value>(1'000'000, Value(element)))}};

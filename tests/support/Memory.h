@@ -36,7 +36,8 @@ class MemoryShortage {
   bool wasFelt() const;
 };
 
-// While it lives, allocations of this thread of more than `most` bytes fail. One at a time on a thread.
+// While it lives, allocations of this thread of more than `most` bytes fail. One at a time on a
+// thread.
 class LargeMemoryShortage {
  public:
   explicit LargeMemoryShortage(std::size_t most);

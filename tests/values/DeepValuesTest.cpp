@@ -90,8 +90,8 @@ Value doubledArrays(int levels, const Value& leaf) {
   return value;
 }
 
-// The same tree, every second level of which is made twice: either the even ones (0) or the odd ones
-// (1), so that in two of them no level stands in many places of both.
+// The same tree, every second level of which is made twice: either the even ones (0) or the odd
+// ones (1), so that in two of them no level stands in many places of both.
 Value halfDoubledArrays(int levels, int madeTwice) {
   Value first(1), second(1);
   for (int level = 0; level < levels; ++level) {
