@@ -221,7 +221,7 @@ class LossFinder {
   void explainData(const TagRow& row, const Value& value, const std::string& path) {
     if (value.kind() != Value::Kind::data) return addWrongKind(value, {}, path);
     const std::size_t size = value.data().size();
-    if (size > maxRecordSize) return addTooLarge(path, size);
+    if (size > longestRecord) return addTooLarge(path, size);
     if (row.write == Write::guid) return addGuidLength(path, size);
     addCutSize(path, size);
   }
@@ -244,7 +244,7 @@ class LossFinder {
   void explainIntegers(const Value& value, const Value& back, const std::string& path) {
     if (value.kind() != Value::Kind::array) return addWrongKind(value, back, path);
     const Array array = value.array();
-    if (array.size() > maxRecordSize / 4) return addTooLarge(path, array.size() * 4);
+    if (array.size() > longestRecord / 4) return addTooLarge(path, array.size() * 4);
     if (array.size() > 1) {
       return add(LossCode::intArray, path,
                  "has " + std::to_string(array.size()) +
@@ -295,7 +295,7 @@ class LossFinder {
     if (level + 1 >= maxNesting)
       return add(LossCode::tooDeep, path, "is nested deeper than 64 levels");
     const Stream stream = encoded(nested, layout_);
-    if (stream.size() + before > maxRecordSize) return addTooLarge(path, stream.size());
+    if (stream.size() + before > longestRecord) return addTooLarge(path, stream.size());
     if (decoded(stream) != nested || nestsTooDeep(nested, level + 1))
       nested_.push_back({nested, path + "/", level + 1});
     addCutSize(path, stream.size());
@@ -389,20 +389,25 @@ class LossFinder {
     for (std::size_t i = 0; i < entries.size(); ++i) {
       const auto& [key, value] = entries[i];
       const TagRow* row = findTagRow(key);
-      if (row == nullptr || !canDamage(row->write) || !damagesAnother(entries, i)) continue;
+      if (row == nullptr || !canDamage(*row, value) || !damagesAnother(entries, i)) continue;
       const std::string path = prefix + std::string(key);
       const std::size_t size = encoded({{key, value}}, layout_).size();
       if (row->write == Write::guid) {
         addGuidLength(path, value.data().size());
+      } else if (row->write == Write::integerArray) {
+        addTooLarge(path, size - recordHeaderSize);
       } else if (size % 4 != 0) {
         addUnaligned(path);
-      } else {
+      } else if (!known_.contains({LossCode::size24bit, path})) {
         addCutSize(path, size - recordHeaderSize);
       }
     }
   }
 
-  static bool canDamage(Write rule) {
+  static bool canDamage(const TagRow& row, const Value& value) {
+    const Write rule = row.write;
+    // Has its true size in both layouts, and that wraps.
+    if (rule == Write::integerArray) return value.array().size() > longestRecord / 4;
     return rule == Write::data || rule == Write::guid || rule == Write::nested ||
            rule == Write::nestedEach || rule == Write::controlPoint;
   }
@@ -495,8 +500,8 @@ class LossFinder {
 
   const Layout layout_;
   std::vector<Loss> losses_;
-  // Nested streams that have to be explained in their turn: a stack frame for each would not do, they
-  // may stand 64 deep.
+  // Nested streams that have to be explained in their turn: a stack frame for each would not do,
+  // they may stand 64 deep.
   struct Nested {
     Dictionary tags;
     std::string prefix;

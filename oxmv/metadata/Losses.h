@@ -31,7 +31,7 @@ enum class LossCode : std::uint8_t {
   wrongKind,       // a value of a kind that the tag does not carry
   dataUnaligned,   // what follows is misread, for it is not a multiple of 4 bytes
   size16bit,       // its size keeps 16 bits
-  size24bit,       // larger than any record can be
+  size24bit,       // larger than any record that readers step over
   guidLength,      // not of 16 bytes
   regText,         // a text in the group "REG " is written as a name
   nameGrows,       // a name in the group "REG " gains NULs, more with each save
@@ -52,8 +52,8 @@ std::optional<LossCode> lossCodeOf(std::string_view code) noexcept;
 struct Loss {
   LossCode code;
   // Where: "REEL", "COL1/WBAL", "KWRd[3]", "TAG /ISO". For pairAdded the key that is added; for
-  // losses that damage what follows (dataUnaligned, size16bit, guidLength) the entry that does the
-  // damage.
+  // losses that damage what follows (dataUnaligned, size16bit, guidLength, and size24bit where the
+  // layout `exact` writes it all the same) the entry that does the damage.
   std::string path;
   // What would happen; reads on behind the path: `"Café" would be written as zeros`.
   std::string message;

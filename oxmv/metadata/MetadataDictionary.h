@@ -28,8 +28,8 @@ class CameraTables;
 constexpr std::string_view preferencesAppID = "com.ombrix.oxmv";
 
 // Why an object that was to be loaded from a file has no tags. A file of no bytes at all is what
-// saving an object without tags leaves, and is no failure; but an eye's file is removed then, so that
-// one of no bytes is too short.
+// saving an object without tags leaves, and is no failure; but an eye's file is removed then, so
+// that one of no bytes is too short.
 enum class LoadError {
   none,        // it was loaded
   missing,     // there is no such file
@@ -120,14 +120,14 @@ class MetadataDictionary {
   std::filesystem::path fileURLS(std::size_t eye) const;
 
   // Saves the object where it belongs by GUID and eye, in place of what is there; see
-  // writeWholeFile(). An object of one eye without tags has no file: saving it removes the file, and
-  // fails if there is none. Kept on purpose: a combined object without tags leaves an empty file.
-  // Folders are not made.
+  // writeWholeFile(). An object of one eye without tags has no file: saving it removes the file,
+  // and fails if there is none. Kept on purpose: a combined object without tags leaves an empty
+  // file. Folders are not made.
   //
   // Answers whether that succeeded. If not, the cause is in `error` unless that is null; where the
   // tags could not be encoded for want of memory, `error` stays as it was. Then the old file is
-  // there still, but for the one case that writeWholeFile() and removeFile() name. std::bad_alloc may
-  // leave, for want of memory to make the path or to write, and leaves the old file, too.
+  // there still, but for the one case that writeWholeFile() and removeFile() name. std::bad_alloc
+  // may leave, for want of memory to make the path or to write, and leaves the old file, too.
   [[nodiscard]] bool writeToGUIDFile(std::error_code* error = nullptr) const;
 
   // The same for the override file, which is never removed: an object without tags leaves it empty.
@@ -175,14 +175,14 @@ class MetadataDictionary {
   // bytes.
   std::string metadataString() const;
 
-  // The tags that a still from a camera tells of its clip: when it was taken, the camera's model and
-  // firmware, how wide it looks, and the reel name unless that is empty. Which tags there are, and
-  // where they come from: see tagsOfStill(). They are nobody's until setMetadata() is called with
-  // them. `tables`: the cameras that are recognised; null: those built in.
+  // The tags that a still from a camera tells of its clip: when it was taken, the camera's model
+  // and firmware, how wide it looks, and the reel name unless that is empty. Which tags there are,
+  // and where they come from: see tagsOfStill(). They are nobody's until setMetadata() is called
+  // with them. `tables`: the cameras that are recognised; null: those built in.
   //
-  // Answers nothing when there is no path, no such file (of at most 256 MiB) or no JPEG image in it.
-  // Throws std::out_of_range when the still has a firmware text of fewer than 3 characters, or of
-  // fewer than 6 that does not begin with one of the short prefixes.
+  // Answers nothing when there is no path, no such file (of at most 256 MiB) or no JPEG image in
+  // it. Throws std::out_of_range when the still has a firmware text of fewer than 3 characters, or
+  // of fewer than 6 that does not begin with one of the short prefixes.
   static std::optional<Dictionary> metadataFromJPEGFile(
       const std::optional<std::filesystem::path>& path, std::string_view reelName,
       const CameraTables* tables = nullptr);

@@ -64,8 +64,8 @@ bool isGroup(Tag tag) {
   return row != nullptr && (row->write == Write::tagGroup || row->write == Write::regGroup);
 }
 
-// Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or whose
-// length wraps, and for values of other kinds.
+// Answers false when the stream needs a decoder: at a marker, at a record that is not whole, or
+// whose length wraps, and for values of other kinds.
 bool step(std::span<const std::uint8_t> stream, std::span<const Tag> tags,
           std::span<Value> values) {
   std::uint64_t bits = 0;

@@ -82,7 +82,8 @@ bool isMarker(Tag tag) {
   return (static_cast<std::uint32_t>(tag) & 0xFFFF) == marker;
 }
 
-// A dictionary has at most an entry for each row, whose index is its id, and that of a control point.
+// A dictionary has at most an entry for each row, whose index is its id, and that of a control
+// point.
 static_assert(BlockBuilder::mostEntries >= detail::noRow);
 
 std::uint8_t indexOf(const TagRow& row) {
@@ -159,8 +160,8 @@ class Decoder {
   }
 
   // The same with nobody listening, for as long as each record is whole, a word is there behind its
-  // header and no length wraps: what a clip's stream is from beginning to end. Answers how many bytes
-  // it has taken, all of them or up to a record or marker that the walk has to look at.
+  // header and no length wraps: what a clip's stream is from beginning to end. Answers how many
+  // bytes it has taken, all of them or up to a record or marker that the walk has to look at.
   std::int64_t readWholeRecords(Extent stream, std::int64_t length, int level,
                                 PendingNames& names) {
     const std::size_t there = stream.end - stream.begin;

@@ -18,8 +18,9 @@ namespace oxmv {
 // - 1 bytes are looked at.
 //
 // The result owns a copy of `bytes`, and holds whatever could be read, possibly nothing; there is
-// no error. Memory is linear in the size of `bytes`, and so is time but for the names of large groups,
-// which are sorted; streams nested deeper than maxNesting are left out. Throws std::bad_alloc only (and what `observer` throws).
+// no error. Memory is linear in the size of `bytes`, and so is time but for the names of large
+// groups, which are sorted; streams nested deeper than maxNesting are left out. Throws
+// std::bad_alloc only (and what `observer` throws).
 //
 // A GUID record anywhere in the stream, nested streams included, is also laid over `guid` unless
 // that is null: as many bytes as a myGUID takes, whatever the record's size, as far as there are

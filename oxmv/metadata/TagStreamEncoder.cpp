@@ -5,10 +5,13 @@
 #include <bit>
 #include <cstddef>
 #include <cstring>
+#include <limits>
 #include <new>
+#include <set>
 #include <span>
 #include <stdexcept>
 #include <string_view>
+#include <tuple>
 #include <utility>
 
 #include "oxmv/metadata/TagStreamFormat.h"
@@ -95,28 +98,41 @@ class Output {
     return offset < stream_.size() ? stream_.data() + offset
                                    : chunk_.data() + (offset - stream_.size());
   }
-  // Takes back all bytes from `size` on.
+  // Takes back all bytes from `size` on. They are more than a chunk holds, so that it begins among
+  // them.
   void cut(std::size_t size) {
-    filled_ = size > stream_.size() ? size - stream_.size() : 0;
-    stream_.resize(std::min(size, stream_.size()));
+    filled_ = 0;
+    stream_.resize(size);
   }
 
   std::vector<std::uint8_t> take() {
     likelySize_ = 0;
     flush();
+    // Where much was taken out of what was decoded.
+    if (stream_.capacity() > 2 * stream_.size()) stream_.shrink_to_fit();
     return std::move(stream_);
   }
 
  private:
   static constexpr std::size_t chunkSize = 4096;
 
-  void flush() {
-    if (stream_.empty()) stream_.reserve(std::max(likelySize_, filled_));
+  // Seldom: kept out of the way of what it is called from.
+  [[gnu::noinline]] void flush() {
+    reserveLikely();
     stream_.insert(stream_.end(), chunk_.data(), chunk_.data() + filled_);
     filled_ = 0;
   }
+  // Without memory for so much there may be enough for what it really takes.
+  void reserveLikely() {
+    const std::size_t size = std::exchange(likelySize_, 0);
+    if (size <= filled_) return;
+    try {
+      stream_.reserve(size);
+    } catch (const std::bad_alloc&) {
+    }
+  }
 
-  std::size_t likelySize_;
+  std::size_t likelySize_;  // 0 once it has been asked for
   std::vector<std::uint8_t> stream_;
   std::size_t filled_ = 0;  // of the chunk
   std::array<std::uint8_t, chunkSize> chunk_;
@@ -151,7 +167,9 @@ class Deferred {
 class Encoder {
  public:
   Encoder(Layout layout, std::size_t likelySize)
-      : isExact_(layout == Layout::exact), stream_(likelySize) {}
+      : isExact_(layout == Layout::exact),
+        mostSize_(isExact_ ? maxRecordSize : longestRecord),
+        stream_(likelySize) {}
 
   std::vector<std::uint8_t> encode(const HeldEntries& entries) {
     putEntries(entries, 0);
@@ -294,8 +312,8 @@ class Encoder {
         for (const Value& element : value.elements()) putText(row.tag, element.text(), 0);
         break;
       case Write::nestedEach: putNestedEach(row.tag, value.array(), level); break;
-      case Write::tagGroup: putTagGroup(Dictionary::entriesOf(value)); break;
-      case Write::regGroup: putRegGroup(Dictionary::entriesOf(value)); break;
+      case Write::tagGroup: putGroup(tagRule, Dictionary::entriesOf(value)); break;
+      case Write::regGroup: putGroup(regRule, Dictionary::entriesOf(value)); break;
     }
   }
 
@@ -310,9 +328,9 @@ class Encoder {
     putNumber(tag, recordTypeOf(rule), word);
   }
 
-  // Texts go out in ASCII: one that is not, as zeros. `room` is what the size leaves for a NUL: with
-  // 0, kept on purpose for TIMC and for the elements of lists, a text whose length is a multiple of
-  // 4 fills its payload to the end.
+  // Texts go out in ASCII: one that is not, as zeros. `room` is what the size leaves for a NUL:
+  // with 0, kept on purpose for TIMC and for the elements of lists, a text whose length is a
+  // multiple of 4 fills its payload to the end.
   void putText(Tag tag, std::string_view text, std::uint32_t room) {
     const std::string_view kept = text.substr(0, maxCharacters);
     const bool isKept = isAscii(kept);
@@ -347,7 +365,7 @@ class Encoder {
   }
 
   void putData(const TagRow& row, std::span<const std::uint8_t> bytes) {
-    if (bytes.size() > maxRecordSize) return;
+    if (bytes.size() > mostSize_) return;
     const auto size = static_cast<std::uint32_t>(bytes.size());
     // Kept on purpose in the exact layout: a GUID's size is always 16, other sizes keep 16 bits; no
     // padding.
@@ -375,7 +393,7 @@ class Encoder {
   // Kept on purpose: the elements all go into the first word, so the last one stays there and the
   // others are zeros.
   void putIntegerArray(Tag tag, const Array& array) {
-    if (array.size() > maxRecordSize / 4) return;
+    if (array.size() > mostSize_ / 4) return;
     putHeader(tag, recordType::integerH, static_cast<std::uint32_t>(array.size() * 4));
     if (array.empty()) return;
     putWord(integer(array[array.size() - 1]));
@@ -419,18 +437,22 @@ class Encoder {
   // A nested stream, with the two integers of a control point before it unless `point` is null.
   // Left out if it is nested too deep or too large. Answers the stream's length, 0 if left out.
   std::uint32_t putNested(Tag tag, const HeldEntries& entries, int level, const Point* point) {
-    if (level + 1 >= maxNesting) return 0;
+    if (level + 1 >= maxNesting || stream_.size() > doomedFrom_) return 0;
     const std::size_t start = stream_.size();
     const std::uint32_t before = point == nullptr ? 0 : controlPointSize;
+    if (isTooLarge({entries.slots, level, before})) return 0;
     putHeader(tag, recordType::nested, 0);
     if (point != nullptr) {
       for (const std::uint32_t word : *point) putWord(word);
     }
     const std::size_t nestedStart = stream_.size();
+    const std::size_t mostLength = mostSize_ - before;
+    const std::size_t outerDoomedFrom = std::exchange(doomedFrom_, nestedStart + mostLength);
     putEntries(entries, level + 1);
+    doomedFrom_ = outerDoomedFrom;
     const std::size_t length = stream_.size() - nestedStart;
-    if (before + length > maxRecordSize) {
-      stream_.cut(start);
+    if (length > mostLength) {
+      leaveOut(start, {entries.slots, level, before});
       return 0;
     }
     // Kept on purpose in the exact layout: the length keeps 16 bits.
@@ -440,33 +462,38 @@ class Encoder {
     return static_cast<std::uint32_t>(length);
   }
 
-  void putTagGroup(const HeldEntries& group) {
-    for (std::size_t place = 0; place < group.count; ++place) {
-      if (group.isVacant(place)) continue;
-      putName("TAGN"_tag, group, place);
-      if (putShortText("TAGV"_tag, group.slots[place], group.block, 1)) continue;
-      Value value;
-      group.lend(value, place);
-      if (value.isText()) {
-        putText("TAGV"_tag, value.text(), 1);
-      } else {
-        putNumber("TAGV"_tag, recordType::integerL, integer(value));
-      }
-    }
+  // A nested dictionary, known by its slots, at a level, with so many bytes before it.
+  using Nested = std::tuple<const Slot*, int, std::uint32_t>;
+
+  bool isTooLarge(const Nested& nested) const {
+    return !tooLarge_.empty() && tooLarge_.contains(nested);
+  }
+  [[gnu::noinline]] void leaveOut(std::size_t start, const Nested& nested) {
+    stream_.cut(start);
+    tooLarge_.insert(nested);
   }
 
+  // How a group is written: the tag of its names, those of its values, and whether a text of a
+  // derived kind is written as text.
+  struct GroupRule {
+    Tag name, text, number;
+    bool takesDerivedText;
+  };
+  static constexpr GroupRule tagRule = {"TAGN"_tag, "TAGV"_tag, "TAGV"_tag, true};
   // Kept on purpose: a text goes out as a second name, and text of a derived kind as a number.
-  void putRegGroup(const HeldEntries& group) {
+  static constexpr GroupRule regRule = {"REGN"_tag, "REGN"_tag, "REGV"_tag, false};
+
+  void putGroup(const GroupRule& rule, const HeldEntries& group) {
     for (std::size_t place = 0; place < group.count; ++place) {
       if (group.isVacant(place)) continue;
-      putName("REGN"_tag, group, place);
-      if (putShortText("REGN"_tag, group.slots[place], group.block, 1)) continue;
+      putName(rule.name, group, place);
+      if (putShortText(rule.text, group.slots[place], group.block, 1)) continue;
       Value value;
       group.lend(value, place);
-      if (value.isText() && !value.isDerivedText()) {
-        putText("REGN"_tag, value.text(), 1);
+      if (value.isText() && (rule.takesDerivedText || !value.isDerivedText())) {
+        putText(rule.text, value.text(), 1);
       } else {
-        putNumber("REGV"_tag, recordType::integerL, integer(value));
+        putNumber(rule.number, recordType::integerL, integer(value));
       }
     }
   }
@@ -494,7 +521,14 @@ class Encoder {
   }
 
   const bool isExact_;
+  const std::uint32_t mostSize_;  // of a payload
   Output stream_;
+  // The size past which the nested stream that is being written will be left out, whatever follows:
+  // no more streams are nested in it then.
+  std::size_t doomedFrom_ = std::numeric_limits<std::size_t>::max();
+  // One dictionary may stand in many places. What is left out in one of them is not tried again in
+  // the others: where each holds the next one twice, that would never end.
+  std::set<Nested> tooLarge_;
 };
 
 }  // namespace

@@ -16,8 +16,9 @@ enum class Layout : std::uint8_t {
   // sizes by the low 16 bits, a GUID's size always 16. What is not a multiple of 4, or longer than
   // 65535 bytes, does not read back.
   exact,
-  // True sizes of 24 bits, every record padded to 4: all readers step over it rightly. The same as
-  // `exact` for dictionaries whose data are short and come in multiples of 4.
+  // True sizes, every record padded to 4 and none longer than readers step over: all of them find
+  // what follows it. The same as `exact` for dictionaries whose data are short and come in
+  // multiples of 4, and GUIDs of 16 bytes.
   readable,
 };
 
@@ -26,9 +27,11 @@ enum class Layout : std::uint8_t {
 // stream.
 //
 // Never fails over a value. A key that is no tag of four characters, or that the encoder has no
-// rule for, is dropped; so are a value of the wrong kind, a list of the wrong count, a record whose
-// size does not fit 24 bits, and streams nested deeper than maxNesting. Text is written in ASCII
-// and at most 255 characters long; a text with another character among those is written as zeros.
+// rule for, is dropped; so are a value of the wrong kind, a list of the wrong count, a record that
+// is too large, and streams nested deeper than maxNesting. Too large is a payload of more than
+// maxRecordSize bytes, and in the layout `readable` one of more than longestRecord: no reader would
+// step over it, for its length wraps. Text is written in ASCII and at most 255 characters long;
+// a text with another character among those is written as zeros.
 //
 // Answers nothing when there is no memory for the stream: half a dictionary never takes the place
 // of a whole one.

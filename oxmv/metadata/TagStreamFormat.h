@@ -4,8 +4,8 @@
 //   record := tag[4] size:u24le type:u8 payload[size] pad[0..3]
 //   marker := BF FE count:u16be
 //
-// A stream has no header, no count and no terminator. A record is padded to 4 bytes, counted from its
-// start. No marker stands before the first record.
+// A stream has no header, no count and no terminator. A record is padded to 4 bytes, counted from
+// its start. No marker stands before the first record.
 //
 // A record's length, from its start to the next record's, keeps 24 bits: sizes of 0xFFFFF5 and more
 // wrap to a length of 0, 4 or 8. Kept on purpose: readers everywhere step like this, so a stream

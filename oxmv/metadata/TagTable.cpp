@@ -17,9 +17,11 @@ namespace {
 // clang-format off
 // Odd rows that are kept on purpose:
 // - GHTL and GHTR are written and never read; AFMT and CTFO are known and do neither.
-// - MKGD has the label "Mark good take", but the tag that is written and read is MRKG, which has none.
+// - MKGD has the label "Mark good take", but the tag that is written and read is MRKG, which has
+//   none.
 // - DTAG is read and written as text, but accepts only a number by key.
-// - "TAG " and "REG " are keys of groups, and never the tag of a record; TAGN, TAGV, REGN and REGV are the reverse.
+// - "TAG " and "REG " are keys of groups, and never the tag of a record; TAGN, TAGV, REGN and REGV
+//   are the reverse.
 constexpr auto rows = std::to_array<TagRow>({
     {"ACDL"_tag, Read::int32, Write::integerH, Accept::number},
     {"AFFI"_tag, Read::int32, Write::integerL, Accept::number},

@@ -127,9 +127,9 @@ const TagRow* findTagRow(Tag tag) noexcept;
 
 namespace detail {
 
-// How a record becomes a slot, as numbers to calculate with: where a record of `tag` has a size from
-// `least` to `least + range`, and all of its payload is there, the masks and the form make it. Of
-// tags whose records need more than that no size is in the range.
+// How a record becomes a slot, as numbers to calculate with: where a record of `tag` has a size
+// from `least` to `least + range`, and all of its payload is there, the masks and the form make it.
+// Of tags whose records need more than that no size is in the range.
 struct PlainRule {
   Tag tag{};
   Read read = Read::none;

@@ -17,7 +17,8 @@
 
 namespace oxmv::detail {
 
-// A vector whose first items stand in itself: most streams need no more, and so nothing of the heap.
+// A vector whose first items stand in itself: most streams need no more, and so nothing of the
+// heap.
 template <class T, std::size_t inItself>
 class Scratch {
   static_assert(std::is_trivially_copyable_v<T> && std::is_trivially_destructible_v<T>);

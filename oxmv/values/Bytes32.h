@@ -113,7 +113,8 @@ class Bytes32 {
            static_cast<std::uint32_t>(_mm_movemask_epi8(second)) << 16;
   }
 
-  // As many bytes that keep as bytes that clear: the mask of `count` begins so far before the middle.
+  // As many bytes that keep as bytes that clear: the mask of `count` begins so far before the
+  // middle.
   static constexpr auto masks = [] {
     std::array<std::uint8_t, 2 * size> made{};
     for (std::size_t i = 0; i < size; ++i) made[i] = 0xFF;

@@ -62,9 +62,9 @@ Value Dictionary::renewTable(std::size_t more) {
   return std::exchange(value_, Value(Slot::scalar(Form::dictionaryBox, 0), table.detach()));
 }
 
-// Without memory for it the table stays as it is; the next removal tries again.
+// Without memory for it the table stays as it is; the next change tries again.
 void Dictionary::compact() noexcept {
-  if (!ownTable().isSparse()) return;
+  if (!ownTable().isWasteful()) return;
   try {
     renewTable(fewMore);
   } catch (const std::bad_alloc&) {
@@ -95,7 +95,24 @@ void Dictionary::Iterator::arriveInTable() {
   entries.lend(entry_.value, place_);
 }
 
-bool Dictionary::contains(std::string_view key) const { return !(*this)[key].isNothing(); }
+std::optional<std::size_t> Dictionary::placeOf(std::string_view key) const {
+  if (isTable()) return table() == nullptr ? std::nullopt : table()->find(key);
+  if (value_.isNothing()) return std::nullopt;
+  const std::uint32_t header = value_.slot_.body();
+  const Slot* slot = value_.block().find(header, key);
+  if (slot == nullptr) return std::nullopt;
+  return static_cast<std::size_t>(slot - value_.block().items(header));
+}
+
+bool Dictionary::lend(Value& value, std::string_view key) const {
+  const auto place = placeOf(key);
+  if (place) entries().lend(value, *place);
+  return place.has_value();
+}
+
+bool Dictionary::contains(std::string_view key) const {
+  return placeOf(KeyText(key).text()).has_value();
+}
 
 Value Dictionary::operator[](std::string_view key) const {
   const KeyText wanted(key);
@@ -118,12 +135,13 @@ bool Dictionary::set(std::string_view key, Value value) {
     before = renewTable(std::max(fewMore, size()));
   }
   ownTable().set(wanted.text(), std::move(value));
+  compact();
   return true;
 }
 
 bool Dictionary::remove(std::string_view key) {
   const KeyText wanted(key);
-  if (!contains(wanted.text())) return false;
+  if (!placeOf(wanted.text())) return false;
   Value before;  // whose own key this may be
   if (!ownsTable()) before = renewTable(fewMore);
   ownTable().remove(*ownTable().find(wanted.text()));

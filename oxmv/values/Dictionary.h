@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <initializer_list>
 #include <iterator>
+#include <optional>
 #include <string_view>
 #include <utility>
 
@@ -68,6 +69,12 @@ class Dictionary {
   explicit Dictionary(Value value) noexcept : value_(std::move(value)) {}
 
   bool isTable() const noexcept { return value_.slot_.form() == detail::Form::dictionaryBox; }
+  // Where `key`, in UTF-8, stands in the order.
+  std::optional<std::size_t> placeOf(std::string_view key) const;
+  // `value` becomes that of `key`, in UTF-8, and stays as it was if there is none; see
+  // Value::borrow. Answers whether there is.
+  bool lend(Value& value, std::string_view key) const;
+
   const detail::Table* table() const noexcept;
   bool ownsTable() const noexcept;
   detail::Table& ownTable() noexcept;

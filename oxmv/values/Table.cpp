@@ -11,26 +11,43 @@ namespace {
 // need no index.
 constexpr std::size_t searchedInLine = 256;
 
-// How many values and names of `entries` do not stay in their block.
-std::size_t countOwned(const HeldEntries& entries) {
+bool isOwn(Slot slot) { return slot.form() == HeldEntries::ownForm; }
+
+// Whether the value's payload stands in the block: not that of a number, which the slot holds.
+bool isInBlock(Slot slot) { return slot.form() >= Form::text && !isOwn(slot); }
+
+std::size_t countInBlock(const HeldEntries& entries) {
+  return static_cast<std::size_t>(
+      std::count_if(entries.slots, entries.slots + entries.count, isInBlock));
+}
+
+// How many values and names a table of `entries` has for itself.
+std::size_t countOwned(const HeldEntries& entries, bool keepsBlock) {
   const auto isName = [](const Key& key) { return !key.isTag(); };
-  const auto isOwn = [](Slot slot) { return slot.form() == HeldEntries::ownForm; };
   auto count = std::count_if(entries.keys, entries.keys + entries.count, isName);
-  if (entries.own != nullptr)
+  if (!keepsBlock) {
+    count += static_cast<std::ptrdiff_t>(entries.count);
+  } else if (entries.own != nullptr) {
     count += std::count_if(entries.slots, entries.slots + entries.count, isOwn);
+  }
   return static_cast<std::size_t>(count);
 }
 
 }  // namespace
 
 Ref<Table> Table::make(const HeldEntries& from, std::size_t more) {
-  const std::size_t owned = countOwned(from);
+  const std::size_t inBlock = countInBlock(from);
+  // Where nothing stands in the block it is left, and numbers in slots become the table's own.
+  const std::size_t owned = countOwned(from, inBlock != 0);
   const std::size_t mostPlaces = from.count + more;
   const std::size_t mostOwned = owned + more + 1;
   auto table = Ref<Table>::adopt(new (mostPlaces, mostOwned) Table(mostPlaces, mostOwned));
-  if (from.block != nullptr) from.block->retain();
-  table->base_ = Ref<const Block>::adopt(from.block);
-  table->streamSize_ = from.streamSize;
+  if (inBlock != 0) {
+    from.block->retain();
+    table->base_ = Ref<const Block>::adopt(from.block);
+    table->streamSize_ = from.streamSize;
+    table->inBlock_ = inBlock;
+  }
   if (from.own == nullptr && owned == 0) {
     table->takeOverAll(from);
   } else {
@@ -67,9 +84,8 @@ void Table::takeOverEach(const HeldEntries& from) {
     if (from.isVacant(place)) continue;
     const Key key = from.keys[place];
     const Slot slot = from.slots[place];
-    const bool isOwn = slot.form() == HeldEntries::ownForm;
     std::construct_at(keys_ + places_, key.isTag() ? key : keptName(from.nameValue(place)));
-    std::construct_at(slots_ + places_, isOwn ? kept(from.own[slot.body()]) : slot);
+    std::construct_at(slots_ + places_, isOwn(slot) || !base_ ? kept(from.value(place)) : slot);
     ++places_;
   }
 }
@@ -94,9 +110,10 @@ std::optional<std::size_t> Table::find(std::string_view key) const {
 
 void Table::set(std::string_view key, Value value) {
   const auto place = find(key);
-  if (place && slots_[*place].form() == HeldEntries::ownForm) {
+  if (place && isOwn(slots_[*place])) {
     own_[slots_[*place].body()] = std::move(value);
   } else if (place) {
+    vacate(slots_[*place]);
     slots_[*place] = kept(std::move(value));
   } else {
     append(key, std::move(value));
@@ -125,10 +142,15 @@ void Table::append(std::string_view key, Value value) {
 
 void Table::remove(std::size_t place) noexcept {
   if (index_) index_->erase(static_cast<std::uint32_t>(place));
-  Slot& slot = slots_[place];
-  if (slot.form() == HeldEntries::ownForm) own_[slot.body()] = Value();
-  slot = Slot();
+  vacate(slots_[place]);
   ++vacant_;
+}
+
+// What stood there is no value of the table any more.
+void Table::vacate(Slot& slot) noexcept {
+  if (isOwn(slot)) own_[slot.body()] = Value();
+  if (isInBlock(slot)) --inBlock_;
+  slot = Slot();
 }
 
 Slot Table::kept(Value value) noexcept {

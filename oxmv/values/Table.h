@@ -27,8 +27,8 @@ namespace oxmv::detail {
 
 class Table final : public Shared {
  public:
-  // The same entries, none vacant, and room for at least one more; for `more`, unless their keys are
-  // no tags. Copies no payload.
+  // The same entries, none vacant, and room for at least one more; for `more`, unless their keys
+  // are no tags. Copies no payload, and keeps the block only if something stands there.
   static Ref<Table> make(const HeldEntries& from, std::size_t more);
   ~Table() override;
 
@@ -36,8 +36,9 @@ class Table final : public Shared {
   std::size_t size() const { return places_ - vacant_; }
   // Whether one more value may be set, under whatever key.
   bool hasRoom() const { return places_ < mostPlaces_ && owned_ + 2 <= mostOwned_; }
-  // Whether going through the entries means going past vacant places most of the time.
-  bool isSparse() const { return vacant_ >= size() + 32; }
+  // Whether to make it anew would spare something: going through the entries means going past
+  // vacant places most of the time, or nothing stands in the block any more.
+  bool isWasteful() const { return vacant_ >= size() + 32 || (base_ && inBlock_ == 0); }
 
   // `key` is in UTF-8.
   std::optional<std::size_t> find(std::string_view key) const;
@@ -72,6 +73,7 @@ class Table final : public Shared {
   void takeOverAll(const HeldEntries& from) noexcept;
   void takeOverEach(const HeldEntries& from);
   void append(std::string_view key, Value value);
+  void vacate(Slot& slot) noexcept;
   Slot kept(Value value) noexcept;
   Key keptName(Value name) noexcept;
   void buildIndex();
@@ -82,7 +84,8 @@ class Table final : public Shared {
   Key* const keys_;
   std::size_t owned_ = 0;
   std::size_t places_ = 0;
-  std::size_t vacant_ = 0;  // of those
+  std::size_t vacant_ = 0;   // of those
+  std::size_t inBlock_ = 0;  // of those: whose values stand in the block
   Ref<const Block> base_;
   std::size_t streamSize_ = 0;
   std::optional<Index> index_;

@@ -3,6 +3,9 @@
 #include <algorithm>
 #include <bit>
 #include <limits>
+#include <set>
+#include <utility>
+#include <vector>
 
 #include "oxmv/values/Array.h"
 #include "oxmv/values/Bytes32.h"
@@ -176,52 +179,82 @@ Dictionary Value::dictionary() const {
   return kind() == Kind::dictionary ? Dictionary(*this) : Dictionary();
 }
 
-// What is equal but for the elements and entries of two containers; those are put into `rest`, to
-// be compared in their turn: values may be nested deeper than a stack is.
-bool Value::equalOutside(const Value& a, const Value& b, Pairs& rest) {
-  if (a.kind() != b.kind()) return false;
-  switch (a.kind()) {
-    case Kind::nothing: return true;
-    case Kind::integer: return a.int64Value() == b.int64Value();
-    case Kind::float32: return a.slot_.body() == b.slot_.body();
-    case Kind::float64:
-      return std::bit_cast<std::uint64_t>(a.content_.float64) ==
-             std::bit_cast<std::uint64_t>(b.content_.float64);
-    case Kind::text:
-    case Kind::data: return std::ranges::equal(a.payload(), b.payload());
-    case Kind::array:
-    case Kind::dictionary: rest.emplace_back(a, b); return true;
+// One comparison. Values may be nested deeper than a stack is, and the same one may stand in many
+// places: containers wait for their turn, and none waits twice for the same other one.
+class Value::Comparison {
+ public:
+  bool areEqual(const Value& a, const Value& b) {
+    if (!areEqualOutside(a, b)) return false;
+    while (!rest_.empty()) {
+      const auto [x, y] = std::move(rest_.back());
+      rest_.pop_back();
+      const bool isEqual = x.kind() == Kind::array ? areEqualInside(x.array(), y.array())
+                                                   : areEqualInside(x.dictionary(), y.dictionary());
+      if (!isEqual) return false;
+    }
+    return true;
   }
-  return false;
-}
 
-bool Value::equalInside(const Array& a, const Array& b, Pairs& rest) {
-  if (a.size() != b.size()) return false;
-  for (std::size_t i = 0; i < a.size(); ++i) {
-    if (!equalOutside(a[i], b[i], rest)) return false;
+ private:
+  // Whether they are equal but for what stands in two containers.
+  bool areEqualOutside(const Value& a, const Value& b) {
+    if (a.kind() != b.kind()) return false;
+    switch (a.kind()) {
+      case Kind::nothing: return true;
+      case Kind::integer: return a.int64Value() == b.int64Value();
+      case Kind::float32: return a.slot_.body() == b.slot_.body();
+      case Kind::float64:
+        return std::bit_cast<std::uint64_t>(a.content_.float64) ==
+               std::bit_cast<std::uint64_t>(b.content_.float64);
+      case Kind::text:
+      case Kind::data: return std::ranges::equal(a.payload(), b.payload());
+      case Kind::array:
+      case Kind::dictionary: queue(a, b); return true;
+    }
+    return false;
   }
-  return true;
-}
 
-bool Value::equalInside(const Dictionary& a, const Dictionary& b, Pairs& rest) {
-  return a.size() == b.size() &&
-         std::all_of(a.begin(), a.end(), [&](const Dictionary::Entry& entry) {
-           return equalOutside(entry.value, b[entry.key], rest);
-         });
-}
-
-bool operator==(const Value& a, const Value& b) {
-  std::vector<std::pair<Value, Value>> rest;
-  if (!Value::equalOutside(a, b, rest)) return false;
-  while (!rest.empty()) {
-    const auto [x, y] = std::move(rest.back());
-    rest.pop_back();
-    const bool isEqual = x.kind() == Value::Kind::array
-                             ? Value::equalInside(x.array(), y.array(), rest)
-                             : Value::equalInside(x.dictionary(), y.dictionary(), rest);
-    if (!isEqual) return false;
+  bool areEqualInside(const Array& a, const Array& b) {
+    if (a.size() != b.size()) return false;
+    auto other = b.begin();
+    for (const Value& element : a) {
+      if (!areEqualOutside(element, *other)) return false;
+      ++other;
+    }
+    return true;
   }
-  return true;
-}
+
+  bool areEqualInside(const Dictionary& a, const Dictionary& b) {
+    if (a.size() != b.size()) return false;
+    Value other;
+    for (const auto& [key, value] : a) {
+      if (!b.lend(other, key) || !areEqualOutside(value, other)) return false;
+    }
+    return true;
+  }
+
+  void queue(const Value& a, const Value& b) {
+    const bool isSame = a.slot_.kept() == b.slot_.kept() && a.owner() == b.owner();
+    if (isSame || isQueued(a, b)) return;
+    rest_.emplace_back(a, b);
+  }
+
+  // Whether these two have been queued before. That is remembered only where they may come again:
+  // what nobody else has stands in one place, and so does what stands in a block.
+  bool isQueued(const Value& a, const Value& b) {
+    if (!isBox(a) || !isBox(b)) return false;
+    if (a.owner()->isUnique() && b.owner()->isUnique()) return false;
+    return !queued_.emplace(a.owner(), b.owner()).second;
+  }
+  static bool isBox(const Value& value) {
+    const Form form = value.slot_.form();
+    return (form == Form::arrayBox || form == Form::dictionaryBox) && value.owner() != nullptr;
+  }
+
+  std::vector<std::pair<Value, Value>> rest_;
+  std::set<std::pair<const detail::Shared*, const detail::Shared*>> queued_;
+};
+
+bool operator==(const Value& a, const Value& b) { return Value::Comparison().areEqual(a, b); }
 
 }  // namespace oxmv

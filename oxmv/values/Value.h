@@ -218,10 +218,7 @@ class Value {
   static Value whole(detail::Form form, std::span<const std::uint8_t> bytes);
   static Value wholeText(detail::Form form, std::string_view text);
 
-  using Pairs = std::vector<std::pair<Value, Value>>;
-  static bool equalOutside(const Value& a, const Value& b, Pairs& rest);
-  static bool equalInside(const Array& a, const Array& b, Pairs& rest);
-  static bool equalInside(const Dictionary& a, const Dictionary& b, Pairs& rest);
+  class Comparison;
 
   const detail::Shared* owner() const noexcept {
     return slot_.form() >= detail::Form::text ? content_.owner : nullptr;

@@ -188,14 +188,36 @@ TEST(Losses, NamesSizesThatKeepSixteenBits) {
   EXPECT_EQ(losses({{"COL1", Dictionary{{"FREE", bytes(65524)}}}}), Found());
 }
 
-TEST(Losses, NamesWhatNoRecordHolds) {
-  const std::size_t most = 0xFFFFFF;
-  EXPECT_EQ(losses({{"FREE", bytes(most + 1)}}), Found{"size-24bit FREE"});
-  EXPECT_EQ(losses({{"FREE", bytes(most + 1)}}, Layout::readable), Found{"size-24bit FREE"});
-  EXPECT_EQ(losses({{"COL1", Dictionary{{"FREE", bytes(most)}}}}, Layout::readable),
-            Found{"size-24bit COL1"});
-  EXPECT_EQ(losses({{"SNID", Array(std::vector<Value>(most / 4 + 1, Value(0)))}}),
-            Found{"size-24bit SNID"});
+// Such a record would be read, and what follows it would not.
+TEST(Losses, NamesWhatNoRecordThatIsSteppedOverHolds) {
+  const std::size_t most = 0xFFFFF4;
+  for (const Layout layout : {Layout::exact, Layout::readable}) {
+    for (const std::size_t size : {most + 4, most + 8, most + 12}) {
+      EXPECT_EQ(losses({{"FREE", bytes(size)}, {"TAKE", 1}}, layout), Found{"size-24bit FREE"})
+          << size;
+    }
+    EXPECT_EQ(losses({{"COL1", Dictionary{{"FREE", bytes(most - 4)}}}}, layout),
+              Found{"size-24bit COL1"});
+    EXPECT_EQ(
+        losses({{"SNID", Array(std::vector<Value>(most / 4 + 1, Value(7)))}, {"TAKE", 1}}, layout),
+        Found{"size-24bit SNID"});
+  }
+  EXPECT_EQ(losses({{"GUID", bytes(most + 1)}}, Layout::readable), Found{"size-24bit GUID"});
+  EXPECT_EQ(losses({{"FREE", bytes(most + 1)}, {"TAKE", 1}}),
+            (Found{"size-24bit FREE", "data-unaligned FREE!"}));
+  EXPECT_EQ(losses({{"FREE", bytes(most)}, {"TAKE", 1}}, Layout::readable), Found());
+  EXPECT_EQ(
+      losses({{"COL1", Dictionary{{"FREE", bytes(most - 8)}}}, {"COL2", Dictionary{{"TAKE", 1}}}},
+             Layout::readable),
+      Found());
+}
+
+// Nothing but its own size tells that it does harm: it is read as it was, for all are zeros.
+TEST(Losses, NamesAListOfIntegersThatHidesWhatFollows) {
+  const auto zeros = [](std::size_t count) { return Array(std::vector<Value>(count, Value(0))); };
+  EXPECT_EQ(losses({{"SNID", zeros(0xFFFFF4 / 4)}, {"TAKE", 1}}), Found());
+  EXPECT_EQ(losses({{"SNID", zeros(0xFFFFF4 / 4 + 1)}, {"TAKE", 1}}), Found{"size-24bit SNID"});
+  EXPECT_EQ(losses({{"SNID", zeros(0xFFFFF4 / 4 + 1)}}), Found());
 }
 
 TEST(Losses, NamesGuidsThatAreNotOfSixteenBytes) {

@@ -122,6 +122,11 @@ TEST(TagStreamEncoderNested, ControlPointWithoutExactlyTwoIntegersHasZeros) {
         << testing::PrintToString(data);
   }
   EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(Dictionary())}}), zeros);
+  EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(Dictionary{{"another name", Array::of(5, 6)}})}}),
+            zeros);
+  Dictionary removed{{"CTLPData", Array::of(5, 6)}};
+  removed.remove("CTLPData");
+  EXPECT_EQ(encoded(Dictionary{{"CTLp", Array::of(removed)}}), zeros);
 }
 
 TEST(TagStreamEncoderNested, KeepsControlPointsUnpadded) {
@@ -176,20 +181,50 @@ TEST(TagStreamEncoderNested, ReadableSizeHas24Bits) {
   }
 }
 
-TEST(TagStreamEncoderNested, IsWrittenWhileItsSizeHas24Bits) {
+TEST(TagStreamEncoderNested, IsReadableWhileReadersStepOverIt) {
   for (const auto& [tag, around, before] : everyNested) {
-    // 0xFFFFFC is the largest size of 24 bits that is a multiple of 4.
-    const std::size_t largest = 0xFFFFFC - before - 8;
-    const Bytes stream =
-        encoded(Dictionary{{tag, around(Dictionary{{"FREE", dataOf(largest)}})}}, Layout::readable);
-    EXPECT_EQ(headerOf(stream), header(tag, 0xFFFFFC)) << tag;
+    const std::size_t largest = 0xFFFFF4 - before - 8;
+    const auto encodedOf = [&, make = around, key = tag](std::size_t size) {
+      return encoded(Dictionary{{key, make(Dictionary{{"FREE", dataOf(size)}})}}, Layout::readable);
+    };
+    EXPECT_EQ(headerOf(encodedOf(largest)), header(tag, 0xFFFFF4)) << tag;
+    EXPECT_EQ(encodedOf(largest + 1), tag == "CTLp"sv ? Bytes(8, 0) : Bytes()) << tag;
+  }
+}
 
-    for (const Layout layout : bothLayouts) {
-      Bytes expected = StreamBuilder().record("TAKE", 'B', 1).bytes();
-      if (tag == "CTLp"sv) expected.insert(expected.end(), 8, 0);
-      const Dictionary tooLarge{{"FREE", dataOf(largest + 4)}};
-      EXPECT_EQ(encoded(Dictionary{{"TAKE", 1}, {tag, around(tooLarge)}}, layout), expected) << tag;
-    }
+TEST(TagStreamEncoderNested, IsWrittenExactlyWhileItsSizeHas24Bits) {
+  for (const auto& [tag, around, before] : everyNested) {
+    // The low 16 bits of the stream's length, and the two integers of a control point.
+    const auto written = static_cast<std::uint32_t>(((0xFFFFFF - before) & 0xFFFF) + before);
+    const std::size_t largest = 0xFFFFFF - before - 8;
+    const auto encodedOf = [&, make = around, key = tag](std::size_t size) {
+      return encoded(Dictionary{{key, make(Dictionary{{"FREE", dataOf(size)}})}});
+    };
+    EXPECT_EQ(headerOf(encodedOf(largest)), header(tag, written)) << tag;
+    EXPECT_EQ(encodedOf(largest + 1), tag == "CTLp"sv ? Bytes(8, 0) : Bytes()) << tag;
+  }
+}
+
+// The encoder gathers records in pieces of some thousand bytes, and a stream's size is known only
+// when its header may have left: it stands at every place at the end of such a piece, and across
+// it.
+TEST(TagStreamEncoderNested, HasItsSizeWhereverItsHeaderStands) {
+  const Dictionary inner{{"KWRd", Array(std::vector<Value>(1000, Value("ABCDEFGH")))}};
+  StreamBuilder keywords;
+  for (int i = 0; i < 1000; ++i) keywords.record("KWRd", 'c', "ABCDEFGH"sv);
+  for (std::size_t more = 0; more <= 512; ++more) {
+    Dictionary tags;
+    StreamBuilder expected;
+    const auto fill = [&](const char* tag, std::size_t size) {
+      tags.set(tag, dataOf(size));
+      expected.header(tag, static_cast<std::uint32_t>(size), 'c').raw(Bytes(size, 0xAB));
+    };
+    for (const char* tag : {"FREE", "NOPP", "DPXI", "DPXM", "DPXO", "DPXT"}) fill(tag, 508);
+    fill("DPXU", more);  // from 3104 to 3616 bytes
+    tags.set("COL1", Dictionary{{"COL2", inner}, {"DSPm", Array::of(inner)}});
+    expected.header("COL1", 2 * (8 + 16'000), 0);
+    for (const char* tag : {"DSPm", "COL2"}) expected.header(tag, 16'000, 0).raw(keywords.bytes());
+    ASSERT_TRUE(encoded(tags, Layout::exact) == expected.bytes()) << more;
   }
 }
 
@@ -198,6 +233,67 @@ TEST(TagStreamEncoderNested, OneThatIsTooLargeLeavesTheOthers) {
   const Dictionary small{{"TAKE", 1}};
   EXPECT_EQ(encoded(Dictionary{{"DSPm", Array::of(small, tooLarge, small)}, {"COL1", tooLarge}}),
             encoded(Dictionary{{"DSPm", Array::of(small, small)}}));
+}
+
+// One dictionary in many places.
+
+// Each level holds the one within it twice.
+Dictionary doubled(int levels) {
+  Dictionary tags;
+  for (int level = 0; level < levels; ++level) {
+    const Dictionary inner = tags;
+    tags.set("COL1", inner);
+    tags.set("COL2", inner);
+  }
+  return tags;
+}
+
+TEST(TagStreamEncoderNested, DoublesWithEveryLevelWhileThatFits) {
+  EXPECT_EQ(encoded(doubled(2)), (Bytes{'C', 'O', 'L', '1', 16, 0, 0, 0,  //
+                                        'C', 'O', 'L', '1', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 16, 0, 0, 0,  //
+                                        'C', 'O', 'L', '1', 0,  0, 0, 0,  //
+                                        'C', 'O', 'L', '2', 0,  0, 0, 0}));
+}
+
+// The twenty-first from within would take 32 MB, and is left out half a million times: as if the
+// twenty-second were empty.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeInManyPlacesIsTriedOnce) {
+  const Bytes stream = encoded(doubled(40));
+  EXPECT_EQ(stream.size(), 16u * ((1u << 18) - 1));
+  EXPECT_TRUE(stream == encoded(doubled(18)));
+  EXPECT_TRUE(encoded(doubled(34), Layout::readable) == encoded(doubled(12), Layout::readable));
+}
+
+// A list that holds the same dictionary a million times: no more of them are written than it takes
+// to see that they are too many.
+TEST(TagStreamEncoderNested, ListThatIsTooLargeIsNotWrittenToItsEnd) {
+  const Dictionary element{{"FREE", dataOf(1'000'000)}};
+  const Dictionary list{{"DSPm", Array(std::vector<Value>(1'000'000, Value(element)))}};
+  EXPECT_EQ(encoded(Dictionary{{"COL1", list}, {"TAKE", 1}}),
+            StreamBuilder().record("TAKE", 'B', 1).bytes());
+}
+
+// What is too large at one level need not be so a level deeper, where less of it is written.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeAtALevelIsTriedAtOthers) {
+  const Value tenMegabytes = dataOf(10'000'000);
+  Dictionary inner{{"FREE", tenMegabytes}};
+  for (int level = 1; level < 62; ++level) inner = {{"COL1", inner}};
+  const Dictionary tags{{"FREE", tenMegabytes}, {"COL1", inner}};
+  EXPECT_EQ(encoded(Dictionary{{"COL1", tags}}), Bytes());
+  const Bytes deeper = encoded(Dictionary{{"COL2", Dictionary{{"COL1", tags}}}});
+  EXPECT_GT(deeper.size(), 10'000'000u);
+  EXPECT_TRUE(encoded(Dictionary{{"COL1", tags}, {"COL2", Dictionary{{"COL1", tags}}}}) == deeper);
+}
+
+// What is too large behind the two integers of a control point need not be so without them.
+TEST(TagStreamEncoderNested, OneThatIsTooLargeAsAControlPointIsTriedElsewhere) {
+  const Dictionary large{{"FREE", dataOf(0xFFFFFC - 8)}};
+  const Dictionary tags{{"COL1", Dictionary{{"CTLp", Array::of(large)}}},
+                        {"COL2", Dictionary{{"COL1", large}, {"TAKE", 1}}}};
+  // So the second is too large with it, and not written without it.
+  EXPECT_EQ(encoded(tags), StreamBuilder().record("COL1", 0, Bytes(8, 0)).bytes());
 }
 
 // Depth: the outermost stream is level 0, and there are 64.

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <optional>
 #include <random>
 #include <string>
 #include <string_view>
@@ -128,7 +129,8 @@ Dictionary changedAndBack(const Dictionary& tags) {
 // In a table, every second value its own, beside places that are vacant.
 Dictionary halfReplaced(const Dictionary& tags) {
   Dictionary changed{
-      {"PRCS", 1}, {"a key of its own", 2}, {"KWRd", Array()}, {"COL1", Dictionary()}};
+      {"PRCS", 1}, {"a key of its own", 2}, {"KWRd", Array()}, {"COL1", Dictionary()},
+      {"TAKE", 3}, {"SATU", 0.5f},          {"DTIN", 4}};
   for (const Names before = keys(changed); const std::string& key : before) changed.remove(key);
   for (const auto& [key, value] : tags) changed.set(key, value);
   bool isSecond = false;
@@ -139,12 +141,22 @@ Dictionary halfReplaced(const Dictionary& tags) {
   return changed;
 }
 
+// In a table that has left the block, for nothing stands there but numbers.
+Dictionary allButNumbersReplaced(const Dictionary& tags) {
+  Dictionary changed = tags;
+  for (const auto& [key, value] : tags) {
+    if (!value.isNumber()) changed.set(key, apart(value));
+  }
+  return changed;
+}
+
 void expectSameBytes(const Dictionary& tags) {
   for (const Layout layout : {Layout::exact, Layout::readable}) {
     const Bytes stream = encoded(tags, layout);
     ASSERT_EQ(encoded(apart(tags).dictionary(), layout), stream);
     ASSERT_EQ(encoded(changedAndBack(tags), layout), stream);
     ASSERT_EQ(encoded(halfReplaced(tags), layout), stream);
+    ASSERT_EQ(encoded(allButNumbersReplaced(tags), layout), stream);
   }
 }
 
@@ -190,6 +202,18 @@ TEST(TagStreamEncoderPaths, GroupEntriesUnderNamesOfTagsAreNoPlainValues) {
   expectSameBytes(tags["REG "].dictionary());
 }
 
+TEST(TagStreamEncoderPaths, RemovedEntriesOfGroupsAreNotWritten) {
+  for (const char* key : {"TAG ", "REG "}) {
+    Dictionary group{{"first", 1}, {"a text", "x"}, {"last", 3}};
+    const Dictionary left{{"a text", "x"}};
+    group.remove("first");
+    group.remove("last");
+    EXPECT_EQ(encoded(Dictionary{{key, group}}), encoded(Dictionary{{key, left}}));
+    group.remove("a text");
+    EXPECT_EQ(encoded(Dictionary{{key, group}}), Bytes());
+  }
+}
+
 // Memory.
 
 std::size_t allocationsOf(const Dictionary& tags) {
@@ -221,6 +245,36 @@ TEST(TagStreamEncoderPaths, StreamOfAPartTakesNoMoreMemoryThanThatPart) {
   const auto stream = encodeStream(part);
   EXPECT_LT(meter.peak(), 1000u);
   EXPECT_EQ(stream, nested);
+}
+
+// A dictionary of which nearly all was removed since it was decoded.
+Dictionary littleIsLeft(std::size_t removed) {
+  StreamBuilder builder;
+  for (int i = 0; i < 1000; ++i) builder.record("KWRd", 'c', "ABCDEFGH");
+  builder.record("FREE", 'c', std::string(removed, 'x'));
+  Dictionary tags = decoded(builder.bytes());
+  tags.remove("FREE");
+  return tags;
+}
+
+TEST(TagStreamEncoderPaths, StreamOfWhatIsLeftKeepsNoMoreMemoryThanThat) {
+  for (const std::size_t removed : {0u, 15'000u, 17'000u, 1'000'000u}) {
+    const auto stream = encodeStream(littleIsLeft(removed));
+    ASSERT_TRUE(stream);
+    EXPECT_EQ(stream->size(), 16'000u);
+    EXPECT_LE(stream->capacity(), 32'000u) << removed;
+  }
+}
+
+TEST(TagStreamEncoderPaths, MemoryForWhatIsLeftIsEnough) {
+  const Dictionary tags = littleIsLeft(1'000'000);
+  const Bytes expected = encoded(tags);
+  std::optional<Bytes> stream;
+  {
+    const LargeMemoryShortage shortage(100'000);
+    stream = encodeStream(tags);
+  }
+  EXPECT_EQ(stream, expected);
 }
 
 }  // namespace

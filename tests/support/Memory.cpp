@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstddef>
 #include <cstdlib>
+#include <limits>
 #include <new>
 
 #include <malloc.h>
@@ -17,11 +18,13 @@ struct Account {
   bool isLimited = false;
   bool shortageFelt = false;
   std::size_t granted = 0;
+  std::size_t largest = std::numeric_limits<std::size_t>::max();
 };
 
 thread_local Account account;
 
 void* take(std::size_t size, std::align_val_t alignment = {}) noexcept {
+  if (size > account.largest) return nullptr;
   if (account.isLimited) {
     if (account.granted == 0) {
       account.shortageFelt = true;
@@ -120,5 +123,11 @@ MemoryShortage::MemoryShortage(std::size_t granted) {
 MemoryShortage::~MemoryShortage() { account.isLimited = false; }
 
 bool MemoryShortage::wasFelt() const { return account.shortageFelt; }
+
+LargeMemoryShortage::LargeMemoryShortage(std::size_t most) { account.largest = most; }
+
+LargeMemoryShortage::~LargeMemoryShortage() {
+  account.largest = std::numeric_limits<std::size_t>::max();
+}
 
 }  // namespace oxmv::test

@@ -36,4 +36,14 @@ class MemoryShortage {
   bool wasFelt() const;
 };
 
+// While it lives, allocations of this thread of more than `most` bytes fail. One at a time on a
+// thread.
+class LargeMemoryShortage {
+ public:
+  explicit LargeMemoryShortage(std::size_t most);
+  ~LargeMemoryShortage();
+  LargeMemoryShortage(const LargeMemoryShortage&) = delete;
+  LargeMemoryShortage& operator=(const LargeMemoryShortage&) = delete;
+};
+
 }  // namespace oxmv::test
