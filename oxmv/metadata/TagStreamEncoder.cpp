@@ -95,10 +95,10 @@ class Output {
     return offset < stream_.size() ? stream_.data() + offset
                                    : chunk_.data() + (offset - stream_.size());
   }
-  // Takes back all bytes from `size` on.
+  // Takes back all bytes from `size` on, which are more than a chunk holds.
   void cut(std::size_t size) {
-    filled_ = size > stream_.size() ? size - stream_.size() : 0;
-    stream_.resize(std::min(size, stream_.size()));
+    filled_ = 0;
+    stream_.resize(size);
   }
 
   std::vector<std::uint8_t> take() {
@@ -429,7 +429,7 @@ class Encoder {
     const std::size_t nestedStart = stream_.size();
     putEntries(entries, level + 1);
     const std::size_t length = stream_.size() - nestedStart;
-    if (before + length > maxRecordSize) {
+    if (before + length > maxRecordSize) {  // so far more than a chunk holds
       stream_.cut(start);
       return 0;
     }
