@@ -43,6 +43,8 @@ TEST(Array, IteratesOverAllElements) {
   EXPECT_EQ(*place++, Value(3));
   EXPECT_EQ(*place, Value(1));
   EXPECT_TRUE(++place == array.end());
+  const Array other = array;
+  EXPECT_FALSE(other.end() == place);
 }
 
 static_assert(std::input_iterator<Array::Iterator>);

@@ -117,6 +117,8 @@ TEST(Dictionary, IteratesOverKeysAndValues) {
   EXPECT_EQ((*place).key, "B");
   EXPECT_EQ((*place).value, Value("two"));
   EXPECT_TRUE(++place == dictionary.end());
+  const Dictionary other = dictionary;
+  EXPECT_FALSE(other.end() == place);
 }
 
 TEST(Dictionary, IteratesPastRemovedPlacesAtBothEnds) {
@@ -536,6 +538,19 @@ TEST(Dictionary, ShortageOfMemoryChangesNothing) {
   }
 }
 
+TEST(Dictionary, RemovesWithoutMemory) {
+  Dictionary dictionary;
+  for (int i = 0; i < 100; ++i) dictionary.set(numbered(i), i);
+  {
+    const MemoryShortage shortage(0);
+    for (int i = 0; i < 98; ++i) EXPECT_TRUE(dictionary.remove(numbered(i)));
+    EXPECT_TRUE(shortage.wasFelt());
+  }
+  EXPECT_EQ(dictionary, (Dictionary{{numbered(98), 98}, {numbered(99), 99}}));
+  EXPECT_TRUE(dictionary.remove(numbered(98)));
+  EXPECT_EQ(dictionary, (Dictionary{{numbered(99), 99}}));
+}
+
 TEST(Dictionary, ChangeOfADecodedOneTakesMemoryOnce) {
   Dictionary dictionary = decoded(ofEveryPayload);
   const Value number = 7;
@@ -545,14 +560,31 @@ TEST(Dictionary, ChangeOfADecodedOneTakesMemoryOnce) {
   EXPECT_EQ(meter.allocations(), 1u);
 }
 
+TEST(Dictionary, IsIndexedWithoutWhatWasRemoved) {
+  for (int sizeBefore = 240; sizeBefore <= 260; ++sizeBefore) {
+    Dictionary dictionary;
+    for (int i = 0; i < sizeBefore; ++i) dictionary.set(numbered(i), i);
+    for (const int i : {0, 100, sizeBefore - 1}) dictionary.remove(numbered(i));
+    for (int i = sizeBefore; i < sizeBefore + 40; ++i) dictionary.set(numbered(i), i);
+    dictionary.set(numbered(100), -1);
+    ASSERT_EQ(dictionary.size(), std::size_t(sizeBefore + 38));
+    ASSERT_FALSE(dictionary.contains(numbered(0)));
+    ASSERT_FALSE(dictionary.contains(numbered(sizeBefore - 1)));
+    ASSERT_EQ(dictionary[numbered(1)], Value(1));
+    ASSERT_EQ(dictionary[numbered(sizeBefore)], Value(sizeBefore));
+    ASSERT_EQ(keys(dictionary).back(), numbered(100));
+  }
+}
+
 TEST(Dictionary, CopyOfAnIndexedOneIsIndexedToo) {
+  constexpr int many = 1000;  // more than are searched one by one
   Dictionary original;
-  for (int i = 0; i < 100; ++i) original.set(numbered(i), i);
+  for (int i = 0; i < many; ++i) original.set(numbered(i), i);
   original.remove(numbered(50));
   Dictionary copy = original;
   copy.set("new", 1);
-  EXPECT_EQ(copy.size(), 100u);
-  EXPECT_EQ(copy[numbered(99)], Value(99));
+  EXPECT_EQ(copy.size(), std::size_t{many});
+  EXPECT_EQ(copy[numbered(many - 1)], Value(many - 1));
   EXPECT_FALSE(copy.contains(numbered(50)));
   EXPECT_FALSE(original.contains("new"));
   EXPECT_EQ(keys(copy).back(), "new");
