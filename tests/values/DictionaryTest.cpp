@@ -551,6 +551,18 @@ TEST(Dictionary, RemovesWithoutMemory) {
   EXPECT_EQ(dictionary, (Dictionary{{numbered(99), 99}}));
 }
 
+TEST(Dictionary, ValueThatIsRemovedOrReplacedIsGivenBack) {
+  const MemoryMeter meter;
+  Dictionary dictionary{{"kept", 1}, {"removed", 1}, {"replaced", 1}};
+  const std::size_t before = meter.held();
+  dictionary.set("removed", std::string(100'000, 'x'));
+  dictionary.set("replaced", std::string(100'000, 'y'));
+  EXPECT_GT(meter.held(), before + 200'000);
+  dictionary.remove("removed");
+  dictionary.set("replaced", 2);
+  EXPECT_EQ(meter.held(), before);
+}
+
 TEST(Dictionary, ChangeOfADecodedOneTakesMemoryOnce) {
   Dictionary dictionary = decoded(ofEveryPayload);
   const Value number = 7;
