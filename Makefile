@@ -37,8 +37,10 @@ coverage: packages-coverage ## count the lines that the tests reach: build/cover
 	cmake --build --preset coverage
 	packaging/coverage build/coverage
 
-# Where a slip costs most: what reads, writes and edits streams, and what imports looks.
+# Where a slip costs most: what reads, writes and edits streams, what holds their values, and what
+# imports looks.
 mutated = $(addprefix oxmv/metadata/TagStream,Decoder.cpp Encoder.cpp Editor.cpp) \
+  $(addprefix oxmv/values/,BlockBuilder.cpp Table.cpp) \
   $(addprefix oxmv/looks/,HexTable.cpp LookDescription.cpp LookImport.cpp LookTableFile.cpp)
 
 mutants: packages-coverage ## see whether tests notice MUTANTS (40) changes of each of some sources

@@ -54,7 +54,7 @@ Value timeOf(const toml::value<Time>& time) {
 
 Value valueOf(const toml::node& node) {
   switch (node.type()) {
-    case toml::node_type::none: return {};
+    case toml::node_type::none: return {};  // Not reached: no node of a document is of this type.
     case toml::node_type::table: return dictionaryOf(*node.as_table());
     case toml::node_type::array: return arrayOf(*node.as_array());
     case toml::node_type::string: return node.as_string()->get();

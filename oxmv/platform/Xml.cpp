@@ -43,48 +43,15 @@ class Walk {
  public:
   Walk(XML_Parser parser, XmlVisitor& visitor) : parser_(parser), visitor_(visitor) {
     XML_SetUserData(parser, this);
-    XML_SetXmlDeclHandler(parser,
-                          [](void* self, const XML_Char* version, const XML_Char* encoding, int) {
-                            of(self).declaration(viewOf(version), viewOf(encoding));
-                          });
-    XML_SetStartDoctypeDeclHandler(
-        parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, int) {
-          of(self).tell([](XmlVisitor& to) { return to.onDoctype(); });
-        });
-    XML_SetEntityDeclHandler(
-        parser, [](void* self, const XML_Char*, int, const XML_Char* value, int length,
-                   const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
-          of(self).entity({value, value != nullptr ? static_cast<std::size_t>(length) : 0});
-        });
-    XML_SetAttlistDeclHandler(
-        parser, [](void* self, const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*,
-                   int) { of(self).attributeDeclaration(); });
-    XML_SetElementHandler(
-        parser,
-        [](void* self, const XML_Char* name, const XML_Char**) { of(self).elementStart(name); },
-        [](void* self, const XML_Char*) { of(self).elementEnd(); });
-    XML_SetCharacterDataHandler(parser, [](void* self, const XML_Char* text, int length) {
-      const std::string_view piece(text, static_cast<std::size_t>(length));
-      const std::size_t offset = of(self).offset();
-      of(self).tell([&](XmlVisitor& to) { return to.onText(piece, offset); });
-    });
-    XML_SetCdataSectionHandler(
-        parser,
-        [](void* self) {
-          const std::size_t offset = of(self).offset();
-          of(self).tell([&](XmlVisitor& to) { return to.onCdataStart(offset); });
-        },
-        [](void* self) { of(self).tell([](XmlVisitor& to) { return to.onCdataEnd(); }); });
-    XML_SetCommentHandler(parser, [](void* self, const XML_Char* text) {
-      const std::size_t offset = of(self).offset();
-      of(self).tell([&](XmlVisitor& to) { return to.onComment(viewOf(text), offset); });
-    });
-    XML_SetProcessingInstructionHandler(
-        parser, [](void* self, const XML_Char*, const XML_Char* data) {
-          const std::size_t offset = of(self).offset();
-          of(self).tell(
-              [&](XmlVisitor& to) { return to.onProcessingInstruction(viewOf(data), offset); });
-        });
+    XML_SetXmlDeclHandler(parser, &Walk::onDeclaration);
+    XML_SetStartDoctypeDeclHandler(parser, &Walk::onDoctype);
+    XML_SetEntityDeclHandler(parser, &Walk::onEntity);
+    XML_SetAttlistDeclHandler(parser, &Walk::onAttributeDeclaration);
+    XML_SetElementHandler(parser, &Walk::onElementStart, &Walk::onElementEnd);
+    XML_SetCharacterDataHandler(parser, &Walk::onText);
+    XML_SetCdataSectionHandler(parser, &Walk::onCdataStart, &Walk::onCdataEnd);
+    XML_SetCommentHandler(parser, &Walk::onComment);
+    XML_SetProcessingInstructionHandler(parser, &Walk::onProcessingInstruction);
     // No handler for external entities: none is loaded. None for unknown encodings: they are errors.
     // Parameter entities of the document itself are expanded: a parser that passes one over must pass
     // over the declarations behind it, too, and the limits would not see what it did with them.
@@ -136,31 +103,70 @@ class Walk {
     stop();
   }
 
-  // The parser takes any version; XML 1.0 has "1." and digits.
-  void declaration(std::string_view version, std::string_view encoding) {
+  // What the parser calls.
+
+  // It takes any version; XML 1.0 has "1." and digits.
+  static void onDeclaration(void* self, const XML_Char* versionText, const XML_Char* encoding,
+                            int) {
+    const std::string_view version = viewOf(versionText);
     const bool isOne = version.size() > 2 && version.starts_with("1.") &&
                        version.find_first_not_of("0123456789", 2) == std::string_view::npos;
-    if (!isOne) return object("not a version of XML 1");
-    tell([&](XmlVisitor& to) { return to.onDeclaration(encoding); });
+    if (!isOne) return of(self).object("not a version of XML 1");
+    of(self).tell([&](XmlVisitor& to) { return to.onDeclaration(viewOf(encoding)); });
   }
 
-  void elementStart(const XML_Char* name) {
-    if (++depth_ > maxXmlDepth) return object("elements nested too deep");
-    tell([&](XmlVisitor& to) { return to.onElementStart(viewOf(name), offset()); });
+  static void onDoctype(void* self, const XML_Char*, const XML_Char*, const XML_Char*, int) {
+    of(self).tell([](XmlVisitor& to) { return to.onDoctype(); });
   }
 
-  void elementEnd() {
-    --depth_;
-    tell([](XmlVisitor& to) { return to.onElementEnd(); });
-  }
-
-  void attributeDeclaration() {
-    if (++declaredAttributes_ > maxXmlDeclaredAttributes) object("too many attributes declared");
-  }
-
-  void entity(std::string_view value) {
+  static void onEntity(void* self, const XML_Char*, int, const XML_Char* text, int length,
+                       const XML_Char*, const XML_Char*, const XML_Char*, const XML_Char*) {
+    const std::string_view value(text, text != nullptr ? static_cast<std::size_t>(length) : 0);
     if (value.find_first_of("&%") == std::string_view::npos) return;
-    if (++nestedEntities_ > maxXmlNestedEntities) object("too many entities within entities");
+    if (++of(self).nestedEntities_ > maxXmlNestedEntities)
+      of(self).object("too many entities within entities");
+  }
+
+  static void onAttributeDeclaration(void* self, const XML_Char*, const XML_Char*, const XML_Char*,
+                                     const XML_Char*, int) {
+    if (++of(self).declaredAttributes_ > maxXmlDeclaredAttributes)
+      of(self).object("too many attributes declared");
+  }
+
+  static void onElementStart(void* self, const XML_Char* name, const XML_Char**) {
+    if (++of(self).depth_ > maxXmlDepth) return of(self).object("elements nested too deep");
+    const std::size_t offset = of(self).offset();
+    of(self).tell([&](XmlVisitor& to) { return to.onElementStart(viewOf(name), offset); });
+  }
+
+  static void onElementEnd(void* self, const XML_Char*) {
+    --of(self).depth_;
+    of(self).tell([](XmlVisitor& to) { return to.onElementEnd(); });
+  }
+
+  static void onText(void* self, const XML_Char* text, int length) {
+    const std::string_view piece(text, static_cast<std::size_t>(length));
+    const std::size_t offset = of(self).offset();
+    of(self).tell([&](XmlVisitor& to) { return to.onText(piece, offset); });
+  }
+
+  static void onCdataStart(void* self) {
+    const std::size_t offset = of(self).offset();
+    of(self).tell([&](XmlVisitor& to) { return to.onCdataStart(offset); });
+  }
+
+  static void onCdataEnd(void* self) {
+    of(self).tell([](XmlVisitor& to) { return to.onCdataEnd(); });
+  }
+
+  static void onComment(void* self, const XML_Char* text) {
+    const std::size_t offset = of(self).offset();
+    of(self).tell([&](XmlVisitor& to) { return to.onComment(viewOf(text), offset); });
+  }
+
+  static void onProcessingInstruction(void* self, const XML_Char*, const XML_Char* data) {
+    const std::size_t offset = of(self).offset();
+    of(self).tell([&](XmlVisitor& to) { return to.onProcessingInstruction(viewOf(data), offset); });
   }
 
   std::size_t offset() const {

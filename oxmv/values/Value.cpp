@@ -211,7 +211,7 @@ class Value::Comparison {
       case Kind::array:
       case Kind::dictionary: queue(a, b); return true;
     }
-    return false;
+    return false;  // Not reached: every case is above.
   }
 
   bool areEqualInside(const Array& a, const Array& b) {

@@ -561,5 +561,21 @@ TEST(ClipFault, FileReplacedWhileItIsEditedIsNotOverwritten) {
   EXPECT_GT(refusals, 10u);
 }
 
+// Nor does whoever says that there was none.
+TEST(ClipFault, FileMadeWhileANewOneIsWrittenIsNotOverwritten) {
+  const TempDir folder;
+  const Bytes others = bytesOf("somebody else's");
+  armFault(1, {.kind = Fault::Kind::meanwhile,
+               .action = [&] { putFile(folder / "clip", others); },
+               .function = "fsync"});
+  std::error_code error;
+  EXPECT_FALSE(writeNewFile(folder / "clip", newContent, error));
+  disarmFault();
+  EXPECT_EQ(faultyFunction(), "fsync");
+  EXPECT_EQ(error, std::errc::file_exists);
+  EXPECT_EQ(getFile(folder / "clip"), others);
+  EXPECT_EQ(namesIn(folder.path()), std::set<std::string>{"clip"});
+}
+
 }  // namespace
 }  // namespace oxmv::test

@@ -1,8 +1,10 @@
 // Preferences in a file system that fails, and beside programs that lock nothing.
 
 #include <cerrno>
+#include <functional>
 #include <string>
 #include <system_error>
+#include <utility>
 
 #include <gtest/gtest.h>
 
@@ -49,6 +51,31 @@ TEST_F(PreferencesFaults, FolderThatCannotBeOpenedIsTold) {
     EXPECT_EQ(setWith(fault, nth), std::errc::too_many_files_open) << nth;
     EXPECT_EQ(getFile(file), bytesOf("b = 2\n"));
   }
+}
+
+TEST_F(PreferencesFaults, InterruptedLockIsAskedForAgain) {
+  EXPECT_FALSE(setWith({.kind = Fault::Kind::fail, .error = EINTR, .function = "flock"}));
+  EXPECT_EQ(getFile(file), bytesOf("b = 2\na = 1\n"));
+}
+
+TEST_F(PreferencesFaults, FolderWithoutLocksIsDoneWithout) {
+  EXPECT_FALSE(setWith({.kind = Fault::Kind::fail, .error = ENOLCK, .function = "flock"}));
+  EXPECT_EQ(getFile(file), bytesOf("b = 2\na = 1\n"));
+}
+
+// What is looked at first, before there is a lock, may be done or undone by the time there is one.
+TEST_F(PreferencesFaults, ChangeBeforeTheLockIsSeen) {
+  const auto whileLocking = [](std::function<void()> change) {
+    return Fault{.kind = Fault::Kind::meanwhile, .action = std::move(change), .function = "flock"};
+  };
+  const Bytes done = bytesOf("a = 1 # done\n");
+  EXPECT_FALSE(setWith(whileLocking([&] { putFile(file, done); })));
+  EXPECT_EQ(getFile(file), done);
+  const Bytes noToml = bytesOf("b = = 2\n");
+  putFile(file, bytesOf("b = 2\n"));
+  EXPECT_EQ(setWith(whileLocking([&] { putFile(file, noToml); })),
+            make_error_code(PreferencesError::notToml));
+  EXPECT_EQ(getFile(file), noToml);
 }
 
 TEST_F(PreferencesFaults, ChangeMeanwhileIsKept) {

@@ -6,8 +6,10 @@
 #include <cstdarg>
 #include <string_view>
 
+#include <dirent.h>
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -110,6 +112,26 @@ int openat(int folder, const char* path, int flags, ...) {
   }
   return pass(
       "openat", [&] { return next(folder, path, flags, mode); }, flags, mode);
+}
+
+DIR* fdopendir(int folder) {
+  static auto* const next = original<DIR*(int)>("fdopendir");
+  DIR* opened = nullptr;
+  pass("fdopendir", [&] { return (opened = next(folder)) != nullptr ? 0 : -1; });
+  return opened;
+}
+
+dirent* readdir(DIR* folder) {
+  static const bool isLarge = sizeof(off_t) > sizeof(long);  // then this is another function
+  static auto* const next = original<dirent*(DIR*)>(isLarge ? "readdir64" : "readdir");
+  dirent* entry = nullptr;
+  pass("readdir", [&] { return (entry = next(folder)) != nullptr ? 0 : -1; });
+  return entry;
+}
+
+int flock(int file, int operation) noexcept {
+  static auto* const next = original<int(int, int)>("flock");
+  return pass("flock", [&] { return next(file, operation); });
 }
 
 int close(int file) {

@@ -73,6 +73,21 @@ TEST(CameraTables, AnotherFileOfTheSameShapeIsTaken) {
   EXPECT_EQ(std::get<CameraTables>(read).shortPrefixes()[1].name, "QX Beta");
 }
 
+TEST(CameraTables, DifferByWhatStandsInAnyOfTheTables) {
+  const auto other = [](const std::string& old, const std::string& fresh) {
+    return std::get<CameraTables>(CameraTables::fromText(with(old, fresh)));
+  };
+  const CameraTables& tables = CameraTables::builtIn();
+  EXPECT_NE(tables, other("{prefix = \"QX2\"", "{prefix = \"QX9\""));
+  EXPECT_NE(tables, other("\"QX Alpha\"", "\"QX Omega\""));
+  EXPECT_NE(tables, other("{prefix = \"QZ1.01\"", "{prefix = \"QZ9.01\""));
+  EXPECT_NE(tables, other("\"QX Gamma\"", "\"QX Omega\""));
+  EXPECT_NE(tables, other("\"KV-QZ110\"", "\"KV-QZ119\""));
+  const CameraTables::ModelRow row = {"KV-QZ110", "QZ1.01.00.00", "QZ Lambda"};
+  EXPECT_NE(row, (CameraTables::ModelRow{"KV-QZ110", "QZ1.02.00.00", "QZ Lambda"}));
+  EXPECT_NE(row, (CameraTables::ModelRow{"KV-QZ110", "QZ1.01.00.00", "QZ Omega"}));
+}
+
 TEST(CameraTables, WhatIsNoTomlIsRefusedWithItsPlace) {
   EXPECT_TRUE(problemOf("short-prefixes = [\n  {prefix = }\n]").starts_with("line 2: "))
       << problemOf("short-prefixes = [\n  {prefix = }\n]");
@@ -128,6 +143,10 @@ TEST(CameraTables, APrefixOfTheWrongFormIsNamed) {
     EXPECT_EQ(problemOf(with("\"QX3.01\"", '"' + std::string(prefix) + '"')),
               "long-prefixes, row 1: prefix \"" + std::string(prefix) + "\" is not like QX3.01");
   }
+  for (const char* beside : {"@X3.01", "[X3.01", "`X3.01", "{X3.01", "QX/.01", "QX:.01"})
+    EXPECT_NE(problemOf(with("\"QX3.01\"", '"' + std::string(beside) + '"')), "none") << beside;
+  for (const char* prefix : {"AZ0.90", "az9.09"})
+    EXPECT_EQ(problemOf(with("\"QX3.01\"", '"' + std::string(prefix) + '"')), "none") << prefix;
   EXPECT_EQ(problemOf(with("prefix = \"QX2\", name = \"QX Beta\"},\n  {text",
                            "prefix = \"QX22\", name = \"QX Beta\"},\n  {text")),
             "model-texts, row 2: prefix \"QX22\" is neither of 3 characters nor like QX3.01");
@@ -138,6 +157,9 @@ TEST(CameraTables, TextsOtherThanPrintableAsciiAreNamed) {
             "short-prefixes, row 2: name has other characters than printable ASCII");
   EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX\\u0000Beta\"")),
             "short-prefixes, row 2: name has other characters than printable ASCII");
+  EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX\\u007FBeta\"")),
+            "short-prefixes, row 2: name has other characters than printable ASCII");
+  EXPECT_EQ(problemOf(with("\"QX Beta\"", "\"QX ~Beta\"")), "none");
   EXPECT_EQ(problemOf(with("\"QX2\"", "\"QX\\u00B2\"")),
             "short-prefixes, row 2: prefix has other characters than printable ASCII");
 }

@@ -331,6 +331,22 @@ TEST(LookDescription, TextOutOfTheFileIsLimitedAlikeInBothWays) {
   }
 }
 
+TEST(LookDescription, TextOutOfTheFileIsLimitedAlikeWhereverItEnds) {
+  const std::string file =
+      "<look><LUT><size>1</size><a>&amp;x>" + run + "\r\n" + run + "</a></LUT></look>";
+  const std::size_t all = 3 + run.size() + 1 + run.size();
+  for (std::size_t most = 0; most <= all; ++most) {
+    LookProblem quick, plain;
+    const bool isGood = most == all;
+    EXPECT_EQ(bool(LookDescription::parse(bytesOf(file), &quick, LookParsing::quick, most)),
+              isGood);
+    EXPECT_EQ(bool(LookDescription::parse(bytesOf(file), &plain, LookParsing::plain, most)),
+              isGood);
+    ASSERT_EQ(quick.what, plain.what) << most;
+    ASSERT_EQ(quick.offset, plain.offset) << most;
+  }
+}
+
 TEST(LookDescription, FileAboveTheLargestIsRefusedInBothWays) {
   std::string file = "<look><LUT>";
   file.resize(maxFileSize + 1 - std::string_view("</LUT></look>").size(), '0');

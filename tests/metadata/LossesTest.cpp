@@ -113,6 +113,29 @@ TEST(Losses, SaysWhatWouldBeWritten) {
             '"' + letters(40) + "...\" has 300 characters, of which 255 would be stored");
 }
 
+TEST(Losses, QuotesNoCharacterInPart) {
+  EXPECT_EQ(messageOf({{"REEL", letters(39) + "\xC3\xA9x"}}),
+            '"' + letters(39) + "...\" would be written as zeros: only ASCII is stored");
+  EXPECT_EQ(messageOf({{"REEL", letters(38) + "\xC3\xA9x"}}),
+            '"' + letters(38) + "\xC3\xA9...\" would be written as zeros: only ASCII is stored");
+  EXPECT_EQ(messageOf({{"REEL", letters(38) + "\xC3\xA9"}}),
+            '"' + letters(38) + "\xC3\xA9\" would be written as zeros: only ASCII is stored");
+}
+
+TEST(Losses, SaysHowManyNulsATextGains) {
+  const auto message = [](std::string_view text) {
+    return messageOf({{"KWRd", Array::of(text, "four")}});
+  };
+  EXPECT_EQ(message("abc"), "\"abc\" would gain a NUL at its end");
+  EXPECT_EQ(message("ab"), "\"ab\" would gain 2 NULs at its end");
+}
+
+TEST(Losses, SaysWhatAValueWouldComeBackAs) {
+  EXPECT_EQ(messageOf({{"TAKE", 2.0f}}), "is a float, and would come back as an integer");
+  EXPECT_EQ(messageOf({{"SATU", "0.5"}}), "is a text, and would come back as a float");
+  EXPECT_EQ(messageOf({{"WBAL", 3}}), "is an integer, which is not stored there");
+}
+
 TEST(Losses, NamesNumbersThatComeBackDifferent) {
   EXPECT_EQ(losses({{"GAIN", 65536}}), Found{"int-range GAIN"});
   EXPECT_EQ(losses({{"GAIN", -1}}), Found{"int-range GAIN"});
@@ -121,6 +144,7 @@ TEST(Losses, NamesNumbersThatComeBackDifferent) {
   EXPECT_EQ(losses({{"PRCS", std::numeric_limits<std::int32_t>::min()}}), Found());
   EXPECT_EQ(losses({{"LCRC", 0xFFFFFFFFu}}), Found{"int-range LCRC"});
   EXPECT_EQ(losses({{"TAKE", 2.0f}}), Found{"wrong-kind TAKE"});
+  EXPECT_EQ(losses({{"TAKE", 2.0}}), Found{"wrong-kind TAKE"});
   EXPECT_EQ(losses({{"TAKE", "12"}}), Found{"wrong-kind TAKE"});
   EXPECT_EQ(losses({{"SATU", 1}}), Found{"wrong-kind SATU"});
   EXPECT_EQ(losses({{"SATU", 0.1}}), Found{"float-precision SATU"});
@@ -153,6 +177,8 @@ TEST(Losses, NamesListsOfTexts) {
   EXPECT_EQ(losses({{"KWRd", Array::of(letters(256))}}), Found{"text-long KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of("a\0"s + letters(300))}}), Found{"text-long KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of("Caf\xC3\xA9")}}), Found{"text-nonascii KWRd[0]"});
+  EXPECT_EQ(losses({{"KWRd", Array::of("\xC3\xA9" + letters(300))}}),
+            Found{"text-nonascii KWRd[0]"});
   EXPECT_EQ(losses({{"KWRd", Array::of("four", 4)}}), Found{"wrong-kind KWRd[1]"});
   EXPECT_EQ(losses({{"KWRd", Array()}}), Found{"list-empty KWRd"});
   EXPECT_EQ(losses({{"KWRd", "four"}}), Found{"wrong-kind KWRd"});
@@ -168,6 +194,17 @@ TEST(Losses, NamesUnalignedDataThatSomethingFollows) {
   EXPECT_EQ(losses({{"FREE", bytes(8)}, {"TAKE", 1}}), Found());
 }
 
+TEST(Losses, NamesUnalignedDataAmongWhatDoesNoDamage) {
+  EXPECT_EQ(losses({{"FREE", bytes(5)}, {"ZZZZ", 1}, {"TAKE", 1}}),
+            (Found{"unknown-tag ZZZZ", "data-unaligned FREE!"}));
+  const Dictionary nested = {{"TAKE", 1}};
+  const Value point = Dictionary{{"TAKE", 1}, {"CTLPData", Array::of(1, 2)}};
+  EXPECT_EQ(losses({{"DSPm", Array::of(nested)}, {"FREE", bytes(5)}, {"COL1", nested}}),
+            Found{"data-unaligned FREE!"});
+  EXPECT_EQ(losses({{"FREE", bytes(5)}, {"CTLp", Array::of(point)}}),
+            Found{"data-unaligned FREE!"});
+}
+
 TEST(Losses, NamesTheNestedStreamWhoseDataMakeItUnaligned) {
   const Value nested = Dictionary{{"FREE", bytes(5)}};
   EXPECT_EQ(losses({{"COL1", nested}}), Found());
@@ -177,6 +214,10 @@ TEST(Losses, NamesTheNestedStreamWhoseDataMakeItUnaligned) {
       losses({{"CTLp", Array::of(Dictionary{{"FREE", bytes(5)}, {"CTLPData", Array::of(1, 2)}},
                                  Dictionary{{"TAKE", 1}, {"CTLPData", Array::of(3, 4)}})}}),
       Found{"data-unaligned CTLp[0]!"});
+  EXPECT_EQ(
+      losses({{"CTLp", Array::of(Dictionary{{"FREE", bytes(8)}, {"CTLPData", Array::of(1, 2)}},
+                                 Dictionary{{"GAIN", -1}, {"CTLPData", Array::of(3, 4)}})}}),
+      Found{"int-range CTLp[1]/GAIN"});
   // Elements of DSPm are padded in both layouts.
   EXPECT_EQ(losses({{"DSPm", Array::of(nested, Dictionary{{"TAKE", 1}})}}), Found());
 }
@@ -184,6 +225,7 @@ TEST(Losses, NamesTheNestedStreamWhoseDataMakeItUnaligned) {
 TEST(Losses, NamesSizesThatKeepSixteenBits) {
   EXPECT_EQ(losses({{"FREE", bytes(65536)}}), Found{"size-16bit FREE!"});
   EXPECT_EQ(losses({{"FREE", bytes(65536)}}, Layout::readable), Found());
+  EXPECT_EQ(losses({{"FREE", bytes(65536)}, {"TAKE", 1}}), Found{"size-16bit FREE!"});
   EXPECT_EQ(losses({{"COL1", Dictionary{{"FREE", bytes(65528)}}}}), Found{"size-16bit COL1!"});
   EXPECT_EQ(losses({{"COL1", Dictionary{{"FREE", bytes(65524)}}}}), Found());
 }
@@ -237,6 +279,7 @@ TEST(Losses, NamesEntriesOfTheTagGroup) {
   EXPECT_EQ(losses(group({{"Lens", "35\0mm"sv}})), Found());
   EXPECT_EQ(losses(group({{"Lens", "Caf\xC3\xA9"}})), Found{"text-nonascii TAG /Lens"});
   EXPECT_EQ(losses(group({{"Lens", letters(256)}})), Found{"text-long TAG /Lens"});
+  EXPECT_EQ(losses(group({{"Lens", letters(255) + '\0'}})), Found{"text-long TAG /Lens"});
   EXPECT_EQ(losses(group({{"L\xC3\xA9ns", 1}})), Found{"text-nonascii TAG /L\xC3\xA9ns"});
   EXPECT_EQ(losses(group({{letters(256), 1}})), Found{"text-long TAG /" + letters(256)});
   EXPECT_EQ(losses(group({{"ISO\0"sv, 1}})), Found{"text-nul TAG /" + std::string("ISO\0", 4)});
@@ -254,6 +297,8 @@ TEST(Losses, NamesEntriesOfTheRegGroup) {
 TEST(Losses, NamesTheOtherOneOfAPair) {
   EXPECT_EQ(losses({{"DTIN", 5}}), Found{"pair-added DTDR"});
   EXPECT_EQ(losses({{"DTFO", 5}}), Found{"pair-added DTFI"});
+  EXPECT_EQ(losses({{"DTFI", 5}}), Found{"pair-added DTFO"});
+  EXPECT_EQ(losses({{"DTIN", 5}, {"DTDR", 0}, {"GAIN", -1}}), Found{"int-range GAIN"});
   EXPECT_EQ(losses({{"COL1", Dictionary{{"DTDR", 5}}}}), Found{"pair-added COL1/DTIN"});
 }
 
@@ -268,6 +313,7 @@ TEST(Losses, NamesControlPointsWithoutTheirTwoIntegers) {
   EXPECT_EQ(losses(points({{"CTLPData", Array::of(1, 2)}})), Found());
   EXPECT_EQ(losses({{"CTLp", Array()}}), Found{"list-empty CTLp"});
   EXPECT_EQ(losses({{"CTLp", Array::of(5)}}), Found{"wrong-kind CTLp[0]"});
+  EXPECT_EQ(losses({{"CTLp", 5}}), Found{"wrong-kind CTLp"});
 }
 
 TEST(Losses, NamesWhatNestedStreamsLose) {
@@ -278,6 +324,7 @@ TEST(Losses, NamesWhatNestedStreamsLose) {
   EXPECT_EQ(losses({{"DSPm", Array::of(Dictionary(), Dictionary{{"GAIN", -1}})}}),
             Found{"int-range DSPm[1]/GAIN"});
   EXPECT_EQ(losses({{"DSPm", Array()}}), Found{"list-empty DSPm"});
+  EXPECT_EQ(losses({{"DSPm", 1}}), Found{"wrong-kind DSPm"});
 }
 
 TEST(Losses, NamesStreamsNestedTooDeep) {
@@ -288,6 +335,29 @@ TEST(Losses, NamesStreamsNestedTooDeep) {
   tags = {{"COL1", tags}};
   for (int level = 0; level < 64; ++level) path += level == 0 ? "COL1" : "/COL1";
   EXPECT_EQ(losses(tags), Found{"too-deep " + path});
+}
+
+TEST(Losses, NamesElementsOfListsNestedTooDeep) {
+  const Value point = Array::of(1, 2);
+  const auto nest = [&](int depth, bool isControlPoint) {
+    Dictionary tags = {{"TAKE", 1}};
+    for (int level = 0; level < depth; ++level) {
+      if (!isControlPoint) {
+        tags = {{"DSPm", Array::of(tags)}};
+        continue;
+      }
+      tags.set("CTLPData", point);
+      tags = {{"CTLp", Array::of(tags)}};
+    }
+    return tags;
+  };
+  for (const bool isControlPoint : {false, true}) {
+    std::string path;
+    for (int level = 0; level < 64; ++level)
+      path += std::string(level == 0 ? "" : "/") + (isControlPoint ? "CTLp[0]" : "DSPm[0]");
+    EXPECT_EQ(losses(nest(63, isControlPoint)), Found()) << isControlPoint;
+    EXPECT_EQ(losses(nest(64, isControlPoint)), Found{"too-deep " + path}) << isControlPoint;
+  }
 }
 
 TEST(Losses, NamesStreamsTooShortToBeLoaded) {

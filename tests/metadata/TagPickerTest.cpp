@@ -7,6 +7,7 @@
 #include "oxmv/metadata/TagPicker.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagTable.h"
+#include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
 #include "tests/support/TestData.h"
@@ -65,6 +66,27 @@ TEST(TagPicker, GivesAGroupThatIsAskedForAlone) {
   EXPECT_EQ(picked(stream, {"TAG "_tag}), (std::vector<Value>{Dictionary{{"ISO", 400}}}));
   EXPECT_EQ(picked(stream, {"REEL"_tag, "REG "_tag}),
             (std::vector<Value>{Value(), Dictionary{{"gain", 3}}}));
+}
+
+TEST(TagPicker, LeavesToTheDecoderWhatTakesMoreThanTheRecord) {
+  const Bytes stream = StreamBuilder()
+                           .record("GHTL", 'H', 1)
+                           .record("ZZZZ", 'H', 2)
+                           .record("WBAL", 'f', std::string(16, '\0'))
+                           .record("TAGN", 'c', "ISO")
+                           .record("TAGV", 'L', 400)
+                           .record("PROJ", 'B', "")
+                           .record("TAKE", 'B', "\x05")
+                           .record("PRCS", 'L', "\x05\x06")
+                           .bytes();
+  const Array zeros = Array::of(0.0f, 0.0f, 0.0f, 0.0f);
+  EXPECT_EQ(picked(stream, {"WBAL"_tag}), std::vector<Value>{zeros});
+  for (const Tag tag : {"GHTL"_tag, "ZZZZ"_tag, "TAGN"_tag, "TAGV"_tag})
+    EXPECT_EQ(picked(stream, {tag}), std::vector<Value>{Value()});
+  // Numbers go on behind their record.
+  EXPECT_EQ(picked(stream, {"PROJ"_tag}), std::vector<Value>{0x54});  // T
+  EXPECT_EQ(picked(stream, {"TAKE"_tag}), std::vector<Value>{5});
+  EXPECT_EQ(picked(stream, {"PRCS"_tag}), std::vector<Value>{0x0605});
 }
 
 TEST(TagPicker, LastOfSeveralRecordsCounts) {

@@ -272,6 +272,7 @@ TEST(TagStreamEditor, EditsEntriesOfAGroup) {
                 .record("TAGV", 'c', std::string_view("35mm\0\0\0\0", 8))
                 .record("SHOT", 'B', 2)
                 .bytes());
+  expectRefused(grouped(), "TAG /" + std::string(256, 'n'), 1, "would-not-read-back at 0");
   EXPECT_EQ(remove(grouped(), "TAG "),
             StreamBuilder().record("TAKE", 'B', 1).record("SHOT", 'B', 2).bytes());
   EXPECT_EQ(set(StreamBuilder().record("SHOT", 'B', 2), "TAG /ISO", 5),
@@ -293,6 +294,7 @@ TEST(TagStreamEditor, KeepsThePaddedNamesOfTheRegGroup) {
                 .record("REGN", 'c', std::string_view("Model\0\0\0", 8))
                 .record("REGV", 'L', 8)
                 .bytes());
+  EXPECT_EQ(set(stream, std::string("REG /Model\0\0\0", 13), 8), set(stream, "REG /Model", 8));
   EXPECT_EQ(remove(stream, "REG /Model"), Bytes());
   expectRefused(stream, "REG /Other", 1, "would-not-read-back at 0");
   expectRefused(stream, "REG /Model", "text", "not-stored at 0");
@@ -327,6 +329,22 @@ TEST(TagStreamEditor, EditsInsideNestedStreamsAndFixesTheirSizes) {
                 .record("COL1", 0, StreamBuilder().record("TAKE", 'B', 1).bytes())
                 .record("DTIN", 'L', 3)
                 .bytes());
+}
+
+// A header alone is left, which readers take for no dictionary.
+TEST(TagStreamEditor, RemovesTheLastTagOfANestedStream) {
+  const StreamBuilder shot = StreamBuilder().record("SHOT", 'B', 2);
+  const Bytes inner = StreamBuilder().record("TAKE", 'B', 1).bytes();
+  EXPECT_EQ(remove(StreamBuilder(shot).record("COL1", 0, inner), "COL1/TAKE"),
+            StreamBuilder(shot).header("COL1", 0, 0).bytes());
+}
+
+TEST(TagStreamEditor, RefusesANestedStreamLargerThanARecord) {
+  const Bytes inner = StreamBuilder().record("FREE", 'c', Bytes(0xFFFFE0, 1)).bytes();
+  const StreamBuilder stream = StreamBuilder().record("COL1", 0, inner);
+  expectRefused(stream, "COL1/REEL", "sixteen letters.", "not-stored at 0");
+  TagStreamEditor editor(stream.bytes());
+  EXPECT_EQ(outcome(editor.set("COL1/FREE", data(4))), "done");
 }
 
 TEST(TagStreamEditor, EditsStreamsInStreams) {

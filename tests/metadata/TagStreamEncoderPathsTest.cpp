@@ -214,6 +214,29 @@ TEST(TagStreamEncoderPaths, RemovedEntriesOfGroupsAreNotWritten) {
   }
 }
 
+// What was removed leaves its place, and nothing goes out for it.
+TEST(TagStreamEncoderPaths, NothingIsWrittenOfWhatWasRemoved) {
+  const Dictionary kept = {{"TAKE", 1}};
+  for (const char* key : {"REEL", "PRCS", "TIMC", "COL1", "DTIN", "CTLp", "KWRd", "CTLPData"}) {
+    Dictionary changed = kept;
+    changed.set(key, Array::of(1, 2));
+    changed.remove(key);
+    EXPECT_EQ(encoded(changed), encoded(kept)) << key;
+  }
+  for (const char* group : {"TAG ", "REG "}) {
+    Dictionary entries = {{"ISO", 400}, {"Lens", "35mm"}, {"REEL", 1}};
+    entries.remove("Lens");
+    entries.remove("REEL");
+    EXPECT_EQ(encoded({{group, entries}}), encoded({{group, Dictionary{{"ISO", 400}}}}));
+  }
+  Dictionary point = {{"a long name", 1}, {"CTLPData", Array::of(1, 2)}, {"another", 2}};
+  point.remove("a long name");
+  EXPECT_EQ(encoded({{"CTLp", Array::of(point)}}),
+            encoded({{"CTLp", Array::of(Dictionary{{"CTLPData", Array::of(1, 2)}})}}));
+  point.remove("CTLPData");
+  EXPECT_EQ(encoded({{"CTLp", Array::of(point)}}), encoded({{"CTLp", Array::of(Dictionary())}}));
+}
+
 // Memory.
 
 std::size_t allocationsOf(const Dictionary& tags) {

@@ -43,6 +43,16 @@ TEST(CreationTime, YearsMayBeFarAway) {
   EXPECT_EQ(localTime(std::numeric_limits<std::int64_t>::min()), std::nullopt);
 }
 
+TEST(CreationTime, TimesThatDifferInOnePartAreDifferent) {
+  const CalendarTime time = {2024, 2, 28, 14, 3, 58};
+  EXPECT_EQ(time, (CalendarTime{2024, 2, 28, 14, 3, 58}));
+  for (const CalendarTime& other :
+       {CalendarTime{2025, 2, 28, 14, 3, 58}, CalendarTime{2024, 3, 28, 14, 3, 58},
+        CalendarTime{2024, 2, 29, 14, 3, 58}, CalendarTime{2024, 2, 28, 15, 3, 58},
+        CalendarTime{2024, 2, 28, 14, 4, 58}, CalendarTime{2024, 2, 28, 14, 3, 59}})
+    EXPECT_NE(time, other);
+}
+
 // Not all file systems keep it, so this asks the system what is to be expected.
 TEST(CreationTime, IsWhatTheFileSystemRemembers) {
   const TimeZone utc("UTC0");

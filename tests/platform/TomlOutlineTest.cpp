@@ -48,6 +48,8 @@ TEST(TomlOutline, FindsValuesWithoutWhatIsAroundThem) {
   EXPECT_EQ(values("a = 1"), Texts{"1"});
   EXPECT_EQ(values("a =1 \t# one\n"), Texts{"1"});
   EXPECT_EQ(values("a = 1979-05-27 07:32:00 \r\n"), Texts{"1979-05-27 07:32:00"});
+  for (const std::string behind : {"", " ", " \n", " # 0"})
+    EXPECT_EQ(values("a = 1979-05-27" + behind), Texts{"1979-05-27"}) << behind;
   EXPECT_EQ(values("a = \"#\\\"#\" # text\n"), Texts{"\"#\\\"#\""});
   EXPECT_EQ(values("a = '#\\'# text\n"), Texts{"'#\\'"});
   EXPECT_EQ(values("a = { b = \"}\", c = '}' } # }\n"), Texts{"{ b = \"}\", c = '}' }"});
@@ -144,6 +146,8 @@ TEST(TomlOutline, SaysWhatBreaksTheGrammar) {
   EXPECT_EQ(mistakeIn("a = # 1"), "expected a value, at 4");
   EXPECT_EQ(mistakeIn("a = 1.2.3"), "neither a text, a boolean, a number nor a date, at 4");
   EXPECT_EQ(mistakeIn("a = 1979-05-27 0#"), "neither a text, a boolean, a number nor a date, at 4");
+  for (const std::string behind : {"\t07:32:00", " /", " :"})
+    EXPECT_EQ(mistakeIn("a = 1979-05-27" + behind), "expected the end of the line, at 15");
   EXPECT_EQ(mistakeIn("a = [,]"), "expected a value, at 5");
   EXPECT_EQ(mistakeIn("a = [1,,]"), "expected a value, at 7");
   EXPECT_EQ(mistakeIn("a = [1 2]"), "expected ',' or ']', at 7");

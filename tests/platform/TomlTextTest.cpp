@@ -203,6 +203,9 @@ TEST(TomlText, LeavesALastLineOpen) {
 
 TEST(TomlText, WritesKeysInQuotesWhereTheyNeedThem) {
   EXPECT_EQ(with("", "a-B_9", 1), "a-B_9 = 1\n");
+  EXPECT_EQ(with("", "azAZ09", 1), "azAZ09 = 1\n");
+  for (const std::string beside : {"`", "{", "@", "[", "/", ":"})
+    EXPECT_EQ(with("", "a" + beside, 1), "\"a" + beside + "\" = 1\n");
   EXPECT_EQ(with("", "", 1), "\"\" = 1\n");
   EXPECT_EQ(with("", "a.b \"\n", 1), "\"a.b \\\"\\n\" = 1\n");
   EXPECT_EQ(with("", "\xE9", 1), "\"é\" = 1\n");  // ISO-8859-1
@@ -267,6 +270,9 @@ TEST(TomlText, WritesNumbers) {
   EXPECT_EQ(literal(std::numeric_limits<double>::infinity()), "inf\n");
   EXPECT_EQ(literal(-std::numeric_limits<float>::infinity()), "-inf\n");
   EXPECT_EQ(literal(std::numeric_limits<double>::quiet_NaN()), "nan\n");
+  EXPECT_EQ(literal(-std::numeric_limits<double>::quiet_NaN()), "-nan\n");
+  EXPECT_EQ(literal(std::numeric_limits<float>::quiet_NaN()), "nan\n");
+  EXPECT_EQ(literal(-std::numeric_limits<float>::quiet_NaN()), "-nan\n");
 }
 
 TEST(TomlText, NumbersComeBack) {
@@ -286,10 +292,15 @@ TEST(TomlText, WritesArraysAndDictionariesInOneLine) {
 TEST(TomlText, RefusesValuesThatHaveNoForm) {
   EXPECT_EQ(with("b = 1", "a", Value::data({})), "refused");
   EXPECT_EQ(with("b = 1", "a", Array::of(Value::data({}))), "refused");
+  EXPECT_EQ(with("b = 1", "a", Dictionary{{"c", Value::data({})}}), "refused");
   Value deep = 1;
   for (std::size_t i = 0; i < maxTomlNesting; ++i) deep = Array::of(deep);
   EXPECT_NE(with("", "a", deep), "refused");
   EXPECT_EQ(with("", "a", Array::of(deep)), "refused");
+  EXPECT_EQ(with("", "a", Dictionary{{"b", deep}}), "refused");
+  deep = 1;
+  for (std::size_t i = 0; i < maxTomlNesting; ++i) deep = Dictionary{{"b", deep}};
+  EXPECT_EQ(with("", "a", Dictionary{{"b", deep}}), "refused");
 }
 
 TEST(TomlText, ThrowsOnlyWhenThereIsNoMemory) {

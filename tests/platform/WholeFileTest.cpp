@@ -233,6 +233,17 @@ TEST(WriteWholeFile, MakesANewFile) {
   EXPECT_EQ(test::namesIn(folder.path()).size(), 1u);
 }
 
+TEST(WriteWholeFile, TakesANameInTheCurrentFolder) {
+  const TempDir folder;
+  EXPECT_TRUE(test::inChildProcess([&] {
+    fs::current_path(folder.path());
+    std::error_code error;
+    return writeWholeFile("file", Bytes{1, 2}, error) && writeWholeFile("file", Bytes{3}, error);
+  }));
+  EXPECT_EQ(test::getFile(folder / "file"), Bytes{3});
+  EXPECT_EQ(test::namesIn(folder.path()), std::set<std::string>{"file"});
+}
+
 TEST(WriteWholeFile, ReplacesAFileAndKeepsItsPermissions) {
   const TempDir folder;
   test::putFile(folder / "clip", oldContent);

@@ -401,6 +401,19 @@ TEST(Xml, WhatTheVisitorThrowsReachesTheCaller) {
   EXPECT_EQ(thrower.events, "<a@0 ");
 }
 
+TEST(Xml, VisitorNeedNotHearOfAnything) {
+  class Deaf final : public XmlVisitor {};
+  Deaf visitor;
+  EXPECT_EQ(
+      walkXml(bytesOf("<?xml version='1.0'?><!DOCTYPE a><a>T<!--c--><?d e?><![CDATA[g]]></a>"),
+              visitor)
+          .kind,
+      Kind::wellFormed);
+  const XmlEnd end = walkXml(bytesOf("<a>T<!--c--></b>"), visitor);
+  EXPECT_EQ(end.kind, Kind::malformed);
+  EXPECT_EQ(end.offset, 14u);
+}
+
 std::pair<std::size_t, std::size_t> lineAndColumn(std::string_view document, std::size_t offset) {
   const XmlPosition position = XmlPositions(bytesOf(document)).of(offset);
   return {position.line, position.column};
@@ -418,6 +431,8 @@ TEST(XmlPositions, CountsLinesAndColumnsFromOne) {
   EXPECT_EQ(lineAndColumn(text, 10), Place(4, 2));
   EXPECT_EQ(lineAndColumn(text, 1000), Place(4, 2));
   EXPECT_EQ(lineAndColumn("", 0), Place(1, 1));
+  EXPECT_EQ(lineAndColumn("a\r", 2), Place(2, 1));
+  EXPECT_EQ(lineAndColumn("\n\r", 2), Place(3, 1));
 }
 
 TEST(XmlPositions, MayBeAskedInAnyOrder) {
@@ -437,6 +452,21 @@ TEST(XmlPositions, CountsCharacters) {
   EXPECT_EQ(lineAndColumn("\xFF\xFE<\0\n\0a\0b\0"sv, 8), Place(2, 2));
   EXPECT_EQ(lineAndColumn("\xFE\xFF\0<\0\n\0a\0b"sv, 8), Place(2, 2));
   EXPECT_EQ(lineAndColumn("<\0\xD8\x3C\xDF\xA8x\0"sv, 1), Place(1, 2));
+  EXPECT_EQ(lineAndColumn("<\0<\xD8\xA8\xDFx\0"sv, 6), Place(1, 3));  // two units, one character
+  EXPECT_EQ(lineAndColumn("\xFF\xFE<\0a"sv, 5),
+            Place(1, 3));  // of the last character half is there
+}
+
+// Characters and first bytes that look like a byte order mark, and are none.
+TEST(XmlPositions, CountsWhatIsNoByteOrderMark) {
+  using namespace std::string_view_literals;
+  EXPECT_EQ(lineAndColumn("\uFF01x", 3), Place(1, 2));
+  EXPECT_EQ(lineAndColumn("\uFEFEx", 3), Place(1, 2));
+  EXPECT_EQ(lineAndColumn("x\uFEFFx", 4), Place(1, 3));
+  EXPECT_EQ(lineAndColumn("\xFE\xFF\xFF\x01\xFE\xFFx"sv, 6), Place(1, 3));
+  EXPECT_EQ(lineAndColumn("\xFE\xFEx", 2), Place(1, 3));  // ISO-8859-1
+  EXPECT_EQ(lineAndColumn("\xFF\xFFx", 2), Place(1, 3));
+  EXPECT_EQ(lineAndColumn("\xEF\xBBx", 2), Place(1, 3));
 }
 
 }  // namespace

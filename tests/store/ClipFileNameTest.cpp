@@ -31,6 +31,14 @@ TEST(ClipFileName, NamesTheFilesOfEyes) {
   EXPECT_EQ((ClipFileName{guid, 9}.text()), stem + ".col10");
 }
 
+TEST(ClipFileName, DiffersByGuidAndByEye) {
+  myGUID other = guid;
+  other.Data4[7] = 0;
+  EXPECT_NE((ClipFileName{guid, 1}), (ClipFileName{other, 1}));
+  EXPECT_NE((ClipFileName{guid, 1}), (ClipFileName{guid, 2}));
+  EXPECT_NE((ClipFileName{guid, 0}), (ClipFileName{guid, std::nullopt}));
+}
+
 TEST(ClipFileName, IsTheNameThatTheLibraryGives) {
   const InstalledFakeHost host;
   const auto nameIn = [](const std::string& path) {

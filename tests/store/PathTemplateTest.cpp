@@ -51,6 +51,7 @@ TEST(PathTemplate, MarksNumbersAsTheFlagsSay) {
   EXPECT_EQ(formatted("%3$#x %3$#X %3$#010X"), "0xabcd 0XABCD 0X0000ABCD");
   constexpr std::array<PathArgument, 1> zero = {0u};
   EXPECT_EQ(formatPath("%#x %1$#X", zero), "0 0");
+  EXPECT_EQ(formatted("%3$#u %3$#d"), "43981 43981");
 }
 
 TEST(PathTemplate, FillsTextsUpToTheWidth) {

@@ -10,6 +10,7 @@
 #include "oxmv/values/BlockBuilder.h"
 #include "oxmv/values/Dictionary.h"
 #include "tests/support/Decoding.h"
+#include "tests/support/Memory.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
 
@@ -185,6 +186,31 @@ TEST(BlockBuilder, TextThatIsNotUtf8IsConvertedBehindTheBytes) {
   const Slot root = builder.close(outer);
   EXPECT_EQ(Value::in(*builder.block(), root),
             Value(Dictionary{{"1001", Dictionary{{"Caf\xC3\xA9", 1}}}}));
+}
+
+// What was gathered of lists and groups is given back before there is a block.
+TEST(BlockBuilder, MakesRoomForTheBlock) {
+  constexpr std::uint32_t count = 1 << 14;  // a capacity, so that no room is left over
+  Bytes bytes;
+  for (std::uint32_t i = 0; i < count; ++i)
+    for (const int shift : {12, 8, 4, 0})
+      bytes.push_back(static_cast<std::uint8_t>('a' + (i >> shift & 0xF)));
+  const MemoryMeter meter;
+  BlockBuilder builder(bytes);
+  const auto outer = builder.open();
+  for (std::uint32_t i = 0; i < count; ++i) {
+    builder.append(1, keyOf(1), number(1));
+    builder.putNamed(2, keyOf(2), Slot::place(Form::text, 4, 4 * i), number(2));
+  }
+  const Slot root = builder.close(outer);
+  const std::size_t before = meter.held();
+  {
+    const Dictionary made = Value::in(*builder.block(), root).dictionary();
+    EXPECT_EQ(made["1001"].array().size(), std::size_t{count});
+    EXPECT_EQ(made["1002"].dictionary().size(), std::size_t{count});
+  }
+  // The bytes of an element, of a name and value twice, of a place in the order by name.
+  EXPECT_GE(before - meter.held(), std::size_t{count} * (12 + 2 * 24 + 12));
 }
 
 }  // namespace

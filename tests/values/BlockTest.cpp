@@ -25,6 +25,14 @@ TEST(Slot, HoldsFormSizeAndPlace) {
   EXPECT_EQ(slot.body(), 0xFFFFFFFEu);
 }
 
+TEST(Slot, DiffersByFormSizeAndPlace) {
+  const Slot slot = Slot::place(Form::data, 3, 5);
+  EXPECT_EQ(slot, Slot::place(Form::data, 3, 5));
+  EXPECT_NE(slot, Slot::place(Form::text, 3, 5));
+  EXPECT_NE(slot, Slot::place(Form::data, 4, 5));
+  EXPECT_NE(slot, Slot::place(Form::data, 3, 6));
+}
+
 TEST(Slot, MarkOfALentValueLeavesTheRest) {
   const Slot slot = Slot::place(Form::wholeData, Slot::maxSize, 0xFFFFFFFEu);
   EXPECT_FALSE(slot.isLent());

@@ -14,6 +14,7 @@ TEST(Characters, KeepWhatCanBeSeen) {
 
 TEST(Characters, ShowControlCharactersByTheirNumbers) {
   EXPECT_EQ(visible(std::string_view("\0\t\n\x1B\x7F", 5)), "\\x00\\x09\\x0A\\x1B\\x7F");
+  EXPECT_EQ(visible("A001 ~\x7F"), "A001 ~\\x7F");
   EXPECT_EQ(visible("\xC2\x80\xC2\x9B\xC2\x9F\xC2\xA0"), "\\u{0080}\\u{009B}\\u{009F}\xC2\xA0");
 }
 

@@ -190,6 +190,19 @@ TEST(DictionaryChanges, ChangeOfADecodedOneTakesMemoryOnce) {
 
 Value large() { return Value::data(Bytes(100'000, 0xAB)); }
 
+TEST(DictionaryChanges, RemovesWithoutMemory) {
+  Dictionary dictionary;
+  for (int i = 0; i < 100; ++i) dictionary.set(numbered(i), i);
+  {
+    const MemoryShortage shortage(0);
+    for (int i = 0; i < 98; ++i) EXPECT_TRUE(dictionary.remove(numbered(i)));
+    EXPECT_TRUE(shortage.wasFelt());
+  }
+  EXPECT_EQ(dictionary, (Dictionary{{numbered(98), 98}, {numbered(99), 99}}));
+  EXPECT_TRUE(dictionary.remove(numbered(98)));
+  EXPECT_EQ(dictionary, (Dictionary{{numbered(99), 99}}));
+}
+
 TEST(DictionaryChanges, RemovedValueIsGivenBackAtOnce) {
   Dictionary dictionary{{"REEL", "A001"}};
   const MemoryMeter meter;
@@ -284,6 +297,22 @@ TEST(DictionaryChanges, BlockOfNumbersIsLeftWithTheFirstChange) {
   dictionary.set("SHOT", 1);
   EXPECT_LT(meter.held(), 10'000u);
   EXPECT_EQ(dictionary, (Dictionary{{"TAKE", 9999}, {"LCRC", 9999}, {"SHOT", 1}}));
+}
+
+TEST(DictionaryChanges, IsIndexedWithoutWhatWasRemoved) {
+  for (int sizeBefore = 240; sizeBefore <= 260; ++sizeBefore) {
+    Dictionary dictionary;
+    for (int i = 0; i < sizeBefore; ++i) dictionary.set(numbered(i), i);
+    for (const int i : {0, 100, sizeBefore - 1}) dictionary.remove(numbered(i));
+    for (int i = sizeBefore; i < sizeBefore + 40; ++i) dictionary.set(numbered(i), i);
+    dictionary.set(numbered(100), -1);
+    ASSERT_EQ(dictionary.size(), std::size_t(sizeBefore + 38));
+    ASSERT_FALSE(dictionary.contains(numbered(0)));
+    ASSERT_FALSE(dictionary.contains(numbered(sizeBefore - 1)));
+    ASSERT_EQ(dictionary[numbered(1)], Value(1));
+    ASSERT_EQ(dictionary[numbered(sizeBefore)], Value(sizeBefore));
+    ASSERT_EQ(keys(dictionary).back(), numbered(100));
+  }
 }
 
 TEST(DictionaryChanges, CopyOfAnIndexedOneIsIndexedToo) {

@@ -99,6 +99,7 @@ TEST(Numbers, FloatOutOfRangeIsInfinite) {
   EXPECT_EQ(leadingDouble("1e309"), infinity);
   EXPECT_EQ(leadingDouble("-1e309"), -infinity);
   EXPECT_EQ(leadingDouble("1" + zeros(400)), infinity);
+  EXPECT_EQ(leadingDouble("1" + zeros(400) + "x9"), infinity);
   EXPECT_EQ(leadingDouble("1e99999999999999999999999"), infinity);
   EXPECT_EQ(leadingDouble("1E99999999999999999999999"), infinity);
 }
