@@ -70,16 +70,27 @@ TEST(Table, RemovedEntryLeavesItsPlaceVacant) {
   EXPECT_EQ(entries.value(2), Value(4));
 }
 
-TEST(Table, IsSparseOnceMostPlacesAreVacant) {
+TEST(Table, IsWastefulOnceMostPlacesAreVacant) {
   constexpr int all = 100;
   const Ref<Table> table = Table::make({}, all);
   for (int i = 0; i < all; ++i) table->set(std::to_string(1000 + i), i);
   // Of 100 places 66 are vacant when 34 are not: that is 32 more.
   for (int i = 0; i < 66; ++i) {
-    EXPECT_FALSE(table->isSparse()) << i;
+    EXPECT_FALSE(table->isWasteful()) << i;
     table->remove(*table->find(std::to_string(1000 + i)));
   }
-  EXPECT_TRUE(table->isSparse());
+  EXPECT_TRUE(table->isWasteful());
+}
+
+TEST(Table, IsWastefulOnceNothingStandsInItsBlock) {
+  const Bytes stream =
+      StreamBuilder().record("REEL", 'c', "A001").record("LOOK", 'c', "warm").bytes();
+  const Dictionary tags = decoded(stream);
+  const Ref<Table> table = Table::make(tags.entries(), 1);
+  table->set("REEL", "B002");
+  EXPECT_FALSE(table->isWasteful());
+  table->set("LOOK", "cold");
+  EXPECT_TRUE(table->isWasteful());
 }
 
 TEST(Table, TakesOverWhatWasDecoded) {
