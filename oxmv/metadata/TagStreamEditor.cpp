@@ -21,8 +21,8 @@ using BytesView = std::span<const std::uint8_t>;
 
 constexpr auto refusals =
     std::to_array<std::string_view>({"bad-path", "absent", "not-stored", "would-not-read-back",
-                                     "too-short", "marker-first", "damaged-stream"});
-static_assert(refusals.size() == static_cast<std::size_t>(EditRefusal::damagedStream) + 1);
+                                     "too-short", "marker-first", "damaged-stream", "too-deep"});
+static_assert(refusals.size() == static_cast<std::size_t>(EditRefusal::tooDeep) + 1);
 
 // Whether a stream stands for itself or within another one.
 enum class Standing : std::uint8_t { outermost, nested };
@@ -198,10 +198,14 @@ Bytes joined(const std::vector<Bytes>& records) {
 // One edit of one stream. Streams nested in it are edited by editors of their own.
 class StreamEdit {
  public:
-  StreamEdit(BytesView stream, Standing standing, const Edit& edit)
-      : stream_(stream), standing_(standing), edit_(edit) {
+  // Level 0 is the outermost stream.
+  StreamEdit(BytesView stream, int level, const Edit& edit)
+      : stream_(stream),
+        level_(level),
+        standing_(level == 0 ? Standing::outermost : Standing::nested),
+        edit_(edit) {
     SpotCollector collector(stream.size());
-    tags_ = decoded(stream, standing, &collector);
+    tags_ = decoded(stream, standing_, &collector);
     spots_ = std::move(collector.spots);
   }
 
@@ -315,6 +319,8 @@ class StreamEdit {
   }
 
   void editNested(const Target& target) {
+    // Each level takes stack, and nothing below the last one would be read.
+    if (level_ + 1 >= maxNesting) refuse(EditRefusal::tooDeep, "no stream is read so deep");
     expected_ = tags_;
     const auto inner = parse(target.rest);
     if (!inner) refuse(EditRefusal::badPath, "there is no such tag");
@@ -333,7 +339,7 @@ class StreamEdit {
 
   Bytes editInner(BytesView nested, const Target& inner, std::size_t offset) const {
     try {
-      return StreamEdit(nested, Standing::nested, edit_).run(inner);
+      return StreamEdit(nested, level_ + 1, edit_).run(inner);
     } catch (Refused& refused) {
       refused.error.offset += offset;
       throw;
@@ -502,6 +508,7 @@ class StreamEdit {
   }
 
   const BytesView stream_;
+  const int level_;
   const Standing standing_;
   const Edit& edit_;
   Dictionary tags_;          // what the stream gives
@@ -515,7 +522,7 @@ std::optional<EditError> edit(Bytes& stream, std::string_view path, const Edit& 
   const auto target = parse(path);
   if (!target) return EditError{EditRefusal::badPath, "there is no such tag"};
   try {
-    stream = StreamEdit(stream, Standing::outermost, edit).run(*target);
+    stream = StreamEdit(stream, 0, edit).run(*target);
   } catch (Refused& refused) {
     return std::move(refused.error);
   }

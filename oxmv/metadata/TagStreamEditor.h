@@ -24,6 +24,7 @@ enum class EditRefusal : std::uint8_t {
   tooShort,          // fewer than 12 bytes would be left, which nobody takes for a stream
   markerFirst,       // a marker would come first, where it is none
   damagedStream,  // the edit would change what readers make of the rest, or they would not find it
+  tooDeep,        // a path into streams nested deeper than they are read
 };
 
 // The stable code: "damaged-stream".

@@ -6,6 +6,7 @@
 
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamEditor.h"
+#include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
@@ -338,6 +339,19 @@ TEST(TagStreamEditor, EditsStreamsInStreams) {
   EXPECT_EQ(set(StreamBuilder(), "COL2/COL1/TAKE", 5), nest(5).bytes());
   expectRefused(nest(1), "COL2/COL1/WBAL", 5, "not-stored at 16");
   expectRefused(ordinary(), "COL2/WBAL", 5, "not-stored at 0");
+}
+
+TEST(TagStreamEditor, GoesAsDeepAsStreamsAreRead) {
+  std::string path = "PRCS";
+  Bytes expected = StreamBuilder().record("PRCS", 'L', 1).bytes();
+  for (int i = 1; i < maxNesting; ++i) {
+    path.insert(0, "COL1/");
+    expected = StreamBuilder().record("COL1", 0, expected).bytes();
+  }
+  EXPECT_EQ(set(StreamBuilder(), path, 1), expected);
+  EXPECT_EQ(set(StreamBuilder().raw(expected), path, 1), expected);
+  expectRefused(StreamBuilder(), "COL1/" + path, 1, "too-deep at 0");
+  expectRefused(StreamBuilder().raw(expected), "COL1/" + path, 1, "too-deep at 504");
 }
 
 TEST(TagStreamEditor, PadsWhatItWritesSoThatReadersFindWhatFollows) {
