@@ -41,15 +41,17 @@ struct Spot {
   std::size_t end;  // where the next record starts, or the stream ends
   std::uint32_t size;
   bool isStored = true;
-  std::string name;  // of a group's records: of the entry
+  std::string name;      // of a group's records: of the entry
+  bool isNamed = false;  // by the edit, which takes it out
 };
 
-// Gathers the records that a reader finds.
+// Gathers the records and the markers that a reader finds.
 class SpotCollector final : public StreamObserver {
  public:
   explicit SpotCollector(std::size_t streamSize) : streamSize_(streamSize) {}
 
   std::vector<Spot> spots;
+  std::vector<std::size_t> markers;  // where they are
 
   void onRecord(const Record& record) override {
     if (record.level != 0) return;
@@ -59,7 +61,8 @@ class SpotCollector final : public StreamObserver {
                      std::min(record.offset + length, streamSize_),
                      record.size,
                      true,
-                     {}});
+                     {},
+                     false});
   }
   void onValue(const Record& record, const Value& value) override {
     if (record.level != 0) return;
@@ -70,6 +73,9 @@ class SpotCollector final : public StreamObserver {
       case Read::regValue: spots.back().name = regName_; break;
       default: break;
     }
+  }
+  void onMarker(std::size_t offset, std::uint32_t, int level) override {
+    if (level == 0) markers.push_back(offset);
   }
   void onSkip(const Record& record, SkipReason) override { dismiss(record); }
   void onStop(std::size_t, std::size_t, int, SkipReason reason, const Record* record) override {
@@ -164,7 +170,19 @@ class Splice {
  public:
   // Puts `bytes` in place of those from `begin` to `end`.
   void replace(std::size_t begin, std::size_t end, Bytes bytes) {
-    changes_.push_back({begin, end, std::move(bytes)});
+    growth_ += offset(bytes.size()) - offset(end - begin);
+    changes_.push_back({begin, end, std::move(bytes), growth_});
+  }
+
+  // Where what was there stands after all changes; nothing for what was taken out.
+  std::optional<std::size_t> moved(std::size_t at) const {
+    const auto behind = std::upper_bound(
+        changes_.begin(), changes_.end(), at,
+        [](std::size_t place, const Change& change) { return place < change.begin; });
+    if (behind == changes_.begin()) return at;
+    const Change& before = *std::prev(behind);
+    if (at < before.end) return std::nullopt;
+    return at + static_cast<std::size_t>(before.growth);
   }
 
   Bytes applyTo(BytesView stream) const {
@@ -183,10 +201,12 @@ class Splice {
   struct Change {
     std::size_t begin, end;
     Bytes bytes;
+    std::ptrdiff_t growth;  // of the stream, by this change and those before
   };
   static std::ptrdiff_t offset(std::size_t at) { return static_cast<std::ptrdiff_t>(at); }
 
   std::vector<Change> changes_;
+  std::ptrdiff_t growth_ = 0;
 };
 
 Bytes joined(const std::vector<Bytes>& records) {
@@ -207,6 +227,7 @@ class StreamEdit {
     SpotCollector collector(stream.size());
     tags_ = decoded(stream, standing_, &collector);
     spots_ = std::move(collector.spots);
+    markers_ = std::move(collector.markers);
   }
 
   Bytes run(const Target& target) {
@@ -224,8 +245,11 @@ class StreamEdit {
 
  private:
   void check(const Bytes& edited) const {
-    if (decoded(edited, standing_) == expected_) return;
-    if (standing_ == Standing::outermost && edited.size() < shortestData) {
+    SpotCollector found(edited.size());
+    const bool isTooShort = standing_ == Standing::outermost && edited.size() < shortestData;
+    const bool isExpected = decoded(edited, standing_, &found) == expected_;
+    if (isExpected && (isTooShort || hasTheRest(found))) return;
+    if (isTooShort) {
       refuse(EditRefusal::tooShort, "fewer than 12 bytes would be left, which nobody reads", at_);
     }
     if (startsWithMarker(edited) && !startsWithMarker(stream_)) {
@@ -233,6 +257,26 @@ class StreamEdit {
     }
     refuse(EditRefusal::damagedStream,
            "readers would not find the change there, or would lose something else", at_);
+  }
+
+  // Whether readers still find every record and every marker that is not named, and each as what it
+  // was. What begins with the bytes of a marker is a tag where it comes first, or behind a marker;
+  // the value of an unknown one is nowhere to be missed.
+  bool hasTheRest(const SpotCollector& found) const {
+    const auto isFound = [&](const Spot& spot) {
+      if (spot.isNamed) return true;
+      const auto place = splice_.moved(spot.offset);
+      const auto now =
+          std::lower_bound(found.spots.begin(), found.spots.end(), place.value_or(0),
+                           [](const Spot& other, std::size_t at) { return other.offset < at; });
+      return place && now != found.spots.end() && now->offset == *place && now->tag == spot.tag;
+    };
+    const auto isFoundMarker = [&](std::size_t marker) {
+      const auto place = splice_.moved(marker);
+      return place && std::binary_search(found.markers.begin(), found.markers.end(), *place);
+    };
+    return std::all_of(spots_.begin(), spots_.end(), isFound) &&
+           std::all_of(markers_.begin(), markers_.end(), isFoundMarker);
   }
 
   static bool startsWithMarker(BytesView stream) {
@@ -467,8 +511,9 @@ class StreamEdit {
   void replaceAll(const std::vector<std::size_t>& own, const std::vector<Bytes>& records) {
     at_ = spots_[own.front()].offset;
     for (std::size_t i = 0; i < own.size(); ++i) {
-      const Spot& spot = spots_[own[i]];
+      Spot& spot = spots_[own[i]];
       checkPadding(spot);
+      spot.isNamed = true;
       splice_.replace(spot.offset, spot.end, i == 0 ? joined(records) : Bytes());
     }
   }
@@ -513,9 +558,10 @@ class StreamEdit {
   const Edit& edit_;
   Dictionary tags_;          // what the stream gives
   std::vector<Spot> spots_;  // its records
-  Splice splice_;            // what is to be changed in it
-  Dictionary expected_;      // what it is to give then
-  std::size_t at_ = 0;       // where the change begins
+  std::vector<std::size_t> markers_;
+  Splice splice_;        // what is to be changed in it
+  Dictionary expected_;  // what it is to give then
+  std::size_t at_ = 0;   // where the change begins
 };
 
 std::optional<EditError> edit(Bytes& stream, std::string_view path, const Edit& edit) {

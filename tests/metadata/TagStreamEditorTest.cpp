@@ -387,6 +387,28 @@ TEST(TagStreamEditor, RefusesToPutAMarkerFirst) {
   EXPECT_EQ(outcome(editor.remove("REEL")), "marker-first at 0");
 }
 
+// Of an unknown tag nobody misses a value: it is looked for where it stood.
+TEST(TagStreamEditor, RefusesToMakeATagOfAMarker) {
+  const auto expectNotRemoved = [](const StreamBuilder& stream, const std::string& expected) {
+    TagStreamEditor editor(stream.bytes());
+    EXPECT_EQ(outcome(editor.remove("WBAL")), expected);
+    EXPECT_EQ(editor.stream(), stream.bytes());
+  };
+  const StreamBuilder balance = StreamBuilder().record("WBAL", 'f', Bytes(16));
+  const Bytes unknown = StreamBuilder().record("NEWT", 'L', 7).bytes();
+  // As the first tag it would take the unknown one for its payload.
+  expectNotRemoved(StreamBuilder().raw(balance.bytes()).marker(0).raw(unknown),
+                   "marker-first at 0");
+  // Nobody looks for a second marker behind another.
+  expectNotRemoved(
+      StreamBuilder().record("TAKE", 'B', 1).marker(0).raw(balance.bytes()).marker(0).raw(unknown),
+      "damaged-stream at 16");
+  // The same within a stream.
+  const Bytes inner = StreamBuilder().raw(balance.bytes()).marker(0).raw(unknown).bytes();
+  TagStreamEditor editor(StreamBuilder().record("COL1", 0, inner).bytes());
+  EXPECT_EQ(outcome(editor.remove("COL1/WBAL")), "marker-first at 8");
+}
+
 TEST(TagStreamEditor, LeavesMarkersWhereTheyAre) {
   const StreamBuilder stream = StreamBuilder()
                                    .record("PRCS", 'L', 1)
@@ -449,6 +471,14 @@ TEST(TagStreamEditor, RefusesToMakeAMarkerOfATag) {
   const StreamBuilder stream =
       StreamBuilder().raw({0xBF, 0xFE, 0, 2, 4, 0, 0, 'L', 1, 0, 0, 0}).record("TAKE", 'B', 1);
   expectRefused(stream, "PRCS", 1, "damaged-stream at 0");
+  expectRefused(StreamBuilder().raw({0xBF, 0xFE, 0, 0, 4, 0, 0, 'L', 1, 0, 0, 0}), "TAKE", 1,
+                "damaged-stream at 0");
+}
+
+TEST(TagStreamEditor, RefusesToHideAnUnknownRecord) {
+  // Read as the first one only, for its payload is not all there.
+  expectRefused(StreamBuilder().header("NEWT", 9000, 'c').raw(Bytes(8, 'x')), "TAKE", 1,
+                "damaged-stream at 0");
 }
 
 TEST(TagStreamEditor, RefusesValuesThatWouldNotBeStored) {
