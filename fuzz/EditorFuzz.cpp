@@ -2,7 +2,7 @@
 //
 // - an edit that is refused says why, and changes nothing;
 // - one that is made gives a stream that reads like the old one but for what the edit names, which is
-//   as the edit says; and setting a value once more changes nothing;
+//   as the edit says; and setting a value in a stream once more changes nothing;
 // - every byte of every other record stays, in its order, those of markers and of trailing bytes, too,
 //   and so do earlier records of the same tag;
 // - what was read as a record is still read as one, and what as a marker as that;
@@ -262,7 +262,10 @@ bool edits(Bytes& stream, const Edit& edit) {
   } else {
     requireOtherBytes(edit, edit.path, before, stream);
   }
-  if (edit.operation == Operation::set && edit.fidelity == Fidelity::strict) {
+  // Beside what is set for the first time bytes become a stream that were none, with values of the same
+  // tag perhaps.
+  if (edit.operation == Operation::set && edit.fidelity == Fidelity::strict &&
+      before.size() >= shortestData) {
     require(!perform(editor, edit));
     require(editor.stream() == stream);
   }
