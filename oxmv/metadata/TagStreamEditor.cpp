@@ -317,6 +317,7 @@ class StreamEdit {
   void appendTo(const Target& target, const std::vector<std::size_t>& own) {
     if (!isRepeated(*target.row)) refuse(EditRefusal::badPath, "it is no list: set it instead");
     Encoded made = encode(target, Array::of(edit_.value));
+    if (made.tags[target.key].array().size() != 1) refuseFragments();
     std::vector<Value> elements;
     for (const Value& element : tags_[target.key].array()) elements.push_back(element);
     for (const Value& element : made.tags[target.key].array()) elements.push_back(element);
@@ -419,7 +420,15 @@ class StreamEdit {
     if (edit_.fidelity == Fidelity::strict && made.tags[target.key] != value) {
       refuse(EditRefusal::wouldNotReadBack, "it would come back changed");
     }
+    const bool isOne = !isRepeated(*target.row) && !isGroup(*target.row);
+    if (isOne && made.records.size() != 1) refuseFragments();
     return made;
+  }
+
+  // Of a size whose low 16 bits are kept readers see the start of the bytes as the value; and in the
+  // others, which may be anything, records.
+  [[noreturn]] static void refuseFragments() {
+    refuse(EditRefusal::wouldNotReadBack, "it would come back in pieces");
   }
 
   // The records of a group's entry. `isThere`: only its value counts, for the name in the stream

@@ -39,7 +39,7 @@ struct EditError {
 // What is done with a value that a stream cannot carry as it is.
 enum class Fidelity : std::uint8_t {
   strict,  // the edit is refused
-  lossy,   // it is made, with what the encoder makes of the value
+  lossy,   // it is made, with what the encoder makes of the value; in pieces not even so
 };
 
 // Sets, appends and removes tags in a stream. Every byte of every record that an edit does not name

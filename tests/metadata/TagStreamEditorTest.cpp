@@ -502,6 +502,37 @@ TEST(TagStreamEditor, RefusesValuesThatWouldComeBackChangedUnlessToldOtherwise) 
             StreamBuilder().raw(ordinary().bytes()).record("GAIN", 'B', 4464).bytes());
 }
 
+// The exact layout keeps 16 bits of a size: of more bytes readers take the rest for records.
+std::vector<std::uint8_t> beginningWith(const StreamBuilder& records, std::size_t size) {
+  std::vector<std::uint8_t> bytes = records.bytes();
+  bytes.resize(size);
+  return bytes;
+}
+
+TEST(TagStreamEditor, RefusesDataThatWouldComeBackInPieces) {
+  const Value fragments =
+      Value::data(beginningWith(StreamBuilder().record("FREE", 'c', Bytes{7, 0, 0, 0}), 65536));
+  TagStreamEditor editor(ordinary().bytes(), Layout::exact);
+  EXPECT_EQ(outcome(editor.set("FREE", fragments)), "would-not-read-back at 0");
+  EXPECT_EQ(outcome(editor.set("FREE", fragments, Fidelity::lossy)), "would-not-read-back at 0");
+  EXPECT_EQ(editor.stream(), ordinary().bytes());
+  const Value others = Value::data(beginningWith(StreamBuilder().record("TAKE", 'B', 9), 65536));
+  EXPECT_EQ(outcome(editor.set("FREE", others, Fidelity::lossy)), "done");
+  EXPECT_EQ(editor.stream(),
+            StreamBuilder().raw(ordinary().bytes()).record("FREE", 'c', Bytes()).bytes());
+}
+
+TEST(TagStreamEditor, RefusesAnElementThatWouldComeBackAsTwo) {
+  // 16 bits of its size keep 8 bytes; in the zeros behind them readers go on until they find another.
+  const Value element = Dictionary{{"FREE", Value::data(std::vector<std::uint8_t>(65528))},
+                                   {"DSPm", Array::of(Dictionary())}};
+  TagStreamEditor exact(ordinary().bytes(), Layout::exact);
+  EXPECT_EQ(outcome(exact.append("DSPm", element, Fidelity::lossy)), "would-not-read-back at 0");
+  EXPECT_EQ(exact.stream(), ordinary().bytes());
+  TagStreamEditor readable(ordinary().bytes(), Layout::readable);
+  EXPECT_EQ(outcome(readable.append("DSPm", element, Fidelity::lossy)), "done");
+}
+
 TEST(TagStreamEditor, RefusesPathsThatNameNothing) {
   for (const char* path :
        {"", "REE", "REELS", "ZZZZ", "REEL/TAKE", "COL1/", "COL1/ZZZZ", "COL1REEL", "DSPm/TAKE"}) {
