@@ -43,6 +43,11 @@ struct Spot {
   bool isStored = true;
   std::string name;      // of a group's records: of the entry
   bool isNamed = false;  // by the edit, which takes it out
+
+  // How many bytes of its payload are there.
+  std::size_t payload() const {
+    return std::min<std::size_t>(size, end - offset - recordHeaderSize);
+  }
 };
 
 // Gathers the records and the markers that a reader finds.
@@ -261,7 +266,8 @@ class StreamEdit {
 
   // Whether readers still find every record and every marker that is not named, and each as what it
   // was. What begins with the bytes of a marker is a tag where it comes first, or behind a marker;
-  // the value of an unknown one is nowhere to be missed.
+  // and a payload that is not all there takes what is put behind it. Of an unknown tag no value would
+  // be missed.
   bool hasTheRest(const SpotCollector& found) const {
     const auto isFound = [&](const Spot& spot) {
       if (spot.isNamed) return true;
@@ -269,7 +275,8 @@ class StreamEdit {
       const auto now =
           std::lower_bound(found.spots.begin(), found.spots.end(), place.value_or(0),
                            [](const Spot& other, std::size_t at) { return other.offset < at; });
-      return place && now != found.spots.end() && now->offset == *place && now->tag == spot.tag;
+      return place && now != found.spots.end() && now->offset == *place && now->tag == spot.tag &&
+             now->payload() == spot.payload();
     };
     const auto isFoundMarker = [&](std::size_t marker) {
       const auto place = splice_.moved(marker);

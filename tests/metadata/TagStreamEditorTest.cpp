@@ -475,6 +475,16 @@ TEST(TagStreamEditor, RefusesToMakeAMarkerOfATag) {
                 "damaged-stream at 0");
 }
 
+TEST(TagStreamEditor, RefusesToPutARecordIntoAPayload) {
+  // The first record lacks 12 bytes, as many as the first one that is put in; which, a name whose value
+  // is lost, would not be missed.
+  const StreamBuilder stream = StreamBuilder().header("CTFO", 16, 'c').raw({1, 2, 3, 4});
+  TagStreamEditor editor(stream.bytes());
+  const Value group = Dictionary{{"a", "text"}, {"b", 1}};
+  EXPECT_EQ(outcome(editor.set("REG ", group, Fidelity::lossy)), "damaged-stream at 12");
+  EXPECT_EQ(editor.stream(), stream.bytes());
+}
+
 TEST(TagStreamEditor, RefusesToHideAnUnknownRecord) {
   // Read as the first one only, for its payload is not all there.
   expectRefused(StreamBuilder().header("NEWT", 9000, 'c').raw(Bytes(8, 'x')), "TAKE", 1,
