@@ -1,10 +1,10 @@
 // Any bytes as edits and, behind them, the stream that is edited. What must hold for all of them:
 //
 // - an edit that is refused says why, and changes nothing;
-// - one that is made gives a stream that reads like the old one but for what the edit names, which is
-//   as the edit says; and setting a value in a stream once more changes nothing;
-// - every byte of every other record stays, in its order, those of markers and of trailing bytes, too,
-//   and so do earlier records of the same tag;
+// - one that is made gives a stream that reads like the old one but for what the edit names, which
+//   is as the edit says; and setting a value in a stream once more changes nothing;
+// - every byte of every other record stays, in its order, those of markers and of trailing bytes,
+//   too, and so do earlier records of the same tag;
 // - what was read as a record is still read as one, and what as a marker as that;
 // - an edit that leads from a dictionary that streams can carry to another one is made.
 
@@ -262,8 +262,8 @@ bool edits(Bytes& stream, const Edit& edit) {
   } else {
     requireOtherBytes(edit, edit.path, before, stream);
   }
-  // Beside what is set for the first time bytes become a stream that were none, with values of the same
-  // tag perhaps.
+  // Beside what is set for the first time bytes become a stream that were none, with values of the
+  // same tag perhaps.
   if (edit.operation == Operation::set && edit.fidelity == Fidelity::strict &&
       before.size() >= shortestData) {
     require(!perform(editor, edit));

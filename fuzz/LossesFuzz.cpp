@@ -1,5 +1,5 @@
-// Any bytes as a dictionary: first as a tag stream that is decoded, then as choices of keys and values.
-// What must hold for all of them, in both layouts:
+// Any bytes as a dictionary: first as a tag stream that is decoded, then as choices of keys and
+// values. What must hold for all of them, in both layouts:
 //
 // - no loss is named exactly when saving and loading gives the same dictionary;
 // - every loss that is named is real (of many, some are tried), and none is named twice;

@@ -1,7 +1,7 @@
 // Any bytes as a tag stream: decoded, encoded, decoded again. What must hold for all of them:
 //
-// - a listening observer, for whom the decoder takes the long way, changes nothing: neither values nor
-//   their order nor the identity; and hears of no more records than there are bytes;
+// - a listening observer, for whom the decoder takes the long way, changes nothing: neither values
+//   nor their order nor the identity; and hears of no more records than there are bytes;
 // - a dictionary encodes the same whether it is a view of its stream or was built entry by entry;
 // - the readable layout is walked to its end: no record in it is cut, too large or left over;
 // - in it come back what fits its record as it was read: numbers, lists of numbers, data;

@@ -266,8 +266,8 @@ class StreamEdit {
 
   // Whether readers still find every record and every marker that is not named, and each as what it
   // was. What begins with the bytes of a marker is a tag where it comes first, or behind a marker;
-  // and a payload that is not all there takes what is put behind it. Of an unknown tag no value would
-  // be missed.
+  // and a payload that is not all there takes what is put behind it. Of an unknown tag no value
+  // would be missed.
   bool hasTheRest(const SpotCollector& found) const {
     const auto isFound = [&](const Spot& spot) {
       if (spot.isNamed) return true;
@@ -432,8 +432,8 @@ class StreamEdit {
     return made;
   }
 
-  // Of a size whose low 16 bits are kept readers see the start of the bytes as the value; and in the
-  // others, which may be anything, records.
+  // Of a size whose low 16 bits are kept readers see the start of the bytes as the value; and in
+  // the others, which may be anything, records.
   [[noreturn]] static void refuseFragments() {
     refuse(EditRefusal::wouldNotReadBack, "it would come back in pieces");
   }
