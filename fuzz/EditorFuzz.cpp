@@ -1,10 +1,11 @@
 // Any bytes as edits and, behind them, the stream that is edited. What must hold for all of them:
 //
 // - an edit that is refused says why, and changes nothing;
-// - one that is made gives a stream that reads like the old one but for what the edit names, which is
-//   as the edit says; and setting a value once more changes nothing;
-// - every byte of every other record stays, in its order, those of markers and of trailing bytes, too,
-//   and so do earlier records of the same tag;
+// - one that is made gives a stream that reads like the old one but for what the edit names, which
+//   is as the edit says; and setting a value in a stream once more changes nothing;
+// - every byte of every other record stays, in its order, those of markers and of trailing bytes,
+//   too, and so do earlier records of the same tag;
+// - what was read as a record is still read as one, and what as a marker as that;
 // - an edit that leads from a dictionary that streams can carry to another one is made.
 
 #include <algorithm>
@@ -163,6 +164,30 @@ Bytes otherBytes(const TagRow& row, const std::vector<StreamPart>& parts) {
   return bytes;
 }
 
+// Whether it is what the edit of the row leaves: a marker, or a record of another tag.
+bool isOther(const TagRow& row, const StreamPart& part) {
+  if (!part.tag) return part.isMarker;
+  const Tag tag = *part.tag;
+  if (row.write == Write::tagGroup) return tag != "TAGN"_tag && tag != "TAGV"_tag;
+  if (row.write == Write::regGroup) return tag != "REGN"_tag && tag != "REGV"_tag;
+  return tag != row.tag && (row.write != Write::controlPoint || tag != Tag{});
+}
+
+// Each of those is still there, as what it was, and in its order. What trailed may be read as well.
+void requireOthers(const TagRow& row, const std::vector<StreamPart>& parts,
+                   const std::vector<StreamPart>& partsAfter) {
+  auto after = partsAfter.begin();
+  for (const StreamPart& part : parts) {
+    if (!isOther(row, part)) continue;
+    const auto isSame = [&](const StreamPart& other) {
+      return other.tag == part.tag && other.isMarker == part.isMarker && other.bytes == part.bytes;
+    };
+    after = std::find_if(after, partsAfter.end(), isSame);
+    require(after != partsAfter.end());
+    ++after;
+  }
+}
+
 std::vector<StreamPart> recordsOf(Tag tag, const std::vector<StreamPart>& parts) {
   std::vector<StreamPart> records;
   for (const StreamPart& part : parts) {
@@ -181,7 +206,7 @@ std::optional<BytesView> nestedIn(const std::vector<StreamPart>& records) {
   return std::nullopt;
 }
 
-// Whether a record is read that is not all there. It may trail, unread, when another comes before it.
+// Whether a record is read that is not all there.
 bool hasCutRecord(const std::vector<StreamPart>& parts) {
   return std::any_of(parts.begin(), parts.end(), [](const StreamPart& part) {
     if (!part.tag) return false;
@@ -195,7 +220,10 @@ void requireOtherBytes(const Edit& edit, std::string_view path, BytesView before
   require(row != nullptr);
   const auto parts = partsOf(before);
   const auto partsAfter = partsOf(after);
-  if (hasCutRecord(parts) || hasCutRecord(partsAfter)) return;  // requireReads() has looked
+  // Fewer bytes have no marker in them, and are no stream to those who load it.
+  if (after.size() >= shortestData) requireOthers(*row, parts, partsAfter);
+  // What trails may be read as a record of the tag, without a value.
+  if (hasCutRecord(parts) || hasCutRecord(partsAfter)) return;
   require(otherBytes(*row, parts) == otherBytes(*row, partsAfter));
   if (isGroup(*row) || isRepeated(*row)) return;
   if (!isInside(path) && edit.operation == Operation::remove) return;
@@ -234,7 +262,10 @@ bool edits(Bytes& stream, const Edit& edit) {
   } else {
     requireOtherBytes(edit, edit.path, before, stream);
   }
-  if (edit.operation == Operation::set && edit.fidelity == Fidelity::strict) {
+  // Beside what is set for the first time bytes become a stream that were none, with values of the
+  // same tag perhaps.
+  if (edit.operation == Operation::set && edit.fidelity == Fidelity::strict &&
+      before.size() >= shortestData) {
     require(!perform(editor, edit));
     require(editor.stream() == stream);
   }

@@ -1,12 +1,12 @@
 // Any bytes as a look description. What must hold for all of them:
 //
-// - both ways of parsing give the same nodes, at the same places, or the same problem, also where the
-//   nodes may have little text of their own;
+// - both ways of parsing give the same nodes, at the same places, or the same problem, also where
+//   the nodes may have little text of their own;
 // - a text that is said to stand in the file stands there;
 // - every table reads the same with portable and with vector instructions, and stays in its record.
 //
-// The bytes 1 and 2, which no XML has, stand for runs long enough to be left out of the parsing, the
-// second with every kind of line end, so that small inputs reach that, too.
+// The bytes 1 and 2, which no XML has, stand for runs long enough to be left out of the parsing,
+// the second with every kind of line end, so that small inputs reach that, too.
 
 #include <algorithm>
 #include <cstddef>

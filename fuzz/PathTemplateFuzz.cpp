@@ -1,13 +1,13 @@
 // Any bytes as a path template, as the name of a clip's file, and as choices of conversions and of
 // settings. What must hold for all of them:
 //
-// - conversions add digits, signs and blanks, and the texts that they are given: no slash, no dot and
-//   no NUL of their own, so that no path leaves the folder that its template and texts name; nor does
-//   it get longer than all of them with the widest padding;
+// - conversions add digits, signs and blanks, and the texts that they are given: no slash, no dot
+//   and no NUL of their own, so that no path leaves the folder that its template and texts name;
+//   nor does it get longer than all of them with the widest padding;
 // - a text with its percent signs doubled comes out as it was;
 // - a number is written as printf writes it, and a text is padded to its width;
-// - the built-in templates give the name of a clip's file in the folder of the database, whatever that
-//   is, and that name is the clip's again; no other name is taken for one.
+// - the built-in templates give the name of a clip's file in the folder of the database, whatever
+//   that is, and that name is the clip's again; no other name is taken for one.
 
 #include <algorithm>
 #include <array>

@@ -1,10 +1,10 @@
-// Any bytes as the text of a preferences file: read, then edited key by key. What must hold for all of
-// them that are TOML:
+// Any bytes as the text of a preferences file: read, then edited key by key. What must hold for all
+// of them that are TOML:
 //
 // - every key can be set and removed, and a key that is not there can be added;
 // - after that, exactly that key says something else;
-// - a line that was added and removed again leaves the text byte for byte as it was, but for the line
-//   end that it may have put behind the last line.
+// - a line that was added and removed again leaves the text byte for byte as it was, but for the
+//   line end that it may have put behind the last line.
 
 #include <cstddef>
 #include <cstdint>

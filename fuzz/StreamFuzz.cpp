@@ -1,9 +1,10 @@
 // Any bytes as a tag stream: decoded, encoded, decoded again. What must hold for all of them:
 //
-// - a listening observer, for whom the decoder takes the long way, changes nothing: neither values nor
-//   their order nor the identity; and hears of no more records than there are bytes;
+// - a listening observer, for whom the decoder takes the long way, changes nothing: neither values
+//   nor their order nor the identity; and hears of no more records than there are bytes;
 // - a dictionary encodes the same whether it is a view of its stream or was built entry by entry;
 // - the readable layout is walked to its end: no record in it is cut, too large or left over;
+// - in it come back what fits its record as it was read: numbers, lists of numbers, data;
 // - what comes back from a stream unchanged is encoded in the same bytes from then on;
 // - picked out of the stream one by one the values are those of the dictionary.
 
@@ -51,6 +52,40 @@ Dictionary rebuilt(const Dictionary& tags) {
   return copy;
 }
 
+// Whether whatever was read under the tag comes back.
+bool alwaysComesBack(const TagRow& row) {
+  switch (row.read) {
+    case Read::int32:
+    case Read::uint8:
+    case Read::uint16:
+    case Read::float32:
+    case Read::floats:
+    case Read::ints:
+    case Read::data:
+    case Read::guid: return row.write != Write::none;
+    case Read::none:
+    case Read::text:
+    case Read::integers:
+    case Read::nested:
+    case Read::texts:
+    case Read::nestedList:
+    case Read::controlPoint:
+    case Read::tagName:
+    case Read::tagValue:
+    case Read::regName:
+    case Read::regValue: break;
+  }
+  return false;
+}
+
+void compareBack(const Dictionary& tags, const Dictionary& back) {
+  for (const auto& [key, value] : tags) {
+    const TagRow* row = findTagRow(key);
+    require(row != nullptr);
+    if (alwaysComesBack(*row)) require(back[key] == value);
+  }
+}
+
 // Those of every tag, and of one that has no row.
 void comparePicked(std::span<const std::uint8_t> bytes, const Dictionary& tags) {
   static const std::vector<Tag> wanted = [] {
@@ -89,6 +124,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   Counter again;
   const Dictionary back = decode(*readable, &again);
   require(again.stops == 0);
+  compareBack(tags, back);
   if (back == tags) require(encodeStream(back, Layout::readable) == readable);
   comparePicked(bytes, tags);
   return 0;

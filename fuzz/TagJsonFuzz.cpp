@@ -1,9 +1,9 @@
-// Any bytes as tag JSON, as the JSON of one value, as a tag stream and as choices of keys and values. What
-// must hold for all of them:
+// Any bytes as tag JSON, as the JSON of one value, as a tag stream and as choices of keys and
+// values. What must hold for all of them:
 //
 // - a text is read, or refused with a code, words that can be shown, and a place that is in it;
-// - a dictionary read from JSON, decoded from a stream or made by hand goes through JSON unchanged, in
-//   its order; and what was written once is written the same again.
+// - a dictionary read from JSON, decoded from a stream or made by hand goes through JSON unchanged,
+//   in its order; and what was written once is written the same again.
 
 #include <algorithm>
 #include <cstddef>

@@ -1,9 +1,9 @@
 // Any bytes as what `set` takes: PATH=VALUE, or PATH:=JSON. What must hold for all of them:
 //
-// - a path is refused with words that can be shown, or is a path of tags, and its own text is the same
-//   path again;
-// - so is a value; one that is taken reads the same from its JSON and, if it is of numbers, from the
-//   digits in which it is shown;
+// - a path is refused with words that can be shown, or is a path of tags, and its own text is the
+//   same path again;
+// - so is a value; one that is taken reads the same from its JSON and, if it is of numbers, from
+//   the digits in which it is shown;
 // - it stands where the path says, and nowhere else.
 
 #include <cmath>

@@ -1,5 +1,5 @@
-// Prints the words that tag streams are made of, from the tag table, as libFuzzer takes a dictionary:
-// the fuzzer puts them in where it tries something.
+// Prints the words that tag streams are made of, from the tag table, as libFuzzer takes a
+// dictionary: the fuzzer puts them in where it tries something.
 
 #include <cstdint>
 #include <cstdio>

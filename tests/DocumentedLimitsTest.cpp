@@ -8,6 +8,7 @@
 
 #include <gtest/gtest.h>
 
+#include "cli/LookFindings.h"
 #include "oxmv/host/PreferencesFile.h"
 #include "oxmv/import/CameraTables.h"
 #include "oxmv/looks/LookImport.h"
@@ -55,6 +56,7 @@ TEST(DocumentedLimits, AreThoseOfTheCode) {
       {"maxLookSize", maxLookSize},
       {"maxImportedBytes", maxImportedBytes},
       {"maxImportedFiles", maxImportedFiles},
+      {"mostLookTables", cli::mostLookTables},
       {"maxXmlDepth", maxXmlDepth},
       {"maxXmlNestedEntities", maxXmlNestedEntities},
       {"maxXmlDeclaredAttributes", maxXmlDeclaredAttributes},

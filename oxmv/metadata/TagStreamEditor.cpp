@@ -21,8 +21,8 @@ using BytesView = std::span<const std::uint8_t>;
 
 constexpr auto refusals =
     std::to_array<std::string_view>({"bad-path", "absent", "not-stored", "would-not-read-back",
-                                     "too-short", "marker-first", "damaged-stream"});
-static_assert(refusals.size() == static_cast<std::size_t>(EditRefusal::damagedStream) + 1);
+                                     "too-short", "marker-first", "damaged-stream", "too-deep"});
+static_assert(refusals.size() == static_cast<std::size_t>(EditRefusal::tooDeep) + 1);
 
 // Whether a stream stands for itself or within another one.
 enum class Standing : std::uint8_t { outermost, nested };
@@ -41,15 +41,22 @@ struct Spot {
   std::size_t end;  // where the next record starts, or the stream ends
   std::uint32_t size;
   bool isStored = true;
-  std::string name;  // of a group's records: of the entry
+  std::string name;      // of a group's records: of the entry
+  bool isNamed = false;  // by the edit, which takes it out
+
+  // How many bytes of its payload are there.
+  std::size_t payload() const {
+    return std::min<std::size_t>(size, end - offset - recordHeaderSize);
+  }
 };
 
-// Gathers the records that a reader finds.
+// Gathers the records and the markers that a reader finds.
 class SpotCollector final : public StreamObserver {
  public:
   explicit SpotCollector(std::size_t streamSize) : streamSize_(streamSize) {}
 
   std::vector<Spot> spots;
+  std::vector<std::size_t> markers;  // where they are
 
   void onRecord(const Record& record) override {
     if (record.level != 0) return;
@@ -59,7 +66,8 @@ class SpotCollector final : public StreamObserver {
                      std::min(record.offset + length, streamSize_),
                      record.size,
                      true,
-                     {}});
+                     {},
+                     false});
   }
   void onValue(const Record& record, const Value& value) override {
     if (record.level != 0) return;
@@ -70,6 +78,9 @@ class SpotCollector final : public StreamObserver {
       case Read::regValue: spots.back().name = regName_; break;
       default: break;
     }
+  }
+  void onMarker(std::size_t offset, std::uint32_t, int level) override {
+    if (level == 0) markers.push_back(offset);
   }
   void onSkip(const Record& record, SkipReason) override { dismiss(record); }
   void onStop(std::size_t, std::size_t, int, SkipReason reason, const Record* record) override {
@@ -164,7 +175,19 @@ class Splice {
  public:
   // Puts `bytes` in place of those from `begin` to `end`.
   void replace(std::size_t begin, std::size_t end, Bytes bytes) {
-    changes_.push_back({begin, end, std::move(bytes)});
+    growth_ += offset(bytes.size()) - offset(end - begin);
+    changes_.push_back({begin, end, std::move(bytes), growth_});
+  }
+
+  // Where what was there stands after all changes; nothing for what was taken out.
+  std::optional<std::size_t> moved(std::size_t at) const {
+    const auto behind = std::upper_bound(
+        changes_.begin(), changes_.end(), at,
+        [](std::size_t place, const Change& change) { return place < change.begin; });
+    if (behind == changes_.begin()) return at;
+    const Change& before = *std::prev(behind);
+    if (at < before.end) return std::nullopt;
+    return at + static_cast<std::size_t>(before.growth);
   }
 
   Bytes applyTo(BytesView stream) const {
@@ -183,10 +206,12 @@ class Splice {
   struct Change {
     std::size_t begin, end;
     Bytes bytes;
+    std::ptrdiff_t growth;  // of the stream, by this change and those before
   };
   static std::ptrdiff_t offset(std::size_t at) { return static_cast<std::ptrdiff_t>(at); }
 
   std::vector<Change> changes_;
+  std::ptrdiff_t growth_ = 0;
 };
 
 Bytes joined(const std::vector<Bytes>& records) {
@@ -198,11 +223,16 @@ Bytes joined(const std::vector<Bytes>& records) {
 // One edit of one stream. Streams nested in it are edited by editors of their own.
 class StreamEdit {
  public:
-  StreamEdit(BytesView stream, Standing standing, const Edit& edit)
-      : stream_(stream), standing_(standing), edit_(edit) {
+  // Level 0 is the outermost stream.
+  StreamEdit(BytesView stream, int level, const Edit& edit)
+      : stream_(stream),
+        level_(level),
+        standing_(level == 0 ? Standing::outermost : Standing::nested),
+        edit_(edit) {
     SpotCollector collector(stream.size());
-    tags_ = decoded(stream, standing, &collector);
+    tags_ = decoded(stream, standing_, &collector);
     spots_ = std::move(collector.spots);
+    markers_ = std::move(collector.markers);
   }
 
   Bytes run(const Target& target) {
@@ -220,8 +250,11 @@ class StreamEdit {
 
  private:
   void check(const Bytes& edited) const {
-    if (decoded(edited, standing_) == expected_) return;
-    if (standing_ == Standing::outermost && edited.size() < shortestData) {
+    SpotCollector found(edited.size());
+    const bool isTooShort = standing_ == Standing::outermost && edited.size() < shortestData;
+    const bool isExpected = decoded(edited, standing_, &found) == expected_;
+    if (isExpected && (isTooShort || hasTheRest(found))) return;
+    if (isTooShort) {
       refuse(EditRefusal::tooShort, "fewer than 12 bytes would be left, which nobody reads", at_);
     }
     if (startsWithMarker(edited) && !startsWithMarker(stream_)) {
@@ -229,6 +262,28 @@ class StreamEdit {
     }
     refuse(EditRefusal::damagedStream,
            "readers would not find the change there, or would lose something else", at_);
+  }
+
+  // Whether readers still find every record and every marker that is not named, and each as what it
+  // was. What begins with the bytes of a marker is a tag where it comes first, or behind a marker;
+  // and a payload that is not all there takes what is put behind it. Of an unknown tag no value
+  // would be missed.
+  bool hasTheRest(const SpotCollector& found) const {
+    const auto isFound = [&](const Spot& spot) {
+      if (spot.isNamed) return true;
+      const auto place = splice_.moved(spot.offset);
+      const auto now =
+          std::lower_bound(found.spots.begin(), found.spots.end(), place.value_or(0),
+                           [](const Spot& other, std::size_t at) { return other.offset < at; });
+      return place && now != found.spots.end() && now->offset == *place && now->tag == spot.tag &&
+             now->payload() == spot.payload();
+    };
+    const auto isFoundMarker = [&](std::size_t marker) {
+      const auto place = splice_.moved(marker);
+      return place && std::binary_search(found.markers.begin(), found.markers.end(), *place);
+    };
+    return std::all_of(spots_.begin(), spots_.end(), isFound) &&
+           std::all_of(markers_.begin(), markers_.end(), isFoundMarker);
   }
 
   static bool startsWithMarker(BytesView stream) {
@@ -269,6 +324,7 @@ class StreamEdit {
   void appendTo(const Target& target, const std::vector<std::size_t>& own) {
     if (!isRepeated(*target.row)) refuse(EditRefusal::badPath, "it is no list: set it instead");
     Encoded made = encode(target, Array::of(edit_.value));
+    if (made.tags[target.key].array().size() != 1) refuseFragments();
     std::vector<Value> elements;
     for (const Value& element : tags_[target.key].array()) elements.push_back(element);
     for (const Value& element : made.tags[target.key].array()) elements.push_back(element);
@@ -315,6 +371,8 @@ class StreamEdit {
   }
 
   void editNested(const Target& target) {
+    // Each level takes stack, and nothing below the last one would be read.
+    if (level_ + 1 >= maxNesting) refuse(EditRefusal::tooDeep, "no stream is read so deep");
     expected_ = tags_;
     const auto inner = parse(target.rest);
     if (!inner) refuse(EditRefusal::badPath, "there is no such tag");
@@ -333,7 +391,7 @@ class StreamEdit {
 
   Bytes editInner(BytesView nested, const Target& inner, std::size_t offset) const {
     try {
-      return StreamEdit(nested, Standing::nested, edit_).run(inner);
+      return StreamEdit(nested, level_ + 1, edit_).run(inner);
     } catch (Refused& refused) {
       refused.error.offset += offset;
       throw;
@@ -369,7 +427,15 @@ class StreamEdit {
     if (edit_.fidelity == Fidelity::strict && made.tags[target.key] != value) {
       refuse(EditRefusal::wouldNotReadBack, "it would come back changed");
     }
+    const bool isOne = !isRepeated(*target.row) && !isGroup(*target.row);
+    if (isOne && made.records.size() != 1) refuseFragments();
     return made;
+  }
+
+  // Of a size whose low 16 bits are kept readers see the start of the bytes as the value; and in
+  // the others, which may be anything, records.
+  [[noreturn]] static void refuseFragments() {
+    refuse(EditRefusal::wouldNotReadBack, "it would come back in pieces");
   }
 
   // The records of a group's entry. `isThere`: only its value counts, for the name in the stream
@@ -461,8 +527,9 @@ class StreamEdit {
   void replaceAll(const std::vector<std::size_t>& own, const std::vector<Bytes>& records) {
     at_ = spots_[own.front()].offset;
     for (std::size_t i = 0; i < own.size(); ++i) {
-      const Spot& spot = spots_[own[i]];
+      Spot& spot = spots_[own[i]];
       checkPadding(spot);
+      spot.isNamed = true;
       splice_.replace(spot.offset, spot.end, i == 0 ? joined(records) : Bytes());
     }
   }
@@ -502,20 +569,22 @@ class StreamEdit {
   }
 
   const BytesView stream_;
+  const int level_;
   const Standing standing_;
   const Edit& edit_;
   Dictionary tags_;          // what the stream gives
   std::vector<Spot> spots_;  // its records
-  Splice splice_;            // what is to be changed in it
-  Dictionary expected_;      // what it is to give then
-  std::size_t at_ = 0;       // where the change begins
+  std::vector<std::size_t> markers_;
+  Splice splice_;        // what is to be changed in it
+  Dictionary expected_;  // what it is to give then
+  std::size_t at_ = 0;   // where the change begins
 };
 
 std::optional<EditError> edit(Bytes& stream, std::string_view path, const Edit& edit) {
   const auto target = parse(path);
   if (!target) return EditError{EditRefusal::badPath, "there is no such tag"};
   try {
-    stream = StreamEdit(stream, Standing::outermost, edit).run(*target);
+    stream = StreamEdit(stream, 0, edit).run(*target);
   } catch (Refused& refused) {
     return std::move(refused.error);
   }

@@ -24,6 +24,7 @@ enum class EditRefusal : std::uint8_t {
   tooShort,          // fewer than 12 bytes would be left, which nobody takes for a stream
   markerFirst,       // a marker would come first, where it is none
   damagedStream,  // the edit would change what readers make of the rest, or they would not find it
+  tooDeep,        // a path into streams nested deeper than they are read
 };
 
 // The stable code: "damaged-stream".
@@ -38,7 +39,7 @@ struct EditError {
 // What is done with a value that a stream cannot carry as it is.
 enum class Fidelity : std::uint8_t {
   strict,  // the edit is refused
-  lossy,   // it is made, with what the encoder makes of the value
+  lossy,   // it is made, with what the encoder makes of the value; in pieces not even so
 };
 
 // Sets, appends and removes tags in a stream. Every byte of every record that an edit does not name

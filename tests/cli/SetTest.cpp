@@ -576,6 +576,23 @@ TEST(Set, RefusesToEditWhatReadersWouldNotFind) {
   EXPECT_EQ(readFile(clip), original);
 }
 
+TEST(Set, RefusesAPathOfMoreLevelsThanStreamsHave) {
+  const EditedClip clip("walk.colr");
+  std::string word;
+  for (int i = 0; i < 20'000; ++i) word += "COL1/";
+  word += "PRCS=1";
+  const Outcome outcome = run({"set", clip.path(), word});
+  EXPECT_EQ(outcome.exitCode, 4);
+  EXPECT_TRUE(outcome.err.ends_with(
+      "COL1 is nested deeper than 64 levels (too-deep); nothing written; oxmv tags says what is"
+      " stored, and how\n"));
+  const Outcome allowed = run({"set", "--allow", "too-deep", clip.path(), word});
+  EXPECT_EQ(allowed.exitCode, 4);
+  EXPECT_TRUE(
+      allowed.err.ends_with("PRCS: no stream is read so deep (too-deep); nothing written\n"));
+  EXPECT_TRUE(clip.isUntouched());
+}
+
 TEST(Set, LeavesDamageWhereItIs) {
   const TempDir folder;
   const std::string clip = (folder / "clip.colr").string();

@@ -19,10 +19,13 @@
 #include "oxmv/metadata/Losses.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 #include "oxmv/metadata/TagLabels.h"
+#include "oxmv/metadata/TagPicker.h"
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamEditor.h"
 #include "oxmv/metadata/TagStreamEncoder.h"
+#include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/platform/JpegImage.h"
+#include "oxmv/store/Locations.h"
 #include "oxmv/values/Array.h"
 #include "tests/memory/Allocations.h"
 #include "tests/support/ChildProcess.h"
@@ -71,14 +74,24 @@ class NoMemoryForFiles : public testing::Test {
 // Text longer than what is kept in place, so that it takes memory of its own.
 const std::string longText = "a text that is too long to be kept within a value or a string";
 
+// Of every kind; the data make a stream of more than a page.
 Dictionary someTags() {
+  const Dictionary nested = {{"SATU", 0.5f}, {"REEL", longText}};
+  Dictionary point = nested;
+  point.set(controlPointKey, Array::of(1, 2));
   return {{"TIMC", "01:00:00:00"},
           {"REEL", longText},
           {"WBAL", Array::of(1.0f, 1.25f, 1.0f, 1.5f)},
           {"KWRd", Array::of(longText, "second")},
           {"TAG ", Dictionary{{"ISO", 400}, {longText, longText}}},
+          {"REG ", Dictionary{{"Mode", 2}, {longText, 3}}},
           {"TAKE", 3},
-          {"COL1", Dictionary{{"SATU", 0.5f}, {"REEL", longText}}}};
+          {"SCPg", Array::of(7, 8, 9)},
+          {"FREE", Value::data(Bytes(5000, 0x5A))},
+          {"GUID", Value::data(Bytes(16, 7))},
+          {"DSPm", Array::of(nested, Dictionary{{"TAKE", 1}})},
+          {"COL1", nested},
+          {"CTLp", Array::of(point, nested)}};
 }
 
 Bytes encodedBefore(const Dictionary& tags) { return encodeStream(tags, Layout::readable).value(); }
@@ -93,6 +106,55 @@ TEST(NoMemory, DecodingGivesAllOrThrows) {
                          EXPECT_EQ(*tags, expected);
                        }
                      });
+}
+
+TEST(NoMemory, PickedTagsAreThereOrItThrows) {
+  const Bytes stream = encodedBefore(someTags());
+  const Dictionary tags = decodeStream(stream, static_cast<std::int32_t>(stream.size()));
+  const std::vector<Tag> few = {"REEL"_tag, "TAKE"_tag, "NAME"_tag};
+  const std::vector<Tag> odd = {"REEL"_tag, "KWRd"_tag, "COL1"_tag, "FREE"_tag};
+  for (const std::vector<Tag>& wanted : {few, odd}) {
+    failEachAllocation(
+        [&] {
+          std::vector<Value> values;
+          pickTags(stream, wanted, values);
+          return values;
+        },
+        [&](const auto& values) {
+          if (!values) return;
+          ASSERT_EQ(values->size(), wanted.size());
+          for (std::size_t i = 0; i < wanted.size(); ++i) {
+            const auto key = charactersOf(wanted[i]);
+            EXPECT_EQ((*values)[i], tags[std::string_view(key.data(), key.size())]);
+          }
+        });
+  }
+}
+
+TEST(NoMemory, ValueIsAddedOrTheObjectIsAsItWas) {
+  for (const Dictionary& before : {Dictionary(), someTags()}) {
+    Dictionary after = before;
+    after.set("NAME", longText);
+    failEachAllocation(
+        [&] {
+          MetadataDictionary clip;
+          clip.setMetadata(before);
+          bool isAdded = false;
+          bool wasThrown = false;
+          try {
+            isAdded = clip.addObject(longText, "NAME");
+          } catch (const std::bad_alloc&) {
+            wasThrown = true;
+          }
+          return std::tuple(clip.metadata(), isAdded, wasThrown);
+        },
+        [&](const auto& answer) {
+          if (!answer) return;
+          const auto& [tags, isAdded, wasThrown] = *answer;
+          EXPECT_NE(isAdded, wasThrown) << "the tag takes the value";
+          EXPECT_EQ(tags, isAdded ? after : before);
+        });
+  }
 }
 
 TEST(NoMemory, EncodingGivesAllOrNothing) {
@@ -371,21 +433,72 @@ TEST_F(NoMemoryForFiles, ClipIsTheOldOneOrTheNew) {
       });
 }
 
+TEST_F(NoMemoryForFiles, OverrideIsTheOldOneOrTheNew) {
+  MetadataDictionary clip;
+  clip.setMetadata(someTags());
+  const Bytes after = clip.metaDataData().value();
+  const Bytes before = bytesOf("what is there");
+  const fs::path file = MetadataDictionary::overridePath();
+  putFile(file, before);
+  failEachAllocation([&] { return clip.writeToOverride(); },
+                     [&](const auto& isWritten) {
+                       EXPECT_EQ(getFile(file), isWritten && *isWritten ? after : before);
+                       EXPECT_EQ(namesIn(file.parent_path()),
+                                 std::set<std::string>{file.filename()});
+                       putFile(file, before);
+                     });
+}
+
+TEST_F(NoMemoryForFiles, FileOfAnEyeIsThereOrRemoved) {
+  const auto eye = MetadataDictionary::initFromGUIDForSingleEye(guid, 1);
+  const fs::path file = eye.fileURLS(1);
+  fs::create_directories(file.parent_path());
+  const Bytes before = bytesOf("what is there");
+  putFile(file, before);
+  failEachAllocation([&] { return eye.writeToGUIDFile(); },
+                     [&](const auto& isRemoved) {
+                       const bool isGone = isRemoved && *isRemoved;
+                       EXPECT_EQ(fs::exists(file), !isGone);
+                       if (!isGone) {
+                         EXPECT_EQ(getFile(file), before);
+                       }
+                       putFile(file, before);
+                     });
+}
+
+// All of it, or nothing and the reason.
+template <class Load>
+void expectLoadedOrWhyNot(Load load) {
+  const Dictionary expected = load().metadata();
+  EXPECT_FALSE(expected.empty());
+  failEachAllocation(load, [&](const auto& loaded) {
+    ASSERT_TRUE(loaded) << "it never throws";
+    const bool isLoaded = loaded->loadError() == LoadError::none;
+    EXPECT_EQ(loaded->metadata(), isLoaded ? expected : Dictionary());
+    if (!isLoaded) {
+      EXPECT_EQ(loaded->loadErrorCode(), std::errc::not_enough_memory);
+    }
+  });
+}
+
 TEST_F(NoMemoryForFiles, ClipIsLoadedOrSaysWhyNot) {
   const auto clip = MetadataDictionary::initFromGUID(guid);
   fs::create_directories(clip.fileURL().parent_path());
   putFile(clip.fileURL(), encodedBefore(someTags()));
-  const Dictionary expected = MetadataDictionary::initFromGUID(guid).metadata();
-  EXPECT_FALSE(expected.empty());
-  failEachAllocation([] { return MetadataDictionary::initFromGUID(guid); },
-                     [&](const auto& loaded) {
-                       ASSERT_TRUE(loaded) << "it never throws";
-                       const bool isLoaded = loaded->loadError() == LoadError::none;
-                       EXPECT_EQ(loaded->metadata(), isLoaded ? expected : Dictionary());
-                       if (!isLoaded) {
-                         EXPECT_EQ(loaded->loadErrorCode(), std::errc::not_enough_memory);
-                       }
-                     });
+  expectLoadedOrWhyNot([] { return MetadataDictionary::initFromGUID(guid); });
+}
+
+TEST_F(NoMemoryForFiles, OverrideIsLoadedOrSaysWhyNot) {
+  putFile(MetadataDictionary::overridePath(), encodedBefore(someTags()));
+  expectLoadedOrWhyNot([] { return MetadataDictionary::initFromOverride(); });
+}
+
+TEST_F(NoMemoryForFiles, LastIsLoadedOrSaysWhyNot) {
+  Bytes content(sizeof(myGUID), 9);
+  const Bytes stream = encodedBefore(someTags());
+  content.insert(content.end(), stream.begin(), stream.end());
+  putFile(lastFilePath(preferencesAppID), content);
+  expectLoadedOrWhyNot([] { return MetadataDictionary::initFromLast(); });
 }
 
 TEST_F(NoMemoryForFiles, LookTablesAreWhole) {

@@ -102,6 +102,22 @@ TEST(Stack, EditsADeepStream) {
   });
 }
 
+TEST(Stack, RefusesAPathOfManyLevels) {
+  std::string path;
+  for (int i = 0; i < 100'000; ++i) path += "COL1/";
+  path += "PRCS";
+  const Bytes streams[] = {{}, deepStream()};
+  expectSmallStack([&] {
+    for (const Bytes& stream : streams) {
+      TagStreamEditor editor(stream);
+      const auto error = editor.set(path, 1);
+      ASSERT_TRUE(error);
+      EXPECT_EQ(codeOf(error->refusal), "too-deep");
+      EXPECT_EQ(editor.stream(), stream);
+    }
+  });
+}
+
 TEST(Stack, DecodesEncodesAndDropsAnOrdinaryStream) {
   const Bytes stream = testData("streams/typical-clip.colr");
   expectSmallStack([&] {

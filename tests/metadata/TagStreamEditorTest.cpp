@@ -6,6 +6,7 @@
 
 #include "oxmv/metadata/TagStreamDecoder.h"
 #include "oxmv/metadata/TagStreamEditor.h"
+#include "oxmv/metadata/TagStreamFormat.h"
 #include "oxmv/values/Array.h"
 #include "tests/support/Printing.h"
 #include "tests/support/StreamBuilder.h"
@@ -358,6 +359,19 @@ TEST(TagStreamEditor, EditsStreamsInStreams) {
   expectRefused(ordinary(), "COL2/WBAL", 5, "not-stored at 0");
 }
 
+TEST(TagStreamEditor, GoesAsDeepAsStreamsAreRead) {
+  std::string path = "PRCS";
+  Bytes expected = StreamBuilder().record("PRCS", 'L', 1).bytes();
+  for (int i = 1; i < maxNesting; ++i) {
+    path.insert(0, "COL1/");
+    expected = StreamBuilder().record("COL1", 0, expected).bytes();
+  }
+  EXPECT_EQ(set(StreamBuilder(), path, 1), expected);
+  EXPECT_EQ(set(StreamBuilder().raw(expected), path, 1), expected);
+  expectRefused(StreamBuilder(), "COL1/" + path, 1, "too-deep at 0");
+  expectRefused(StreamBuilder().raw(expected), "COL1/" + path, 1, "too-deep at 504");
+}
+
 TEST(TagStreamEditor, PadsWhatItWritesSoThatReadersFindWhatFollows) {
   Bytes five(5, 0x5A);
   EXPECT_EQ(
@@ -389,6 +403,28 @@ TEST(TagStreamEditor, RefusesToPutAMarkerFirst) {
   TagStreamEditor editor(
       StreamBuilder().record("REEL", 'c', "A001").marker(2).record("TAKE", 'B', 1).bytes());
   EXPECT_EQ(outcome(editor.remove("REEL")), "marker-first at 0");
+}
+
+// Of an unknown tag nobody misses a value: it is looked for where it stood.
+TEST(TagStreamEditor, RefusesToMakeATagOfAMarker) {
+  const auto expectNotRemoved = [](const StreamBuilder& stream, const std::string& expected) {
+    TagStreamEditor editor(stream.bytes());
+    EXPECT_EQ(outcome(editor.remove("WBAL")), expected);
+    EXPECT_EQ(editor.stream(), stream.bytes());
+  };
+  const StreamBuilder balance = StreamBuilder().record("WBAL", 'f', Bytes(16));
+  const Bytes unknown = StreamBuilder().record("NEWT", 'L', 7).bytes();
+  // As the first tag it would take the unknown one for its payload.
+  expectNotRemoved(StreamBuilder().raw(balance.bytes()).marker(0).raw(unknown),
+                   "marker-first at 0");
+  // Nobody looks for a second marker behind another.
+  expectNotRemoved(
+      StreamBuilder().record("TAKE", 'B', 1).marker(0).raw(balance.bytes()).marker(0).raw(unknown),
+      "damaged-stream at 16");
+  // The same within a stream.
+  const Bytes inner = StreamBuilder().raw(balance.bytes()).marker(0).raw(unknown).bytes();
+  TagStreamEditor editor(StreamBuilder().record("COL1", 0, inner).bytes());
+  EXPECT_EQ(outcome(editor.remove("COL1/WBAL")), "marker-first at 8");
 }
 
 TEST(TagStreamEditor, LeavesMarkersWhereTheyAre) {
@@ -453,6 +489,24 @@ TEST(TagStreamEditor, RefusesToMakeAMarkerOfATag) {
   const StreamBuilder stream =
       StreamBuilder().raw({0xBF, 0xFE, 0, 2, 4, 0, 0, 'L', 1, 0, 0, 0}).record("TAKE", 'B', 1);
   expectRefused(stream, "PRCS", 1, "damaged-stream at 0");
+  expectRefused(StreamBuilder().raw({0xBF, 0xFE, 0, 0, 4, 0, 0, 'L', 1, 0, 0, 0}), "TAKE", 1,
+                "damaged-stream at 0");
+}
+
+TEST(TagStreamEditor, RefusesToPutARecordIntoAPayload) {
+  // The first record lacks 12 bytes, as many as the first one that is put in; which, a name whose value
+  // is lost, would not be missed.
+  const StreamBuilder stream = StreamBuilder().header("CTFO", 16, 'c').raw({1, 2, 3, 4});
+  TagStreamEditor editor(stream.bytes());
+  const Value group = Dictionary{{"a", "text"}, {"b", 1}};
+  EXPECT_EQ(outcome(editor.set("REG ", group, Fidelity::lossy)), "damaged-stream at 12");
+  EXPECT_EQ(editor.stream(), stream.bytes());
+}
+
+TEST(TagStreamEditor, RefusesToHideAnUnknownRecord) {
+  // Read as the first one only, for its payload is not all there.
+  expectRefused(StreamBuilder().header("NEWT", 9000, 'c').raw(Bytes(8, 'x')), "TAKE", 1,
+                "damaged-stream at 0");
 }
 
 TEST(TagStreamEditor, RefusesValuesThatWouldNotBeStored) {
@@ -474,6 +528,37 @@ TEST(TagStreamEditor, RefusesValuesThatWouldComeBackChangedUnlessToldOtherwise) 
   EXPECT_EQ(outcome(editor.set("GAIN", 70000, Fidelity::lossy)), "done");
   EXPECT_EQ(editor.stream(),
             StreamBuilder().raw(ordinary().bytes()).record("GAIN", 'B', 4464).bytes());
+}
+
+// The exact layout keeps 16 bits of a size: of more bytes readers take the rest for records.
+std::vector<std::uint8_t> beginningWith(const StreamBuilder& records, std::size_t size) {
+  std::vector<std::uint8_t> bytes = records.bytes();
+  bytes.resize(size);
+  return bytes;
+}
+
+TEST(TagStreamEditor, RefusesDataThatWouldComeBackInPieces) {
+  const Value fragments =
+      Value::data(beginningWith(StreamBuilder().record("FREE", 'c', Bytes{7, 0, 0, 0}), 65536));
+  TagStreamEditor editor(ordinary().bytes(), Layout::exact);
+  EXPECT_EQ(outcome(editor.set("FREE", fragments)), "would-not-read-back at 0");
+  EXPECT_EQ(outcome(editor.set("FREE", fragments, Fidelity::lossy)), "would-not-read-back at 0");
+  EXPECT_EQ(editor.stream(), ordinary().bytes());
+  const Value others = Value::data(beginningWith(StreamBuilder().record("TAKE", 'B', 9), 65536));
+  EXPECT_EQ(outcome(editor.set("FREE", others, Fidelity::lossy)), "done");
+  EXPECT_EQ(editor.stream(),
+            StreamBuilder().raw(ordinary().bytes()).record("FREE", 'c', Bytes()).bytes());
+}
+
+TEST(TagStreamEditor, RefusesAnElementThatWouldComeBackAsTwo) {
+  // 16 bits of its size keep 8 bytes; in the zeros behind them readers go on until they find another.
+  const Value element = Dictionary{{"FREE", Value::data(std::vector<std::uint8_t>(65528))},
+                                   {"DSPm", Array::of(Dictionary())}};
+  TagStreamEditor exact(ordinary().bytes(), Layout::exact);
+  EXPECT_EQ(outcome(exact.append("DSPm", element, Fidelity::lossy)), "would-not-read-back at 0");
+  EXPECT_EQ(exact.stream(), ordinary().bytes());
+  TagStreamEditor readable(ordinary().bytes(), Layout::readable);
+  EXPECT_EQ(outcome(readable.append("DSPm", element, Fidelity::lossy)), "done");
 }
 
 TEST(TagStreamEditor, RefusesPathsThatNameNothing) {

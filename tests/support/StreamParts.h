@@ -19,6 +19,7 @@ struct StreamPart {
   std::optional<Tag> tag;
   std::vector<std::uint8_t> bytes;
   std::size_t there;  // how many of the bytes are in the stream; padding may lack
+  bool isMarker = false;
 };
 
 // All of them together are the stream, and the padding that may lack at its end.
@@ -31,7 +32,9 @@ inline std::vector<StreamPart> partsOf(std::span<const std::uint8_t> stream) {
       if (record.level == 0) add(record.tag, record.offset, std::max(record.length, 8u));
     }
     void onMarker(std::size_t at, std::uint32_t, int level) override {
-      if (level == 0) add(std::nullopt, at, 4);
+      if (level != 0) return;
+      add(std::nullopt, at, 4);
+      parts_.back().isMarker = true;
     }
     std::vector<StreamPart> finish() {
       if (end_ < bytes_.size()) add(std::nullopt, end_, bytes_.size() - end_);
@@ -42,7 +45,7 @@ inline std::vector<StreamPart> partsOf(std::span<const std::uint8_t> stream) {
     void add(std::optional<Tag> tag, std::size_t begin, std::size_t length) {
       const auto part = bytes_.subspan(begin, std::min(length, bytes_.size() - begin));
       end_ = begin + part.size();
-      parts_.push_back({tag, {part.begin(), part.end()}, part.size()});
+      parts_.push_back({tag, {part.begin(), part.end()}, part.size(), false});
       parts_.back().bytes.resize((part.size() + 3) / 4 * 4);
     }
 
