@@ -59,8 +59,9 @@ enum class Fidelity : std::uint8_t {
 // readers find what follows.
 //
 // After each edit the stream is decoded. An edit is made only if that gives what the stream gave
-// before with nothing changed but what the edit names; else it is refused, and the stream stays as
-// it was.
+// before with nothing changed but what the edit names, and if every other record and marker is
+// found again as what it was, unknown tags included; else it is refused, and the stream stays as it
+// was.
 class TagStreamEditor {
  public:
   // The layout in which new records are encoded.
