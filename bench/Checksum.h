@@ -1,5 +1,6 @@
 // The sum that reading everything adds up. It does not depend on the order of entries, which is not
-// the same in all formats, and takes something of every key and value, so that none can be left out.
+// the same in all formats, and takes something of every key and value, so that none can be left
+// out.
 
 #pragma once
 

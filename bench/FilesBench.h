@@ -18,8 +18,8 @@ namespace bench {
 std::vector<Line> measureLooks();
 std::vector<Line> measureScan();
 
-// A look table of `points` per axis: its values as they stand in memory, and as hexadecimal text with
-// `separator` behind every `each` of them.
+// A look table of `points` per axis: its values as they stand in memory, and as hexadecimal text
+// with `separator` behind every `each` of them.
 std::vector<float> lookValues(int points);
 std::string lookText(const std::vector<float>& values, std::size_t each,
                      std::string_view separator);
@@ -50,7 +50,8 @@ class LookFolder {
   std::shared_ptr<oxmv::Host> before_;
 };
 
-// Writes a database of so many clips of 2 KB into a folder, in an order that is not that of their names.
+// Writes a database of so many clips of 2 KB into a folder, in an order that is not that of their
+// names.
 void writeClips(const std::string& folder, std::size_t count);
 
 // The command, with its standard output in /dev/null. Throws when it fails.

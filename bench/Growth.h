@@ -1,5 +1,5 @@
-// Whether a path of ours grows in step with its input: processor time and peak memory over ten doublings,
-// and the exponent of the curve that fits, 1 for twice as much for twice the input.
+// Whether a path of ours grows in step with its input: processor time and peak memory over ten
+// doublings, and the exponent of the curve that fits, 1 for twice as much for twice the input.
 
 #pragma once
 

@@ -1,5 +1,5 @@
-// What importing a look costs. The description is one table of 64 points: 786,432 values in 6.3 MB of
-// text.
+// What importing a look costs. The description is one table of 64 points: 786,432 values in 6.3 MB
+// of text.
 //
 //   import            the whole import: read, parse, convert, check, write the table and the copy
 //   to memory         the same up to the values in memory, which is as far as the others go
@@ -8,10 +8,10 @@
 //   hexadecimal       the text into values, and the same in lines and with blanks
 //   CRC-32            of 3 MB of values
 //
-// Beside them: OpenColorIO making a processor of the same table as .cube and as .clf, without its caches;
-// libdeflate's CRC-32; and digits taken one by one from a table of 256 entries. The floor of an import
-// reads the file, copies 3 MB, and writes that and the file through the same functions, so what fsync
-// takes is in both.
+// Beside them: OpenColorIO making a processor of the same table as .cube and as .clf, without its
+// caches; libdeflate's CRC-32; and digits taken one by one from a table of 256 entries. The floor
+// of an import reads the file, copies 3 MB, and writes that and the file through the same
+// functions, so what fsync takes is in both.
 
 #include <array>
 #include <bit>

@@ -49,8 +49,9 @@ struct Operation {
 // Every operation of every codec on every corpus; the documents are made when one first needs them.
 std::vector<Operation>& operations();
 
-// Checks of the codecs themselves, each to be run once: that they read the same content as ours from
-// every document, from one that they encoded, and from one that they edited. Throw std::logic_error.
+// Checks of the codecs themselves, each to be run once: that they read the same content as ours
+// from every document, from one that they encoded, and from one that they edited. Throw
+// std::logic_error.
 std::vector<std::function<void()>>& checks();
 
 // Adds the operations and checks of all codecs: ours, the peers and the floors. Each of these has a

@@ -1,5 +1,6 @@
 // MessagePack with msgpack-cxx: a tree of objects in a zone of each document's own. Its texts are
-// copied into the zone, so the stream may go; maps are arrays of pairs that can be changed in place.
+// copied into the zone, so the stream may go; maps are arrays of pairs that can be changed in
+// place.
 
 #include <msgpack.hpp>
 

@@ -1,5 +1,5 @@
-// JSON text with RapidJSON: a tree in a pool of each document's own, its texts copied there. Read in
-// place it would be faster, but then the document would lean on a text that it has changed.
+// JSON text with RapidJSON: a tree in a pool of each document's own, its texts copied there. Read
+// in place it would be faster, but then the document would lean on a text that it has changed.
 
 #include <rapidjson/document.h>
 #include <rapidjson/stringbuffer.h>

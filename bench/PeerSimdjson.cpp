@@ -1,6 +1,6 @@
-// JSON text with simdjson's DOM: a tape and a buffer of texts, owned by each document; the parser is
-// made once and reused. The tape cannot be changed, so this is no peer of an editable dictionary: it
-// is shown for what reading alone can reach.
+// JSON text with simdjson's DOM: a tape and a buffer of texts, owned by each document; the parser
+// is made once and reused. The tape cannot be changed, so this is no peer of an editable
+// dictionary: it is shown for what reading alone can reach.
 
 #include <simdjson.h>
 

@@ -1,5 +1,5 @@
-// What the measurements come to: each operation's time against the fastest comparable peer's, the aim
-// we have set ourselves, and the floor that nobody gets below.
+// What the measurements come to: each operation's time against the fastest comparable peer's, the
+// aim we have set ourselves, and the floor that nobody gets below.
 
 #pragma once
 

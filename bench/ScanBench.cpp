@@ -3,10 +3,10 @@
 //   db list           `oxmv db list`: the table of all clips; the same as CSV and as NDJSON
 //   db check          `oxmv db check`
 //
-// 20,000 clips of 2 KB, all in the system's memory. The output goes to /dev/null. The floor reads the
-// names in the folder, and opens, reads into one buffer and closes each file. On one processor time is
-// what the processor took; on two, where the floor has a thread for each half of the files, it is that
-// of the clock on the wall.
+// 20,000 clips of 2 KB, all in the system's memory. The output goes to /dev/null. The floor reads
+// the names in the folder, and opens, reads into one buffer and closes each file. On one processor
+// time is what the processor took; on two, where the floor has a thread for each half of the files,
+// it is that of the clock on the wall.
 
 #include <cstdint>
 #include <cstdlib>

@@ -1,5 +1,5 @@
-// Things that take long enough for a clock, measured side by side: each in turn, in every round, so that
-// a machine that is slow for a while is slow for all of them.
+// Things that take long enough for a clock, measured side by side: each in turn, in every round, so
+// that a machine that is slow for a while is slow for all of them.
 
 #pragma once
 
@@ -21,8 +21,8 @@ struct Measured {
 // Measures them all, after a round that nobody counts.
 void measureSideBySide(std::span<Measured> all, int rounds);
 
-// A folder of its own, gone with it: where temporary files are, or in memory where the system has such
-// a place, because a disk's fsync takes longer than all that is measured.
+// A folder of its own, gone with it: where temporary files are, or in memory where the system has
+// such a place, because a disk's fsync takes longer than all that is measured.
 class OwnFolder {
  public:
   explicit OwnFolder(bool inMemory);

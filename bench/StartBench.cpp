@@ -4,7 +4,8 @@
 //   oxmv_bench_start OXMV EMPTY [REPORT]      the command and the empty program
 //
 // Each is asked for its version, in turn, many times. Printed are medians: processor time of the
-// process, user and system, and its largest resident memory. The comparison is also added to REPORT.
+// process, user and system, and its largest resident memory. The comparison is also added to
+// REPORT.
 
 #include <cstddef>
 #include <cstdio>

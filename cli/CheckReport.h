@@ -1,5 +1,5 @@
-// What the verbs report that look for what is wrong with files: check, look lint, look check. Lines,
-// or JSON with --json and --ndjson; exit code 1 when something was found.
+// What the verbs report that look for what is wrong with files: check, look lint, look check.
+// Lines, or JSON with --json and --ndjson; exit code 1 when something was found.
 
 #pragma once
 

@@ -20,8 +20,8 @@ struct NamedFolder {
   std::string_view source;  // "--db", "$OXMV_DB"
 };
 
-// The folder of the clip database, and of the look tables, if named by flag or environment; the flag
-// counts more. An empty variable names nothing; an empty flag throws UsageError.
+// The folder of the clip database, and of the look tables, if named by flag or environment; the
+// flag counts more. An empty variable names nothing; an empty flag throws UsageError.
 std::optional<NamedFolder> namedDatabase(const Arguments& arguments);
 std::optional<NamedFolder> namedLooks(const Arguments& arguments);
 

@@ -22,9 +22,9 @@ class CsvWriter {
   // were named.
   CsvWriter(Sink& to, std::initializer_list<std::string_view> leading, std::vector<Column> columns);
 
-  // `leading` are the fields before the tags, `values` those of the columns. Nothing leaves its field
-  // empty. Numbers and texts stand bare, lists of numbers with blanks between them, everything else
-  // as tag JSON.
+  // `leading` are the fields before the tags, `values` those of the columns. Nothing leaves its
+  // field empty. Numbers and texts stand bare, lists of numbers with blanks between them,
+  // everything else as tag JSON.
   void add(Sink& to, std::initializer_list<std::string_view> leading,
            std::span<const Value> values) const;
 

@@ -1,4 +1,5 @@
-// The clip database as the command sees it: what its folder holds, in the order in which it is shown.
+// The clip database as the command sees it: what its folder holds, in the order in which it is
+// shown.
 
 #pragma once
 
@@ -49,8 +50,8 @@ class Database {
   // The same by clip: the files of each.
   std::vector<std::span<const DatabaseFile>> clips() const;
 
-  // A file's content, in `buffer`: it holds until that is used again. Different threads may read at the
-  // same time, each into a buffer of its own.
+  // A file's content, in `buffer`: it holds until that is used again. Different threads may read at
+  // the same time, each into a buffer of its own.
   std::variant<std::span<const std::uint8_t>, FileProblem> read(
       const DatabaseFile& file, std::vector<std::uint8_t>& buffer) const;
 

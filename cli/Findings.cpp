@@ -92,7 +92,8 @@ bool isSingleValued(const TagRow& row) {
          row.read != Read::controlPoint;
 }
 
-// How many bytes of payload the rule of a record's tag takes, whatever its size says; its size, where it takes all.
+// How many bytes of payload the rule of a record's tag takes, whatever its size says; its size,
+// where it takes all.
 std::uint32_t bytesTaken(const Record& record) {
   constexpr std::uint32_t number = 4;
   constexpr std::uint32_t guid = 16;
@@ -295,8 +296,8 @@ void FindingCollector::add(const Record& record, Finding finding) {
   findings_.push_back(finding);
 }
 
-// A number is read from its own bytes, also from behind a payload that is too short for it; of a longer one the rest
-// is read by nobody.
+// A number is read from its own bytes, also from behind a payload that is too short for it; of a
+// longer one the rest is read by nobody.
 void FindingCollector::checkSize(const Record& record) {
   if (record.payload.size() < record.size) return;  // said already
   const std::uint32_t taken = bytesTaken(record);

@@ -26,14 +26,14 @@ struct LookFinding {
 // Tables in one description. No author has as many, and each takes memory in what is said of it.
 constexpr std::size_t mostLookTables = 100000;
 
-// Everything in the order of the file. Reads as the import does, but on to the end whatever it finds.
-// `fileName` is that of the description, which names its looks; empty when it has none.
+// Everything in the order of the file. Reads as the import does, but on to the end whatever it
+// finds. `fileName` is that of the description, which names its looks; empty when it has none.
 std::vector<LookFinding> findingsInLook(std::span<const std::uint8_t> file,
                                         std::string_view fileName);
 
 // Where the content of a node begins in the file as it stands there: behind the start tag of an
-// element, or where a text begins. Nothing for other nodes, for those that an entity brought, and for
-// elements without content.
+// element, or where a text begins. Nothing for other nodes, for those that an entity brought, and
+// for elements without content.
 std::optional<std::size_t> contentOffset(std::span<const std::uint8_t> file, const LookNode& node);
 
 // Whether the file is in UTF-16, whose bytes are no characters.

@@ -26,8 +26,8 @@ struct Call {
   CommandHost& host;  // what the library asks
 };
 
-// A verb stands in a file of its own, or with the others of its family. Its help text begins with the
-// examples.
+// A verb stands in a file of its own, or with the others of its family. Its help text begins with
+// the examples.
 struct Verb {
   std::string_view name;        // "show"; a verb of a family has two words: "db list"
   std::string_view words;       // what follows it: "CLIP..."

@@ -86,9 +86,9 @@ bool isDamage(const Finding& finding) {
          (finding.oddity == Oddity::tooShort && finding.count > 0);
 }
 
-// Whether a walk over the records of a stream, and those within, meets nothing but whole ones, and no
-// GUID. Nearly every stream is like that, has no fault then, and need not be decoded, which takes ten
-// times as long.
+// Whether a walk over the records of a stream, and those within, meets nothing but whole ones, and
+// no GUID. Nearly every stream is like that, has no fault then, and need not be decoded, which
+// takes ten times as long.
 bool isPlainlyWhole(std::span<const std::uint8_t> stream, int level = 0) {
   for (std::size_t at = 0; at < stream.size();) {
     const std::size_t left = stream.size() - at;

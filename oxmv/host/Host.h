@@ -11,10 +11,10 @@
 
 namespace oxmv {
 
-// What the library asks of its host: a preference, a localised string, an alert, a log line. Nothing
-// else of the environment is looked at, and nothing is printed. An application that keeps
-// preferences or talks to its users in a way of its own installs a host of its own; every other gets
-// the default, LinuxHost.
+// What the library asks of its host: a preference, a localised string, an alert, a log line.
+// Nothing else of the environment is looked at, and nothing is printed. An application that keeps
+// preferences or talks to its users in a way of its own installs a host of its own; every other
+// gets the default, LinuxHost.
 //
 // The library calls from whichever thread called it, so a host that is used from several threads
 // must be able to answer them. No answer may be an exception but std::bad_alloc.
@@ -34,8 +34,8 @@ class Host {
   // synchronizePreferences().
   virtual void setPreference(std::string_view key, const Value& value, std::string_view appID) = 0;
 
-  // Brings what was set to where it is kept. Answers false, with the cause in `error` unless that is
-  // null, when that fails; then what was kept is kept still, whole.
+  // Brings what was set to where it is kept. Answers false, with the cause in `error` unless that
+  // is null, when that fails; then what was kept is kept still, whole.
   virtual bool synchronizePreferences(std::string_view appID, std::error_code* error = nullptr) = 0;
 
   // The host's own text for the key, in the language of its user; `builtIn` when it has none. Path

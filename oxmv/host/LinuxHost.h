@@ -15,8 +15,8 @@
 
 namespace oxmv {
 
-// Preferences in TOML files, localised strings from the process's message catalogues, alerts and log
-// lines on standard error. Any threads may use it.
+// Preferences in TOML files, localised strings from the process's message catalogues, alerts and
+// log lines on standard error. Any threads may use it.
 class LinuxHost final : public Host {
  public:
   // A preference, and the file that it was found in; no file when it was set here and is not
@@ -27,9 +27,9 @@ class LinuxHost final : public Host {
   };
 
   // A value that was set here and is not synchronised yet comes first. Then the user's file and
-  // those of the system, each read afresh: the first that has the key counts, whatever it has there.
-  // A file that cannot be read, or not as TOML, counts as one that has nothing. See TomlText for
-  // what becomes of booleans and dates.
+  // those of the system, each read afresh: the first that has the key counts, whatever it has
+  // there. A file that cannot be read, or not as TOML, counts as one that has nothing. See TomlText
+  // for what becomes of booleans and dates.
   FoundPreference findPreference(std::string_view key, std::string_view appID);
   Value copyPreference(std::string_view key, std::string_view appID) override;
 
@@ -45,8 +45,8 @@ class LinuxHost final : public Host {
   // could not be written is still to be synchronised.
   bool synchronizePreferences(std::string_view appID, std::error_code* error = nullptr) override;
 
-  // The message of that name in the text domain that the process has chosen (gettext). Its bytes are
-  // passed on as they are: path templates go to the file system.
+  // The message of that name in the text domain that the process has chosen (gettext). Its bytes
+  // are passed on as they are: path templates go to the file system.
   std::string localizedString(std::string_view key, std::string_view builtIn) override;
 
   // One line each on standard error, without title or button.

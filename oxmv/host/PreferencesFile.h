@@ -29,8 +29,8 @@
 
 namespace oxmv {
 
-// The largest file that is read. Preferences are some lines; the parser's time grows with the square
-// of what a hostile file has of them.
+// The largest file that is read. Preferences are some lines; the parser's time grows with the
+// square of what a hostile file has of them.
 constexpr std::size_t maxPreferencesFileSize = std::size_t{256} << 10;
 
 // Why preferences are not read or kept. Everything else comes as the system's own error, or as one
@@ -72,9 +72,9 @@ PreferencesFile readPreferencesFile(const std::filesystem::path& path);
 // New values by key; nothing removes the key.
 using PreferencesChanges = std::map<std::string, Value, std::less<>>;
 
-// Makes the changes in a file, all or none, and no others: see TomlText::with(). A file is made when
-// there is none, its folder too (for the user alone), but not the folders above. Changes that are
-// made already touch nothing. A file that cannot be read, or not as TOML, stays as it is.
+// Makes the changes in a file, all or none, and no others: see TomlText::with(). A file is made
+// when there is none, its folder too (for the user alone), but not the folders above. Changes that
+// are made already touch nothing. A file that cannot be read, or not as TOML, stays as it is.
 //
 // Programs that do this at the same time lose nothing of each other's. They lock the folder, by
 // which no file is left behind and no lock outlives its program, and wait for each other up to

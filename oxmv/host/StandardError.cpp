@@ -14,8 +14,8 @@
 namespace oxmv {
 namespace {
 
-// A pipe without a reader answers with a signal that ends the process. While this lives, this thread
-// gets none from what it writes.
+// A pipe without a reader answers with a signal that ends the process. While this lives, this
+// thread gets none from what it writes.
 class WithoutPipeSignal {
  public:
   WithoutPipeSignal() {

@@ -17,12 +17,13 @@ namespace oxmv {
 // How wide a camera looks. The values are the letters W, M, N; they are stored.
 enum class FieldOfView : std::uint8_t { wide = 87, medium = 77, narrow = 78 };
 
-// The key that the field of view stands under: four characters like every tag, the last of which has
-// code 0. Streams have no such tag, so it lives in dictionaries only.
+// The key that the field of view stands under: four characters like every tag, the last of which
+// has code 0. Streams have no such tag, so it lives in dictionaries only.
 constexpr std::string_view fieldOfViewKey{"FOV", 4};
 
-// The angle in degrees that a lens of this focal length, in millimetres on 35 mm film, takes in from
-// corner to corner: 2 atan(21.635 / focalLength), 21.635 mm being half the diagonal of a frame.
+// The angle in degrees that a lens of this focal length, in millimetres on 35 mm film, takes in
+// from corner to corner: 2 atan(21.635 / focalLength), 21.635 mm being half the diagonal of a
+// frame.
 double fieldOfViewDegrees(double focalLength) noexcept;
 
 // Above 100 degrees wide, above 70 medium, above 0 narrow; else none.

@@ -22,8 +22,8 @@ struct CameraTablesProblem {
 // matches wins. Prefixes and names may stand in several rows.
 //
 // They are configuration, and come as TOML text; import/cameras.toml is the built-in one and shows
-// the shape. A host that has other cameras reads its own file (readWholeFile()) and hands the tables
-// on with each still.
+// the shape. A host that has other cameras reads its own file (readWholeFile()) and hands the
+// tables on with each still.
 //
 // All texts are ASCII and can be printed: prefixes are compared without regard to case, letter by
 // letter, and streams of tags carry no other names. So is all else in the file.

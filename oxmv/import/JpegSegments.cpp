@@ -29,7 +29,8 @@ bool standsAlone(std::uint8_t marker) {
   return marker == temporary || (marker >= firstRestart && marker <= startOfImage);
 }
 
-// Goes behind the next marker and answers it. What stands before it is stepped over, as decoders do.
+// Goes behind the next marker and answers it. What stands before it is stepped over, as decoders
+// do.
 std::optional<std::uint8_t> takeMarker(Bytes& rest) {
   bool isMarker = false;
   for (std::size_t i = 0; i < rest.size(); ++i) {

@@ -17,8 +17,8 @@ constexpr std::uint32_t shiftedBit(std::uint32_t crc) {
   return (crc & 1) != 0 ? crc >> 1 ^ polynomial : crc >> 1;
 }
 
-// Eight bytes are taken at once: entry b of table k is what byte b does to the CRC with k zero bytes
-// behind it. Table 0 is the usual one.
+// Eight bytes are taken at once: entry b of table k is what byte b does to the CRC with k zero
+// bytes behind it. Table 0 is the usual one.
 constexpr std::size_t slices = 8;
 using Tables = std::array<std::array<std::uint32_t, 256>, slices>;
 

@@ -1,6 +1,6 @@
-// CRC-32, as ISO-HDLC and IEEE 802.3 define it: polynomial 0xEDB88320 (reflected), initial value and
-// final exclusive-or 0xFFFFFFFF. The CRC of the nine ASCII digits 1 to 9 is 0xCBF43926. Look-table
-// files are named by the CRC of their values.
+// CRC-32, as ISO-HDLC and IEEE 802.3 define it: polynomial 0xEDB88320 (reflected), initial value
+// and final exclusive-or 0xFFFFFFFF. The CRC of the nine ASCII digits 1 to 9 is 0xCBF43926.
+// Look-table files are named by the CRC of their values.
 
 #pragma once
 
@@ -14,8 +14,8 @@ namespace oxmv {
 // Makes the table of 256 entries, if it is not there. update_crc() does so by itself.
 void make_crc_table() noexcept;
 
-// The running CRC after `length` further bytes, which must be there; without initial value and final
-// exclusive-or, so that a CRC can be taken piece by piece. A length below 1 changes nothing.
+// The running CRC after `length` further bytes, which must be there; without initial value and
+// final exclusive-or, so that a CRC can be taken piece by piece. A length below 1 changes nothing.
 std::uint32_t update_crc(std::uint32_t crc, const std::uint8_t* bytes,
                          std::ptrdiff_t length) noexcept;
 

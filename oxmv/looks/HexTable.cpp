@@ -34,8 +34,8 @@ std::uint8_t digitValue(char c) { return digitValues[static_cast<std::uint8_t>(c
 bool isDigit(char c) { return digitValue(c) != notADigit; }
 bool isAscii(char c) { return static_cast<std::uint8_t>(c) < 0x80; }
 
-// Decodes up to `most` groups that follow each other, all of which lie within the text; stops at the
-// first that is not all digits. Answers how many that were.
+// Decodes up to `most` groups that follow each other, all of which lie within the text; stops at
+// the first that is not all digits. Answers how many that were.
 std::size_t decodeGroups(const char* text, std::size_t most, std::uint8_t* values) {
   for (std::size_t i = 0; i < most; ++i, text += groupDigits, values += valueBytes) {
     std::uint8_t bytes[valueBytes];
@@ -107,8 +107,9 @@ __attribute__((target("avx2"))) std::size_t decodeGroupsByVector(const char* tex
   return done + decodeGroups(text + done * groupDigits, most - done, values + done * valueBytes);
 }
 
-// The same for groups that each have a gap behind them and begin `stride` characters apart, all within
-// the text: four at a time, so that none waits for the one before. Answers a multiple of four.
+// The same for groups that each have a gap behind them and begin `stride` characters apart, all
+// within the text: four at a time, so that none waits for the one before. Answers a multiple of
+// four.
 __attribute__((target("avx2"))) std::size_t decodeSpacedByVector(const char* text, std::size_t most,
                                                                  std::size_t stride,
                                                                  std::uint8_t* values) {
@@ -190,7 +191,8 @@ class Scan {
     return true;
   }
 
-  // Takes the groups from `at` on, one after the other, until one is not in order. Answers how many.
+  // Takes the groups from `at` on, one after the other, until one is not in order. Answers how
+  // many.
   std::size_t wholeGroups(std::size_t at, std::size_t end) {
     const std::size_t beginning = (end - at + groupDigits - 1) / groupDigits;
     const std::size_t whole = (text_.size() - at) / groupDigits;

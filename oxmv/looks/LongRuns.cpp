@@ -28,8 +28,8 @@ std::size_t endOfRun(std::string_view text, std::size_t from) {
 
 #ifdef __x86_64__
 
-// A character belongs to the runs if the entries of its low and its high four bits share a bit. Each
-// high half in use has a bit of its own.
+// A character belongs to the runs if the entries of its low and its high four bits share a bit.
+// Each high half in use has a bit of its own.
 struct Halves {
   alignas(16) std::array<std::uint8_t, 16> low = {};
   alignas(16) std::array<std::uint8_t, 16> high = {};

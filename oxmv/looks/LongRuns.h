@@ -1,9 +1,9 @@
 // The long runs of hexadecimal text in a look description, and the document without them.
 //
-// A table's text makes up nearly all of a description, and an XML parser needs more time for looking
-// at its characters than everything else takes together. In character data one text is as good as
-// another, as long as it has no markup in it: so each long run can be replaced by a single character
-// before the parsing, and put back by its place.
+// A table's text makes up nearly all of a description, and an XML parser needs more time for
+// looking at its characters than everything else takes together. In character data one text is as
+// good as another, as long as it has no markup in it: so each long run can be replaced by a single
+// character before the parsing, and put back by its place.
 
 #pragma once
 
@@ -21,8 +21,8 @@ namespace oxmv {
 // A shorter run is not worth replacing.
 constexpr std::size_t minLongRun = 1024;
 
-// One run: hexadecimal digits, blanks, tabulators, line ends, commas and quotation marks between a '>'
-// and a '<'. So no line end is half of one: carriage return and line feed are both in it.
+// One run: hexadecimal digits, blanks, tabulators, line ends, commas and quotation marks between a
+// '>' and a '<'. So no line end is half of one: carriage return and line feed are both in it.
 struct LongRun {
   std::size_t offset;     // in the document
   std::string_view text;  // a view into the document

@@ -73,7 +73,8 @@ class LookDescription::Builder final : public XmlVisitor {
 
   bool isChildOfLut() const { return isInLut_ && depth_ == lutDepth; }
 
-  // Begins a node, and so ends a text before it. Without entities no file has as many nodes as bytes.
+  // Begins a node, and so ends a text before it. Without entities no file has as many nodes as
+  // bytes.
   bool add(LookNode::Kind kind, LookNode::Form form, std::size_t offset) {
     constexpr std::size_t always = std::size_t{1} << 20;
     if (to_.nodes_.size() >= std::max(to_.file_.size(), always)) {
@@ -123,8 +124,8 @@ class LookDescription::Builder final : public XmlVisitor {
   }
 
   void takeOut(Entry& node) {
-    // Room for all that may follow, unless entities make more of it: text is taken out of files whose
-    // lines end in carriage returns, and then nearly all of it.
+    // Room for all that may follow, unless entities make more of it: text is taken out of files
+    // whose lines end in carriage returns, and then nearly all of it.
     if (to_.text_.empty()) to_.text_.reserve(to_.file_.size() - node.offset);
     const auto start = static_cast<std::uint32_t>(to_.text_.size());
     if (node.isInFile) to_.text_ += to_.file_.substr(node.textStart, node.textLength);
@@ -145,8 +146,8 @@ class LookDescription::Builder final : public XmlVisitor {
 //
 // A document whose skeleton is well-formed, and whose runs all turn up as character data, is
 // well-formed itself and has the same nodes. Everything else (runs in comments or attributes,
-// documents with a type, whose entities have no place of their own, or in another encoding) ends the
-// walk, or leaves runs over, and is parsed as it is.
+// documents with a type, whose entities have no place of their own, or in another encoding) ends
+// the walk, or leaves runs over, and is parsed as it is.
 class LookDescription::Restorer final : public XmlVisitor {
  public:
   Restorer(const Skeleton& skeleton, Builder& builder) : skeleton_(skeleton), builder_(builder) {}
@@ -223,8 +224,8 @@ std::optional<LookDescription> LookDescription::parse(std::span<const std::uint8
                                                       LookProblem* problem, LookParsing parsing,
                                                       std::size_t mostText) {
   const std::string_view text(reinterpret_cast<const char*>(file.data()), file.size());
-  // In UTF-16 the bytes of a run need not be what they seem. Such a document begins with a byte order
-  // mark, or has a zero in its first character.
+  // In UTF-16 the bytes of a run need not be what they seem. Such a document begins with a byte
+  // order mark, or has a zero in its first character.
   const bool isUtf16 = text.size() < 2 || file[0] >= 0xFE || file[0] == 0 || file[1] == 0;
   const bool isTooLarge = text.size() > maxFileSize;  // also if the rest of it is not
   if (parsing == LookParsing::quick && !isUtf16 && !isTooLarge) {

@@ -59,8 +59,8 @@ enum class LookParsing {
 class LookDescription {
  public:
   // Nothing, with the problem unless that is null, when the file is not well-formed XML, or passes
-  // one of the limits that walkXml() has, or its entities make more nodes of it than it has bytes, or
-  // its nodes have more than `mostText` bytes of text that does not stand in the file as it is.
+  // one of the limits that walkXml() has, or its entities make more nodes of it than it has bytes,
+  // or its nodes have more than `mostText` bytes of text that does not stand in the file as it is.
   static std::optional<LookDescription> parse(std::span<const std::uint8_t> file,
                                               LookProblem* problem = nullptr,
                                               LookParsing parsing = LookParsing::quick,

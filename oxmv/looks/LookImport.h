@@ -19,8 +19,8 @@ namespace oxmv {
 // A description of the largest size a file may have could ask for a thousand times as much.
 constexpr std::uint64_t maxImportedBytes = std::uint64_t{1} << 30;
 
-// The most look-table files that one import writes. Nobody has so many looks in one description, and
-// each file costs more than its bytes: it waits for the disk, and takes an entry of the folder.
+// The most look-table files that one import writes. Nobody has so many looks in one description,
+// and each file costs more than its bytes: it waits for the disk, and takes an entry of the folder.
 constexpr std::size_t maxImportedFiles = 4096;
 
 // One table of a description. How its text was read and what was surprising is in `values`: groups
@@ -68,8 +68,8 @@ struct LookImportEnd {
   std::int32_t size = 0;   // noSize, tooLarge, tooMuch: the size in force
 };
 
-// Derive from this and give it to the import. Every call is optional. What it does never changes the
-// result; an exception it throws ends the import and reaches the caller.
+// Derive from this and give it to the import. Every call is optional. What it does never changes
+// the result; an exception it throws ends the import and reaches the caller.
 class LookImportObserver {
  public:
   virtual ~LookImportObserver() = default;
@@ -85,7 +85,8 @@ class LookImportObserver {
   LookImportObserver& operator=(const LookImportObserver&) = default;
 };
 
-// LookFileRef::initFromLookFile(), with limits of one's own. A file that could not be written counts.
+// LookFileRef::initFromLookFile(), with limits of one's own. A file that could not be written
+// counts.
 std::optional<LookFileRef> importLook(const std::filesystem::path& path,
                                       LookImportObserver* observer = nullptr,
                                       std::uint64_t mostBytes = maxImportedBytes,

@@ -10,8 +10,8 @@
 //       24   40  lutName     ASCII, zeros behind it; at most 38 characters
 //       64       table       N x N x N points of three binary32 values, as the description has them
 //
-// All numbers are little-endian. The file is called after the CRC-32 of its values: 00ABCDEF.oxlook.
-// Files whose magic reads "KLXO" were written in the other byte order.
+// All numbers are little-endian. The file is called after the CRC-32 of its values:
+// 00ABCDEF.oxlook. Files whose magic reads "KLXO" were written in the other byte order.
 
 #pragma once
 
@@ -81,19 +81,20 @@ class OXLookFileRecord {
 // Writes the header's 64 bytes to the start of a file. `bytes` has room for them.
 void storeLookHeader(const OXLOOK_HEADER& header, std::span<std::uint8_t> bytes);
 
-// The header that a file of 64 bytes or more begins with, in either byte order, which its magic tells.
-// Nothing when the magic is another.
+// The header that a file of 64 bytes or more begins with, in either byte order, which its magic
+// tells. Nothing when the magic is another.
 std::optional<OXLOOK_HEADER> loadLookHeader(std::span<const std::uint8_t> bytes) noexcept;
 
 // What the name field holds for a display name: nothing but zeros when it has 39 bytes or more, or
 // is not ASCII.
 std::array<char, 40> lookNameField(std::string_view displayName);
 
-// The version of a look-table file, from its first bytes (64, or all it has); 0 for any other magic.
+// The version of a look-table file, from its first bytes (64, or all it has); 0 for any other
+// magic.
 std::int32_t lookFileVersion(std::span<const std::uint8_t> start) noexcept;
 
-// The text in the name field, from the same bytes. Nothing when it is not ASCII; empty when the file
-// ends before it does.
+// The text in the name field, from the same bytes. Nothing when it is not ASCII; empty when the
+// file ends before it does.
 std::optional<std::string> lookFileName(std::span<const std::uint8_t> start);
 
 // Whether these are the first bytes of a file of today's version, in either byte order: such a file
@@ -103,9 +104,9 @@ bool isCurrentLookFile(std::span<const std::uint8_t> start) noexcept;
 // "00ABCDEF.oxlook"
 std::string lookFileNameOf(std::uint32_t crc);
 
-// The CRC that a file name without its extension begins with: white space, an optional 0x, digits up
-// to the first character that is none; 0xFFFFFFFF if it has more than 32 bits. Nothing when there is
-// no digit.
+// The CRC that a file name without its extension begins with: white space, an optional 0x, digits
+// up to the first character that is none; 0xFFFFFFFF if it has more than 32 bits. Nothing when
+// there is no digit.
 std::optional<std::uint32_t> crcFromFileName(std::string_view stem) noexcept;
 
 // The last component of a path in which '/' separates, and a name without its extension: what

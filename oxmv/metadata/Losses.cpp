@@ -425,8 +425,8 @@ class LossFinder {
     return false;
   }
 
-  // Whether a stream in this value, which comes back as it is when it stands alone, would stand deeper
-  // than streams are read.
+  // Whether a stream in this value, which comes back as it is when it stands alone, would stand
+  // deeper than streams are read.
   static bool nestsTooDeep(std::string_view key, const Value& value, int level) {
     const TagRow* row = findTagRow(key);
     if (row == nullptr) return false;

@@ -19,8 +19,8 @@ struct CalendarTime {
   bool operator==(const CalendarTime&) const = default;
 };
 
-// A moment, in seconds since 1970-01-01 00:00:00 UTC, in the time zone of the process. Nothing for a
-// moment so far away that its year cannot be counted.
+// A moment, in seconds since 1970-01-01 00:00:00 UTC, in the time zone of the process. Nothing for
+// a moment so far away that its year cannot be counted.
 std::optional<CalendarTime> localTime(std::int64_t secondsSince1970);
 
 // When the file was created, in the time zone of the process; a symbolic link is followed. Nothing

@@ -21,8 +21,8 @@ Descriptor openToRead(const Descriptor* folder, const char* name) {
   constexpr int flags = O_RDONLY | O_CLOEXEC | O_NOCTTY;
   const int at = folder == nullptr ? AT_FDCWD : folder->number();
   // Non-blocking, so that a pipe without a writer answers at once. It means nothing to a regular
-  // file, unless another process holds a lease on it: then the system asks for it back, and the file
-  // can be opened after a while.
+  // file, unless another process holds a lease on it: then the system asks for it back, and the
+  // file can be opened after a while.
   const int number = ::openat(at, name, flags | O_NONBLOCK);
   if (number >= 0 || errno != EWOULDBLOCK) return Descriptor(number);
   struct stat status = {};

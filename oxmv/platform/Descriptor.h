@@ -31,8 +31,8 @@ class Descriptor {
   int number_;
 };
 
-// Opens a file for reading, whose name is one in `folder` or, if that is null, a path. A pipe without
-// a writer never makes this wait. Not open when that fails; see lastError().
+// Opens a file for reading, whose name is one in `folder` or, if that is null, a path. A pipe
+// without a writer never makes this wait. Not open when that fails; see lastError().
 Descriptor openToRead(const Descriptor* folder, const char* name);
 
 // Of the system call that failed last.
@@ -48,8 +48,8 @@ std::optional<struct stat> regularStatus(const Descriptor& file, std::error_code
 // Its size alone.
 std::optional<std::uintmax_t> regularSize(const Descriptor& file, std::error_code& error);
 
-// Reads until `content` is full or the file ends. Answers how many bytes that were; nothing, with the
-// cause in `error`, when the reading fails.
+// Reads until `content` is full or the file ends. Answers how many bytes that were; nothing, with
+// the cause in `error`, when the reading fails.
 std::optional<std::size_t> readInto(std::span<std::uint8_t> content, const Descriptor& file,
                                     std::error_code& error);
 

@@ -20,8 +20,8 @@ struct Unref {
   void operator()(ExifMem* memory) const { ::exif_mem_unref(memory); }
 };
 
-// Where the library gets no memory it leaves out what it wanted that for, and says nothing. So those
-// it asks remember whether they had none.
+// Where the library gets no memory it leaves out what it wanted that for, and says nothing. So
+// those it asks remember whether they had none.
 thread_local bool isMemoryShort = false;
 
 void* remembering(void* memory) {

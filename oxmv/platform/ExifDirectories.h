@@ -20,7 +20,8 @@ enum class ExifTagNumber : std::uint16_t {
 // A small segment in the same byte order with nothing but these entries, their values copied, and
 // no further directory. A reader that goes into each directory wherever it is named takes hours for
 // some kilobytes in which directories name each other thousands of times, and hundreds of megabytes
-// for some in which the entries of a maker's note share their bytes; none of that is there any more.
+// for some in which the entries of a maker's note share their bytes; none of that is there any
+// more.
 //
 // An entry of which some is not there is left out, or if its type is unknown; of several with the
 // same tag the first one of the others stays. Where a directory claims more entries than there are,

@@ -80,8 +80,8 @@ std::optional<std::span<const std::uint8_t>> Folder::read(const std::string& nam
     size = error ? std::nullopt : readToEnd(buffer, *size, file, error);
   }
   if (!size) return std::nullopt;
-  // What has taken the place of a file since the folder was read may answer with no bytes, as a pipe
-  // does.
+  // What has taken the place of a file since the folder was read may answer with no bytes, as a
+  // pipe does.
   if (*size == 0 && !regularSize(file, error)) return std::nullopt;
   return std::span(buffer).first(*size);
 }

@@ -27,15 +27,15 @@ class Folder {
   // Nothing, with the cause in `error`, when there is none or it cannot be read.
   static std::optional<Folder> open(const std::filesystem::path& path, std::error_code& error);
 
-  // Calls `each` with every entry but "." and "..", in no particular order; the name holds during the
-  // call. Answers false, with the cause in `error`, when the folder cannot be read to its end.
+  // Calls `each` with every entry but "." and "..", in no particular order; the name holds during
+  // the call. Answers false, with the cause in `error`, when the folder cannot be read to its end.
   bool forEachEntry(const std::function<void(std::string_view name, EntryKind kind)>& each,
                     std::error_code& error) const;
 
   // The content of a file of this folder; what readWholeFile() refuses is refused here. `kind` is
   // what the folder has said: of a regular file the system is not asked again, which saves a good
-  // part of the time that a small file takes. The bytes are in `buffer`, which only grows; they hold
-  // until it is used again.
+  // part of the time that a small file takes. The bytes are in `buffer`, which only grows; they
+  // hold until it is used again.
   std::optional<std::span<const std::uint8_t>> read(const std::string& name, EntryKind kind,
                                                     std::vector<std::uint8_t>& buffer,
                                                     std::error_code& error) const;

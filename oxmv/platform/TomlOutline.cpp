@@ -201,8 +201,8 @@ class Scanner {
     if (quotes < 3) fail("a string without an end");
   }
 
-  // In a long string: a backslash and the character behind it, or all blanks and line ends up to the
-  // line that continues this one.
+  // In a long string: a backslash and the character behind it, or all blanks and line ends up to
+  // the line that continues this one.
   void escape() {
     const std::size_t next = at_ + 1;
     const std::size_t end = std::min(text_.find_first_not_of(" \t\r\n", next), text_.size());

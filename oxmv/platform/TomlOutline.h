@@ -40,8 +40,8 @@ struct TomlMistake {
 struct TomlOutline {
   std::vector<TomlStatement> statements;
   // The first place where the text nests deeper than maxTomlNesting or breaks TOML's grammar. The
-  // outline ends there. Not looked for: keys that stand there twice, numbers and dates out of range,
-  // escapes in strings, characters that no text may hold.
+  // outline ends there. Not looked for: keys that stand there twice, numbers and dates out of
+  // range, escapes in strings, characters that no text may hold.
   std::optional<TomlMistake> mistake;
   // The characters that are not ASCII and stand first in a line that continues another, behind a
   // backslash at its end. They are no blanks, whatever they look like.

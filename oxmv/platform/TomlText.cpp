@@ -12,8 +12,8 @@
 #include <vector>
 
 // Compiled in here, so that those who link with us need not know of it. Without exceptions, because
-// its own ends the process when there is no memory for its message; otherwise as it comes, so that a
-// host that uses it, too, has one and the same.
+// its own ends the process when there is no memory for its message; otherwise as it comes, so that
+// a host that uses it, too, has one and the same.
 #define TOML_HEADER_ONLY 1
 #define TOML_EXCEPTIONS 0
 #include <toml++/toml.h>
@@ -145,7 +145,8 @@ std::string numberLiteral(Number number) {
   return {digits.data(), end};
 }
 
-// The fewest digits that give the number back. Without a point or an exponent it would be an integer.
+// The fewest digits that give the number back. Without a point or an exponent it would be an
+// integer.
 template <class Float>
 std::string floatLiteral(Float number) {
   if (std::isnan(number)) return std::signbit(number) ? "-nan" : "nan";

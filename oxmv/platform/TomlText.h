@@ -19,8 +19,8 @@ struct TomlProblem {
 };
 
 // A text that is TOML, and what it says. Editing makes another text, in which only what was asked
-// for is different: comments, order, blanks, line ends, a byte order mark stay as they are, byte for
-// byte.
+// for is different: comments, order, blanks, line ends, a byte order mark stay as they are, byte
+// for byte.
 //
 // A table, an array or a string gives a dictionary, array or text; an integer or a float gives an
 // integer or a double. What has no kind of its own is kept apart from text all the same: true and

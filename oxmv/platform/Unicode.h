@@ -14,8 +14,8 @@ namespace oxmv {
 // it is not valid UTF-8.
 std::optional<std::string> caseFolded(std::string_view utf8);
 
-// The text without the punctuation (general categories P*: brackets, quotation marks, dashes ...; no
-// symbols, so no plus sign) at both ends. `utf8` must be valid.
+// The text without the punctuation (general categories P*: brackets, quotation marks, dashes ...;
+// no symbols, so no plus sign) at both ends. `utf8` must be valid.
 std::string_view trimmedOfPunctuation(std::string_view utf8) noexcept;
 
 }  // namespace oxmv

@@ -1,5 +1,5 @@
-// Whole files in, whole files out. A path that has a NUL in it names no file: the system would cut it
-// there, and with that reach another one. It is std::errc::invalid_argument.
+// Whole files in, whole files out. A path that has a NUL in it names no file: the system would cut
+// it there, and with that reach another one. It is std::errc::invalid_argument.
 
 #pragma once
 
@@ -13,8 +13,8 @@
 
 namespace oxmv {
 
-// The largest file that is read or written. Clips take kilobytes and the largest looks some megabytes;
-// what is larger is no file of ours, and must not fill the host's memory.
+// The largest file that is read or written. Clips take kilobytes and the largest looks some
+// megabytes; what is larger is no file of ours, and must not fill the host's memory.
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 
 // Why a file is none of ours to read or replace. Everything else comes as the
@@ -29,21 +29,21 @@ std::error_code make_error_code(FileError error) noexcept;
 // The content of a regular file. Answers nothing, with the cause in `error`, when there is no such
 // file, it cannot be read to its end, is not a regular file (a pipe never makes this wait) or is
 // larger than maxFileSize. A read that fails is never taken for the end of the file. A file that is
-// written to in its place meanwhile is read once more; if that goes on, it is FileError::changed, for
-// what has been read may be a mixture. (Those that writeWholeFile() replaces never are.)
+// written to in its place meanwhile is read once more; if that goes on, it is FileError::changed,
+// for what has been read may be a mixture. (Those that writeWholeFile() replaces never are.)
 std::optional<std::vector<std::uint8_t>> readWholeFile(const std::filesystem::path& path,
                                                        std::error_code& error);
 
 // The first `count` bytes of such a file, or all of them if it has fewer; it may be of any size.
-// `isOpened`, unless null, tells a file that could be opened and not read from one that could not be
-// opened.
+// `isOpened`, unless null, tells a file that could be opened and not read from one that could not
+// be opened.
 std::optional<std::vector<std::uint8_t>> readFileStart(const std::filesystem::path& path,
                                                        std::size_t count, std::error_code& error,
                                                        bool* isOpened = nullptr);
 
-// The content of such a file behind a head of fixed size, which is read first and cut to the bytes of
-// it that are there: they are in `head` whatever becomes of the rest, also when std::bad_alloc leaves.
-// Answers nothing, without an error, when the file ends within the head.
+// The content of such a file behind a head of fixed size, which is read first and cut to the bytes
+// of it that are there: they are in `head` whatever becomes of the rest, also when std::bad_alloc
+// leaves. Answers nothing, without an error, when the file ends within the head.
 std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::path& path,
                                                         std::span<std::uint8_t>& head,
                                                         std::error_code& error);
@@ -56,8 +56,8 @@ std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::p
 // maxFileSize, which could not be read again, is FileError::tooLarge.
 //
 // Answers false with the cause in `error` when that fails; then what was there is there still, and
-// nothing else. In one case the new file is there already: when the system fails to say that its name
-// has reached the disk.
+// nothing else. In one case the new file is there already: when the system fails to say that its
+// name has reached the disk.
 [[nodiscard]] bool writeWholeFile(const std::filesystem::path& path,
                                   std::span<const std::uint8_t> content, std::error_code& error);
 
@@ -68,13 +68,13 @@ std::optional<std::vector<std::uint8_t>> readBehindHead(const std::filesystem::p
                                     const std::optional<std::vector<std::uint8_t>>& old,
                                     std::span<const std::uint8_t> content, std::error_code& error);
 
-// Removes the file, or the symbolic link, of that name; never a folder. Answers false with the cause
-// in `error` when that fails, also when there is none. In one case it is gone already: when the system
-// fails to say that this has reached the disk.
+// Removes the file, or the symbolic link, of that name; never a folder. Answers false with the
+// cause in `error` when that fails, also when there is none. In one case it is gone already: when
+// the system fails to say that this has reached the disk.
 [[nodiscard]] bool removeFile(const std::filesystem::path& path, std::error_code& error);
 
-// writeWholeFile() where nothing has that name, neither file nor folder nor a symbolic link, wherever
-// it leads; std::errc::file_exists where something has.
+// writeWholeFile() where nothing has that name, neither file nor folder nor a symbolic link,
+// wherever it leads; std::errc::file_exists where something has.
 [[nodiscard]] bool writeNewFile(const std::filesystem::path& path,
                                 std::span<const std::uint8_t> content, std::error_code& error);
 

@@ -52,9 +52,10 @@ class Walk {
     XML_SetCdataSectionHandler(parser, &Walk::onCdataStart, &Walk::onCdataEnd);
     XML_SetCommentHandler(parser, &Walk::onComment);
     XML_SetProcessingInstructionHandler(parser, &Walk::onProcessingInstruction);
-    // No handler for external entities: none is loaded. None for unknown encodings: they are errors.
-    // Parameter entities of the document itself are expanded: a parser that passes one over must pass
-    // over the declarations behind it, too, and the limits would not see what it did with them.
+    // No handler for external entities: none is loaded. None for unknown encodings: they are
+    // errors. Parameter entities of the document itself are expanded: a parser that passes one over
+    // must pass over the declarations behind it, too, and the limits would not see what it did with
+    // them.
     XML_SetParamEntityParsing(parser, XML_PARAM_ENTITY_PARSING_ALWAYS);
   }
   Walk(const Walk&) = delete;

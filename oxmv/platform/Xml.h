@@ -12,12 +12,13 @@ namespace oxmv {
 // Elements nested deeper than this only hostile input has; what is open takes memory.
 constexpr std::size_t maxXmlDepth = 4096;
 
-// Entities of a document, parameter entities among them, whose text refers to entities. Each may stand
-// in the next, and their expansion takes stack for each.
+// Entities of a document, parameter entities among them, whose text refers to entities. Each may
+// stand in the next, and their expansion takes stack for each.
 constexpr std::size_t maxXmlNestedEntities = 16;
 
 // Attributes that a document declares. The parser goes through those of an element's name each time
-// that such an element begins, so many declarations and many elements would take the product of both.
+// that such an element begins, so many declarations and many elements would take the product of
+// both.
 constexpr std::size_t maxXmlDeclaredAttributes = 64;
 
 // Hears what a document holds, in its order. Texts are UTF-8, with line ends as single line feeds;
@@ -62,11 +63,11 @@ struct XmlEnd {
   std::string_view what;   // what is wrong in a few words, unless wellFormed or stopped
 };
 
-// Walks through a document in UTF-8, UTF-16, ISO-8859-1 or US-ASCII. A document type is accepted, and
-// the entities that it defines in itself are expanded as far as they stay in proportion to the
+// Walks through a document in UTF-8, UTF-16, ISO-8859-1 or US-ASCII. A document type is accepted,
+// and the entities that it defines in itself are expanded as far as they stay in proportion to the
 // document. Nothing outside is ever loaded: references to it have no text. The visitor has heard of
-// everything before the place where a document turns out to be malformed. What it throws reaches the
-// caller.
+// everything before the place where a document turns out to be malformed. What it throws reaches
+// the caller.
 XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor);
 
 // Line and column, both from 1. Columns count characters; a tabulator is one.
@@ -75,8 +76,8 @@ struct XmlPosition {
   std::size_t column = 1;
 };
 
-// Where the bytes of a document stand for its readers. Quick as long as it is asked in ascending order.
-// The document must outlive it.
+// Where the bytes of a document stand for its readers. Quick as long as it is asked in ascending
+// order. The document must outlive it.
 class XmlPositions {
  public:
   explicit XmlPositions(std::span<const std::uint8_t> document);

@@ -53,8 +53,8 @@ constexpr SettingRow eyeTemplateSetting = {
 Setting lookUp(const SettingRow& row, Host& host, std::string_view appID);
 
 // The paths below are made afresh on each call from the settings of the host in use: a change of a
-// preference takes effect on the next call. Nothing is checked or trimmed, nothing on the disk looked
-// at or made.
+// preference takes effect on the next call. Nothing is checked or trimmed, nothing on the disk
+// looked at or made.
 
 // The override file. A call stores the default of the folder as a preference, and
 // synchronises, if there is no such preference or it is no text.

@@ -24,12 +24,13 @@ constexpr int widestConversion = 255;
 //   kind       := '@' a text | 'd', 'i' signed | 'u' unsigned | 'x', 'X' hexadecimal
 //
 // Flags and width mean what they mean to printf; a width counts characters as UTF-16 does. A length
-// is read and means nothing: the arguments know how long they are. A position, counted from 1, picks
-// an argument and leaves the order of the other conversions alone.
+// is read and means nothing: the arguments know how long they are. A position, counted from 1,
+// picks an argument and leaves the order of the other conversions alone.
 //
-// Templates come from outside (a message catalogue, a host), so nothing in them is trusted: whatever
-// is no such conversion, asks for an argument that is not there or of the other kind, or is wider
-// than widestConversion stands for itself, and takes no argument. Arguments left over are ignored.
+// Templates come from outside (a message catalogue, a host), so nothing in them is trusted:
+// whatever is no such conversion, asks for an argument that is not there or of the other kind, or
+// is wider than widestConversion stands for itself, and takes no argument. Arguments left over are
+// ignored.
 std::string formatPath(std::string_view pathTemplate, std::span<const PathArgument> arguments);
 
 }  // namespace oxmv

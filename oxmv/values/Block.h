@@ -26,8 +26,8 @@
 
 namespace oxmv::detail {
 
-// How a value is held. A form has its Value::Kind in its upper bits, so that asking for that takes no
-// branch and no table. From `text` on it needs the owner of its payload.
+// How a value is held. A form has its Value::Kind in its upper bits, so that asking for that takes
+// no branch and no table. From `text` on it needs the owner of its payload.
 constexpr int kindShift = 2;
 enum class Form : std::uint8_t {
   nothing,
@@ -52,8 +52,8 @@ enum class Form : std::uint8_t {
 // A value in 8 bytes: a scalar in `body`, or a place: `size` bytes at offset `body` of the block's
 // bytes.
 //
-// They are the halves of one word. As two members they would go through other registers on the way to a
-// Value, and whoever asks for its kind would wait for them.
+// They are the halves of one word. As two members they would go through other registers on the way
+// to a Value, and whoever asks for its kind would wait for them.
 class Slot {
  public:
   constexpr Slot() = default;

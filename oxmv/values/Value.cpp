@@ -26,8 +26,8 @@ std::span<const std::uint8_t> asBytes(std::string_view text) {
   return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
-// How much of a text counts, and whether that is all ASCII: both in one pass. Bytes behind the text are
-// read, too; a block has enough of them.
+// How much of a text counts, and whether that is all ASCII: both in one pass. Bytes behind the text
+// are read, too; a block has enough of them.
 struct Cut {
   std::uint32_t size;
   bool isAscii;

@@ -28,9 +28,9 @@ class Entries;
 // payload, so copying one is cheap and needs no memory. A value taken out of a decoded stream keeps
 // that stream's block alive.
 //
-// The accessors answer for every kind and never fail: see each. Those that hand out views do so only
-// for a value that has a name; asked of a temporary, they hand out a copy. Keep that copy as what it
-// is: a std::string_view or std::span made of it would outlive it.
+// The accessors answer for every kind and never fail: see each. Those that hand out views do so
+// only for a value that has a name; asked of a temporary, they hand out a copy. Keep that copy as
+// what it is: a std::string_view or std::span made of it would outlive it.
 //
 //   const auto reel = tags["REEL"].text();        // a std::string
 //   const Value value = tags["REEL"];             // or keep the value,
@@ -115,8 +115,8 @@ class Value {
   double doubleValue() const noexcept {
     return slot_.form() == detail::Form::float64 ? content_.float64 : doubleOfOther();
   }
-  // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a signalling
-  // not-a-number would arrive as a quiet one.
+  // The bits of floatValue(), all of them: where floats are handed over in x87 registers, a
+  // signalling not-a-number would arrive as a quiet one.
   std::uint32_t floatBits() const noexcept {
     return isFloat32() ? slot_.body() : std::bit_cast<std::uint32_t>(floatOfOther());
   }

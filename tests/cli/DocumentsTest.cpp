@@ -53,8 +53,8 @@ std::vector<Example> examplesIn(const std::string& block) {
   return examples;
 }
 
-// What a shell in the source folder prints, to either stream, with our command first in its path and
-// the look tables in a folder of their own.
+// What a shell in the source folder prints, to either stream, with our command first in its path
+// and the look tables in a folder of their own.
 std::string outputOf(const std::string& command, const std::string& looks) {
   const std::string folder = std::filesystem::path(OXMV_COMMAND).parent_path().string();
   const oxmv::test::TempDir temporary;  // what an example makes there goes with it

@@ -1,5 +1,5 @@
-// What a project that uses the library starts with: bytes in, a tag out; and a call that needs every
-// library which ours leans on.
+// What a project that uses the library starts with: bytes in, a tag out; and a call that needs
+// every library which ours leans on.
 
 #include <cstdint>
 #include <iostream>

@@ -1,5 +1,5 @@
-// The library as a guest of an application: another locale, another libjpeg, several threads, a host
-// of the application's own. The results are the same, and the process is left as it was.
+// The library as a guest of an application: another locale, another libjpeg, several threads, a
+// host of the application's own. The results are the same, and the process is left as it was.
 
 #include <array>
 #include <cerrno>

@@ -1,5 +1,5 @@
-// What the process asks of the C library that a guest has no business with. A program that links this
-// passes such calls through here.
+// What the process asks of the C library that a guest has no business with. A program that links
+// this passes such calls through here.
 
 #pragma once
 

@@ -9,8 +9,8 @@
 #include "oxmv/looks/LookFileRef.h"
 #include "oxmv/metadata/MetadataDictionary.h"
 
-// The one name that it shows to the application that loads it: reads and writes whatever is there, so
-// that all of the library is linked. Answers how many tags it has found.
+// The one name that it shows to the application that loads it: reads and writes whatever is there,
+// so that all of the library is linked. Answers how many tags it has found.
 extern "C" [[gnu::visibility("default")]] int tagsOfEverything(const char* still,
                                                                const char* look) {
   auto clip = oxmv::MetadataDictionary::initFromOverride();

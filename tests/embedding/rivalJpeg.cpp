@@ -1,8 +1,8 @@
-// Another libjpeg, as an application may have loaded one: under the classic names, in front of every
-// other library, and of no use to anybody. It counts who takes it for the right one.
+// Another libjpeg, as an application may have loaded one: under the classic names, in front of
+// every other library, and of no use to anybody. It counts who takes it for the right one.
 
-// Seen from outside, as those of a real one are. Without their parameters: whoever calls these has the
-// wrong function anyway.
+// Seen from outside, as those of a real one are. Without their parameters: whoever calls these has
+// the wrong function anyway.
 #pragma GCC visibility push(default)
 extern "C" {
 

@@ -493,7 +493,8 @@ TEST(ClipFault, FileReplacedWhileItIsReadIsOneOfTheTwoWhole) {
   EXPECT_EQ(old, 5u);
 }
 
-// By one who does not put a new file in its place, as the library does, but writes into the old one.
+// By one who does not put a new file in its place, as the library does, but writes into the old
+// one.
 TEST(ClipFault, FileRewrittenWhileItIsReadIsReadOnceMore) {
   const Database database;
   // Of one length, and too long for one read.

@@ -90,8 +90,8 @@ TEST_F(FolderFaults, LongFileWhoseSizeCannotBeAskedForIsTold) {
   EXPECT_EQ(error, std::errc::io_error);
 }
 
-// A regular file answers so only while another process has it for itself; to wait for a device could
-// take forever.
+// A regular file answers so only while another process has it for itself; to wait for a device
+// could take forever.
 TEST_F(FolderFaults, BusyDeviceIsNotWaitedFor) {
   ASSERT_EQ(::mkfifo((root / "device").c_str(), 0600), 0);
   readWith("device", failing("openat", EWOULDBLOCK));

@@ -40,8 +40,8 @@ std::vector<SystemCall> systemCalls();
 std::size_t disarmFault();
 std::string faultyFunction();
 
-// What files tell of when they were created. Some file systems do not remember it; some of these say
-// that they do, and answer zeros.
+// What files tell of when they were created. Some file systems do not remember it; some of these
+// say that they do, and answer zeros.
 enum class CreationTimes { told, hidden, zero };
 void setCreationTimes(CreationTimes times);
 

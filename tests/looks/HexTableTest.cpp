@@ -179,7 +179,8 @@ TEST(HexTable, GroupWithACharacterThatIsNotAsciiIsEightCharacters) {
 }
 
 TEST(HexTable, ValuesStoredBeforeTheTextTurnsOutNotToBeAsciiLeaveZeros) {
-  // Counted in bytes the text is longer than in characters, and the second group begins early enough.
+  // Counted in bytes the text is longer than in characters, and the second group begins early
+  // enough.
   const std::string front(20, '#');
   const Read got = read(front + "0000803F0000003F0000803E\U0001F3A8\U0001F3A8");
   EXPECT_FALSE(got.table.isAscii);

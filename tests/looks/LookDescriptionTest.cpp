@@ -428,8 +428,8 @@ TEST(LookDescription, SamplesAreReadAlikeInBothWays) {
   }
 }
 
-// In UTF-16 characters can look like a long run between '>' and '<'. One of an odd length would leave
-// the document well-formed without it.
+// In UTF-16 characters can look like a long run between '>' and '<'. One of an odd length would
+// leave the document well-formed without it.
 TEST(LookDescription, CharactersOfUtf16ThatLookLikeALongRunAreNone) {
   for (const bool isBig : {false, true}) {
     for (const bool hasMark : {false, true}) {

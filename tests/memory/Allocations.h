@@ -33,12 +33,12 @@ bool disarmShortage() noexcept;
 // Pieces of memory that this thread has taken since it was armed, less those given back.
 std::ptrdiff_t piecesHeld() noexcept;
 
-// Runs `work` with its first allocation failing, then its second, and so on until there are no more;
-// and all that again with every later one failing, too. Each time `check` gets what it answered, or
-// nothing if std::bad_alloc left it; memory is no longer short then. Once the answer is gone, nothing
-// of what was taken may be held, but for what is kept for the process: that is made before, by a run
-// which is checked, too. `mayBeLost`: pieces that an outside library is known to lose. Answers how
-// often memory was short.
+// Runs `work` with its first allocation failing, then its second, and so on until there are no
+// more; and all that again with every later one failing, too. Each time `check` gets what it
+// answered, or nothing if std::bad_alloc left it; memory is no longer short then. Once the answer
+// is gone, nothing of what was taken may be held, but for what is kept for the process: that is
+// made before, by a run which is checked, too. `mayBeLost`: pieces that an outside library is known
+// to lose. Answers how often memory was short.
 template <class Work, class Check>
 std::size_t failEachAllocation(Work work, Check check, std::ptrdiff_t mayBeLost = 0) {
   check(std::optional<decltype(work())>(std::in_place, work()));

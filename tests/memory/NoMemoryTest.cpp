@@ -1,5 +1,6 @@
-// What the library does when there is no memory: wherever that happens, the answer is the right one,
-// std::bad_alloc or none, nothing is leaked, and every file is the old one or the new one, whole.
+// What the library does when there is no memory: wherever that happens, the answer is the right
+// one, std::bad_alloc or none, nothing is leaked, and every file is the old one or the new one,
+// whole.
 
 #include <algorithm>
 #include <filesystem>
@@ -574,7 +575,8 @@ TEST_F(NoMemoryForFiles, LooksAreToldApartOrItThrows) {
       });
 }
 
-// TurboJPEG, which cannot begin for want of memory, does not give back the pool that it has by then.
+// TurboJPEG, which cannot begin for want of memory, does not give back the pool that it has by
+// then.
 constexpr std::ptrdiff_t lostByTheImageTest = 1;
 
 TEST(NoMemory, ImageIsOneOrItThrows) {

@@ -443,8 +443,8 @@ TEST_F(ClipFiles, KeepsAnEmptyOverrideFile) {
   EXPECT_EQ(fs::file_size(overrideFile()), 0u);
 }
 
-// Of every allocation. The path is made before the tags are encoded, and want of memory for those is
-// not told.
+// Of every allocation. The path is made before the tags are encoded, and want of memory for those
+// is not told.
 TEST_F(ClipFiles, OverrideWithoutMemoryStaysAndNothingIsSaid) {
   putFile(overrideFile(), takeThree);
   MetadataDictionary clip;

@@ -100,7 +100,8 @@ std::filesystem::path pathOf(const std::string& begin, const std::filesystem::pa
   return found[0];
 }
 
-// The photograph's whole segments up to the first that belongs to its picture, and a picture of ours.
+// The photograph's whole segments up to the first that belongs to its picture, and a picture of
+// ours.
 Bytes withPicture(const Bytes& photograph) {
   std::size_t at = 2;
   while (at + 4 <= photograph.size()) {

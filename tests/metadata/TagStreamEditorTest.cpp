@@ -494,8 +494,8 @@ TEST(TagStreamEditor, RefusesToMakeAMarkerOfATag) {
 }
 
 TEST(TagStreamEditor, RefusesToPutARecordIntoAPayload) {
-  // The first record lacks 12 bytes, as many as the first one that is put in; which, a name whose value
-  // is lost, would not be missed.
+  // The first record lacks 12 bytes, as many as the first one that is put in; which, a name whose
+  // value is lost, would not be missed.
   const StreamBuilder stream = StreamBuilder().header("CTFO", 16, 'c').raw({1, 2, 3, 4});
   TagStreamEditor editor(stream.bytes());
   const Value group = Dictionary{{"a", "text"}, {"b", 1}};
@@ -551,7 +551,8 @@ TEST(TagStreamEditor, RefusesDataThatWouldComeBackInPieces) {
 }
 
 TEST(TagStreamEditor, RefusesAnElementThatWouldComeBackAsTwo) {
-  // 16 bits of its size keep 8 bytes; in the zeros behind them readers go on until they find another.
+  // 16 bits of its size keep 8 bytes; in the zeros behind them readers go on until they find
+  // another.
   const Value element = Dictionary{{"FREE", Value::data(std::vector<std::uint8_t>(65528))},
                                    {"DSPm", Array::of(Dictionary())}};
   TagStreamEditor exact(ordinary().bytes(), Layout::exact);

@@ -265,7 +265,8 @@ TEST(Xml, EntitiesWithinEntitiesAreLimited) {
   EXPECT_EQ(endOf(chain(100000)).kind, Kind::malformed);
 }
 
-// Declares attributes of one element, in one list or each in its own, without a default or with one.
+// Declares attributes of one element, in one list or each in its own, without a default or with
+// one.
 std::string declaring(std::size_t attributes, std::string_view between, std::string_view what) {
   std::string document = "<!DOCTYPE a [<!ATTLIST a";
   for (std::size_t i = 0; i < attributes; ++i) {

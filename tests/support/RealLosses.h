@@ -111,8 +111,8 @@ inline Dictionary nestedIn(const SingledOut& single) {
 }
 
 // Whether the path's value comes back differently: as part of the whole; or where others hide that,
-// because they do damage or vanish from the front of a list, without those or on its own; or as part
-// of the nested dictionary around it.
+// because they do damage or vanish from the front of a list, without those or on its own; or as
+// part of the nested dictionary around it.
 inline bool shows(const Dictionary& tags, std::string_view path, Layout layout) {
   if (differAt(tags, comesBack(tags, layout), path)) return true;
   const Dictionary undamaged = withoutDamage(tags, findLosses(tags, layout));

@@ -9,8 +9,8 @@
 
 namespace oxmv::test {
 
-// `rule` as POSIX writes it ("CET-1CEST,M3.5.0,M10.5.0/3"): it needs no files of time zones. While no
-// other thread asks for the time.
+// `rule` as POSIX writes it ("CET-1CEST,M3.5.0,M10.5.0/3"): it needs no files of time zones. While
+// no other thread asks for the time.
 class TimeZone {
  public:
   explicit TimeZone(const char* rule) {
