@@ -408,7 +408,7 @@ class StreamEdit {
   }
 
   static Bytes recordOf(Tag tag, const Bytes& payload) {
-    if (payload.size() > maxRecordSize)
+    if (payload.size() > longestRecord)
       refuse(EditRefusal::notStored, "it takes more bytes than a record holds");
     Bytes record(recordHeaderSize);
     storeLe32(record.data(), static_cast<std::uint32_t>(tag));

@@ -344,6 +344,8 @@ TEST(TagStreamEditor, RefusesANestedStreamLargerThanARecord) {
   const Bytes inner = StreamBuilder().record("FREE", 'c', Bytes(0xFFFFE0, 1)).bytes();
   const StreamBuilder stream = StreamBuilder().record("COL1", 0, inner);
   expectRefused(stream, "COL1/REEL", "sixteen letters.", "not-stored at 0");
+  expectRefused(stream, "COL1/REEL", "seven..", "not-stored at 0");  // its length would wrap
+  set(stream, "COL1/TAKE", 1);
   TagStreamEditor editor(stream.bytes());
   EXPECT_EQ(outcome(editor.set("COL1/FREE", data(4))), "done");
 }
