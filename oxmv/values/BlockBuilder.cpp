@@ -3,6 +3,7 @@
 #include <new>
 
 #include "oxmv/values/Bytes32.h"
+#include "oxmv/values/RadixSort.h"
 #include "oxmv/values/Text.h"
 
 namespace oxmv::detail {
@@ -23,6 +24,9 @@ constexpr std::uint32_t inNoGroup = 0xFFFFFFFF;
 
 // With more keys than this a group's keys are followed by their order.
 constexpr std::size_t searchedInLine = 16;
+
+// So few are sorted sooner by comparing them.
+constexpr std::size_t comparedNames = 128;
 
 }  // namespace
 
@@ -157,8 +161,8 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
   for (std::uint32_t i = 0; i < entries.size(); ++i) {
     if (entries[i].place == place) ranked_.push({startOf(textOf(entries[i].name)), i});
   }
+  sortByName(entries);
   const std::span<Ranked> ranked = ranked_.from(0);
-  sortByName(ranked, entries);
   std::size_t kept = 0;
   Named* first = nullptr;  // of those of the same name
   for (const Ranked& next : ranked) {
@@ -180,13 +184,26 @@ void BlockBuilder::mergeMany(std::span<Named> entries, std::uint32_t place) {
   }
 }
 
-// Those of the same name in the order in which they came.
-void BlockBuilder::sortByName(std::span<Ranked> ranked, std::span<const Named> entries) const {
-  std::sort(ranked.begin(), ranked.end(), [&](const Ranked& a, const Ranked& b) {
-    if (a.start != b.start) return a.start < b.start;
+// What is in ranked_: those of the same name in the order in which they came.
+void BlockBuilder::sortByName(std::span<const Named> entries) {
+  const std::span<Ranked> ranked = ranked_.from(0);
+  const auto start = [](const Ranked& entry) { return entry.start; };
+  if (ranked.size() <= comparedNames) {
+    std::ranges::sort(ranked, {}, start);
+  } else {
+    spare_.shrink(0);
+    radixSort(ranked, std::span(spare_.extend(ranked.size()), ranked.size()), start);
+  }
+  const auto isBefore = [&](const Ranked& a, const Ranked& b) {
     const auto order = textOf(entries[a.entry].name) <=> textOf(entries[b.entry].name);
     return order != 0 ? order < 0 : a.entry < b.entry;
-  });
+  };
+  for (auto first = ranked.begin(); first != ranked.end();) {
+    const auto last = std::find_if(
+        first, ranked.end(), [&](const Ranked& other) { return other.start != first->start; });
+    if (last - first > 1) std::sort(first, last, isBefore);
+    first = last;
+  }
 }
 
 Slot BlockBuilder::asUtf8(Slot text) {
@@ -224,6 +241,7 @@ Ref<const Block> BlockBuilder::block() {
   named_.release();
   group_.release();
   ranked_.release();
+  spare_.release();
   return Block::make(bytes_, extra_, slots_.from(0), keys_.from(0));
 }
 

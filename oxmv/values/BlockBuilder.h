@@ -172,7 +172,7 @@ class BlockBuilder {
   Slot putGroup(std::span<const Named> given);
   void mergeFew(std::span<const Named> entries, std::uint32_t place);
   void mergeMany(std::span<Named> entries, std::uint32_t place);
-  void sortByName(std::span<Ranked> ranked, std::span<const Named> entries) const;
+  void sortByName(std::span<const Named> entries);
   Named* findNamed(std::string_view name);
   void putOrder(std::span<const Named> entries);
   std::string_view textOf(Slot place) const;
@@ -192,6 +192,7 @@ class BlockBuilder {
   Scratch<Named, 32> named_;
   Scratch<Named, 16> group_;    // the entries of one group, while it is put
   Scratch<Ranked, 16> ranked_;  // the same by name, where they are many
+  Scratch<Ranked, 1> spare_;    // for sorting those
 
   Scratch<Slot, 1664> slots_;  // of the block to be
   Scratch<Key, 640> keys_;     // of the block to be
