@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <memory>
 #include <new>
 #include <utility>
 #include <variant>
@@ -391,7 +392,8 @@ class StreamEdit {
 
   Bytes editInner(BytesView nested, const Target& inner, std::size_t offset) const {
     try {
-      return StreamEdit(nested, level_ + 1, edit_).run(inner);
+      // On the heap: there may be one for each level at a time.
+      return std::make_unique<StreamEdit>(nested, level_ + 1, edit_)->run(inner);
     } catch (Refused& refused) {
       refused.error.offset += offset;
       throw;

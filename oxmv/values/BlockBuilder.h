@@ -172,7 +172,8 @@ class BlockBuilder {
   Slot putGroup(std::span<const Named> given);
   void mergeFew(std::span<const Named> entries, std::uint32_t place);
   void mergeMany(std::span<Named> entries, std::uint32_t place);
-  void sortByName(std::span<const Named> entries);
+  // Takes some stack, and is kept apart from what is on it once for each level.
+  [[gnu::noinline]] void sortByName(std::span<const Named> entries);
   Named* findNamed(std::string_view name);
   void putOrder(std::span<const Named> entries);
   std::string_view textOf(Slot place) const;
@@ -188,7 +189,7 @@ class BlockBuilder {
   Scratch<Slot, 2 * (mostEntries + 1)> openSlots_;
   Scratch<Key, 2 * (mostEntries + 1)> openKeys_;
   Scratch<std::uint8_t, 2 * (mostEntries + 1)> places_;
-  Scratch<Element, 320> elements_;
+  Scratch<Element, 128> elements_;
   Scratch<Named, 32> named_;
   Scratch<Named, 16> group_;    // the entries of one group, while it is put
   Scratch<Ranked, 16> ranked_;  // the same by name, where they are many

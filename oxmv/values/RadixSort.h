@@ -13,7 +13,7 @@
 namespace oxmv::detail {
 
 // Sorts `items` by number(item), those of the same number in the order in which they stood. `spare`
-// has room for as many. Goes through them once for each byte in which any two numbers differ, from
+// has room for as many; there are fewer than 2^32. Goes through them once for each byte in which any two numbers differ, from
 // the lowest on.
 template <class T, class Number>
 void radixSort(std::span<T> items, std::span<T> spare, Number number) {
@@ -25,10 +25,10 @@ void radixSort(std::span<T> items, std::span<T> spare, Number number) {
   for (int shift = 0; shift < 64; shift += 8) {
     if ((different >> shift & 0xFF) == 0) continue;
     const auto byteOf = [&](const T& item) { return number(item) >> shift & 0xFF; };
-    std::array<std::size_t, 256> places{};
+    std::array<std::uint32_t, 256> places{};
     for (std::size_t i = 0; i < items.size(); ++i) ++places[byteOf(from[i])];
-    std::size_t next = 0;
-    for (std::size_t& place : places) next += std::exchange(place, next);
+    std::uint32_t next = 0;
+    for (std::uint32_t& place : places) next += std::exchange(place, next);
     for (std::size_t i = 0; i < items.size(); ++i) to[places[byteOf(from[i])]++] = from[i];
     std::swap(from, to);
   }

@@ -102,6 +102,18 @@ TEST(Stack, EditsADeepStream) {
   });
 }
 
+TEST(Stack, EditsTheDeepestStreamThatIsRead) {
+  std::string path;
+  for (int i = 0; i < 63; ++i) path += "COL1/";
+  path += "REEL";
+  expectSmallStack([&] {
+    TagStreamEditor editor(Bytes{});
+    EXPECT_FALSE(editor.set(path, "A001"));
+    EXPECT_FALSE(editor.set(path, "another one"));
+    EXPECT_EQ(editor.stream().size(), 63u * 8 + 20);
+  });
+}
+
 TEST(Stack, RefusesAPathOfManyLevels) {
   std::string path;
   for (int i = 0; i < 100'000; ++i) path += "COL1/";
