@@ -55,7 +55,7 @@ class Scratch {
   // Seldom: kept out of the way of what it is called from.
   [[gnu::noinline]] void grow(std::size_t count) {
     // What outgrows itself may well be long.
-    const std::size_t factor = heap_ == nullptr ? 4 : 2;
+    const std::size_t factor = heap_ == nullptr ? 8 : 2;
     const std::size_t capacity = std::max(factor * capacity_, size_ + count);
     auto memory = std::make_unique_for_overwrite<std::byte[]>(capacity * sizeof(T));
     T* items = reinterpret_cast<T*>(memory.get());
@@ -189,7 +189,7 @@ class BlockBuilder {
   Scratch<Slot, 2 * (mostEntries + 1)> openSlots_;
   Scratch<Key, 2 * (mostEntries + 1)> openKeys_;
   Scratch<std::uint8_t, 2 * (mostEntries + 1)> places_;
-  Scratch<Element, 128> elements_;
+  Scratch<Element, 160> elements_;
   Scratch<Named, 32> named_;
   Scratch<Named, 16> group_;    // the entries of one group, while it is put
   Scratch<Ranked, 16> ranked_;  // the same by name, where they are many

@@ -16,21 +16,26 @@ bool isOwn(Slot slot) { return slot.form() == HeldEntries::ownForm; }
 // Whether the value's payload stands in the block: not that of a number, which the slot holds.
 bool isInBlock(Slot slot) { return slot.form() >= Form::text && !isOwn(slot); }
 
-std::size_t countInBlock(const HeldEntries& entries) {
+std::size_t countOwnValues(const HeldEntries& entries) {
+  if (entries.own == nullptr) return 0;
   return static_cast<std::size_t>(
-      std::count_if(entries.slots, entries.slots + entries.count, isInBlock));
+      std::count_if(entries.slots, entries.slots + entries.count, isOwn));
+}
+
+// Added up, for no processor foresees which are numbers.
+std::size_t countInBlock(const HeldEntries& entries) {
+  std::size_t payloads = 0;
+  for (std::size_t i = 0; i < entries.count; ++i)
+    payloads += std::size_t{entries.slots[i].form() >= Form::text};
+  return payloads - countOwnValues(entries);
 }
 
 // How many values and names a table of `entries` has for itself.
 std::size_t countOwned(const HeldEntries& entries, bool keepsBlock) {
   const auto isName = [](const Key& key) { return !key.isTag(); };
-  auto count = std::count_if(entries.keys, entries.keys + entries.count, isName);
-  if (!keepsBlock) {
-    count += static_cast<std::ptrdiff_t>(entries.count);
-  } else if (entries.own != nullptr) {
-    count += std::count_if(entries.slots, entries.slots + entries.count, isOwn);
-  }
-  return static_cast<std::size_t>(count);
+  const auto names = std::count_if(entries.keys, entries.keys + entries.count, isName);
+  const std::size_t values = keepsBlock ? countOwnValues(entries) : entries.count;
+  return static_cast<std::size_t>(names) + values;
 }
 
 }  // namespace
