@@ -26,9 +26,11 @@
 
 namespace oxmv::detail {
 
-// How a value is held. A form has its Value::Kind in its upper bits, so that asking for that takes
-// no branch and no table. From `text` on it needs the owner of its payload.
+// A form has its Value::Kind in the bits from here on, so that asking for that takes no branch and no
+// table.
 constexpr int kindShift = 2;
+
+// How a value is held. From `text` on it needs the owner of its payload.
 enum class Form : std::uint8_t {
   nothing,
   integer = 1 << kindShift,     // body: two's complement

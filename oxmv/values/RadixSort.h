@@ -12,9 +12,9 @@
 
 namespace oxmv::detail {
 
-// Sorts `items` by number(item), those of the same number in the order in which they stood. `spare`
-// has room for as many; there are fewer than 2^32. Goes through them once for each byte in which any two numbers differ, from
-// the lowest on.
+// Sorts `items`, fewer than 2^32, by number(item), those of the same number in the order in which
+// they stood. `spare` has room for as many. Goes through them once for each byte in which any two
+// numbers differ, from the lowest on.
 template <class T, class Number>
 void radixSort(std::span<T> items, std::span<T> spare, Number number) {
   std::uint64_t different = 0;

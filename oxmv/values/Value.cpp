@@ -104,6 +104,12 @@ void Value::borrowOddText(const Block& block, Slot slot) {
 }
 
 bool Value::isNumber() const noexcept {
+  // The bits of the forms say what the enumeration of kinds says.
+  static_assert(kindOf(Form::integer64) == Kind::integer &&
+                kindOf(Form::float32) == Kind::float32 && kindOf(Form::float64) == Kind::float64 &&
+                kindOf(Form::wholeDerivedText) == Kind::text &&
+                kindOf(Form::wholeData) == Kind::data && kindOf(Form::arrayBox) == Kind::array &&
+                kindOf(Form::dictionaryBox) == Kind::dictionary);
   const Kind kind = this->kind();
   return kind == Kind::integer || kind == Kind::float32 || kind == Kind::float64;
 }

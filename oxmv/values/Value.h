@@ -92,9 +92,7 @@ class Value {
   }
   ~Value() { release(); }
 
-  Kind kind() const noexcept {
-    return static_cast<Kind>(static_cast<std::uint8_t>(slot_.form()) >> detail::kindShift);
-  }
+  Kind kind() const noexcept { return kindOf(slot_.form()); }
   bool isNothing() const noexcept { return slot_.form() == detail::Form::nothing; }
   bool isNumber() const noexcept;  // an integer, a float or a double
   bool isText() const noexcept { return kind() == Kind::text; }
@@ -219,6 +217,10 @@ class Value {
   static Value wholeText(detail::Form form, std::string_view text);
 
   class Comparison;
+
+  static constexpr Kind kindOf(detail::Form form) {
+    return static_cast<Kind>(static_cast<std::uint8_t>(form) >> detail::kindShift);
+  }
 
   const detail::Shared* owner() const noexcept {
     return slot_.form() >= detail::Form::text ? content_.owner : nullptr;
