@@ -24,7 +24,9 @@ void radixSort(std::span<T> items, std::span<T> spare, Number number) {
   T* to = spare.data();
   for (int shift = 0; shift < 64; shift += 8) {
     if ((different >> shift & 0xFF) == 0) continue;
-    const auto byteOf = [&](const T& item) { return number(item) >> shift & 0xFF; };
+    const auto byteOf = [&](const T& item) {
+      return static_cast<std::uint8_t>(number(item) >> shift);
+    };
     std::array<std::uint32_t, 256> places{};
     for (std::size_t i = 0; i < items.size(); ++i) ++places[byteOf(from[i])];
     std::uint32_t next = 0;
