@@ -60,6 +60,7 @@ TEST(DocumentedLimits, AreThoseOfTheCode) {
       {"maxXmlDepth", maxXmlDepth},
       {"maxXmlNestedEntities", maxXmlNestedEntities},
       {"maxXmlDeclaredAttributes", maxXmlDeclaredAttributes},
+      {"maxXmlMemory", maxXmlMemory(0)},
       {"maxPreferencesFileSize", maxPreferencesFileSize},
       {"maxTomlNesting", maxTomlNesting},
       {"maxCameraTablesSize", maxCameraTablesSize},

@@ -1,11 +1,14 @@
 #include "oxmv/platform/Xml.h"
 
 #include <algorithm>
+#include <cstddef>
+#include <cstdint>
 #include <cstdlib>
 #include <exception>
 #include <limits>
 #include <memory>
 #include <new>
+#include <utility>
 
 #include <expat.h>
 
@@ -22,19 +25,63 @@ struct ParserFree {
 };
 using Parser = std::unique_ptr<XML_ParserStruct, ParserFree>;
 
-// The parser calls it a lack of memory, too, when a document makes it pass its own limits: then it
-// does not ask for the memory at all. So those it asks remember whether they had none.
-thread_local bool isMemoryShort = false;
+// What the parser of this thread holds and may hold; not every release of it has a limit of its own.
+// Its functions are not told which parser they work for.
+struct Memory {
+  std::size_t held = 0;
+  std::size_t most = 0;
+  bool isShort = false;  // the system had no more
+};
+thread_local Memory memory;
 
-void* remembering(void* memory) {
-  if (memory == nullptr) isMemoryShort = true;
-  return memory;
+// For the life of a parser.
+class MemoryLimit {
+ public:
+  explicit MemoryLimit(std::uint64_t most)
+      : outer_(std::exchange(memory, {.most = static_cast<std::size_t>(
+                                          std::min<std::uint64_t>(most, PTRDIFF_MAX))})) {}
+  MemoryLimit(const MemoryLimit&) = delete;
+  MemoryLimit& operator=(const MemoryLimit&) = delete;
+  ~MemoryLimit() { memory = outer_; }
+
+ private:
+  Memory outer_;
+};
+
+// Stands before each block.
+struct alignas(std::max_align_t) BlockHead {
+  std::size_t size;
+};
+
+BlockHead* headOf(void* block) {
+  return block != nullptr ? static_cast<BlockHead*>(block) - 1 : nullptr;
+}
+
+// A new block where there is none. The parser takes it for a lack of memory, too, when it may hold no
+// more.
+void* resize(void* block, std::size_t size) {
+  BlockHead* head = headOf(block);
+  const std::size_t others = memory.held - (head != nullptr ? head->size : 0);
+  if (size > memory.most - others) return nullptr;
+  head = static_cast<BlockHead*>(std::realloc(head, sizeof(BlockHead) + size));
+  if (head == nullptr) {
+    memory.isShort = true;
+    return nullptr;
+  }
+  head->size = size;
+  memory.held = others + size;
+  return head + 1;
+}
+
+void release(void* block) {
+  BlockHead* const head = headOf(block);
+  if (head == nullptr) return;
+  memory.held -= head->size;
+  std::free(head);
 }
 
 constexpr XML_Memory_Handling_Suite memoryFunctions = {
-    [](std::size_t size) { return remembering(std::malloc(size)); },
-    [](void* memory, std::size_t size) { return remembering(std::realloc(memory, size)); },
-    [](void* memory) { std::free(memory); }};
+    [](std::size_t size) { return resize(nullptr, size); }, &resize, &release};
 
 std::string_view viewOf(const XML_Char* text) { return text != nullptr ? text : ""; }
 
@@ -62,14 +109,13 @@ class Walk {
   Walk& operator=(const Walk&) = delete;
 
   XmlEnd run(std::span<const std::uint8_t> document) {
-    isMemoryShort = false;
     const auto* const text = reinterpret_cast<const char*>(document.data());
     const XML_Status status = XML_Parse(parser_, document.empty() ? "" : text,
                                         static_cast<int>(document.size()), XML_TRUE);
     if (thrown_ != nullptr) std::rethrow_exception(thrown_);
     if (status == XML_STATUS_OK) return {};
     const XML_Error error = XML_GetErrorCode(parser_);
-    if (error == XML_ERROR_NO_MEMORY && isMemoryShort) throw std::bad_alloc();
+    if (error == XML_ERROR_NO_MEMORY && memory.isShort) throw std::bad_alloc();
     if (!objection_.empty()) return {XmlEnd::Kind::malformed, stoppedAt_, objection_};
     if (isStopped_) return {XmlEnd::Kind::stopped, stoppedAt_, {}};
     if (error == XML_ERROR_NO_MEMORY) {
@@ -191,6 +237,7 @@ XmlEnd walkXml(std::span<const std::uint8_t> document, XmlVisitor& visitor) {
   if (document.size() > maxFileSize) {
     return {XmlEnd::Kind::malformed, maxFileSize, "larger than 256 MiB"};
   }
+  const MemoryLimit limit(maxXmlMemory(document.size()));
   const Parser parser(XML_ParserCreate_MM(nullptr, &memoryFunctions, nullptr));
   if (parser == nullptr) throw std::bad_alloc();
   return Walk(parser.get(), visitor).run(document);

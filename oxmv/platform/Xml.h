@@ -21,6 +21,13 @@ constexpr std::size_t maxXmlNestedEntities = 16;
 // both.
 constexpr std::size_t maxXmlDeclaredAttributes = 64;
 
+// Bytes that the parser may hold on its way through a document of `size` bytes. What nests no deeper
+// than maxXmlDepth takes at most 16 times its size, when no two of its names are the same; more is
+// made by entities alone, and a small document may make some of it.
+constexpr std::uint64_t maxXmlMemory(std::size_t size) {
+  return (std::uint64_t{64} << 20) + 32 * std::uint64_t{size};
+}
+
 // Hears what a document holds, in its order. Texts are UTF-8, with line ends as single line feeds;
 // they are valid during the call. `offset` is where in the document, in bytes, the event begins;
 // within an entity, where the reference to it begins. Answering false ends the walk.
