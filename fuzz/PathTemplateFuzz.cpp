@@ -96,7 +96,7 @@ void checkClip(FuzzInput& input) {
   guid.Data2 = static_cast<std::uint16_t>(input.word(2));
   guid.Data3 = static_cast<std::uint16_t>(input.word(2));
   for (std::uint8_t& byte : guid.Data4) byte = static_cast<std::uint8_t>(input.below(256));
-  const std::size_t eye = input.word(4) % (ClipFileName::lastEye + 1);
+  const std::size_t eye = static_cast<std::size_t>(input.word(4)) % (ClipFileName::lastEye + 1);
   const std::string folder = luts + '/' + database + '/';
   require(databaseFolderPath("clips") + '/' == folder);
   for (const ClipFileName& name : {ClipFileName{guid, std::nullopt}, ClipFileName{guid, eye}}) {

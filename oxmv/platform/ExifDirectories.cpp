@@ -90,7 +90,8 @@ class Directories {
     const std::uint64_t size = std::uint64_t{typeSizes[type]} * word32(entry + 4);
     const std::size_t place = entry + entryHeadSize;
     const std::size_t offset = size <= 4 ? place : word32(place);
-    return isInside(offset, size) ? bytes_.subspan(offset, size) : Bytes();
+    if (!isInside(offset, size)) return {};
+    return bytes_.subspan(offset, static_cast<std::size_t>(size));
   }
 
   Bytes bytes_;

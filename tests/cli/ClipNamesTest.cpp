@@ -3,15 +3,18 @@
 
 #include <gtest/gtest.h>
 
+#include "oxmv/values/myGUID.h"
 #include "tests/cli/CommandRunner.h"
 #include "tests/cli/TemporaryDatabase.h"
 #include "tests/cli/UserFolders.h"
 #include "tests/support/StreamBuilder.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::cli::test {
 namespace {
 
 using oxmv::test::Bytes;
+using oxmv::test::guidImage;
 using oxmv::test::StreamBuilder;
 
 const std::string guid = "0A1B2C3D-4E5F-0607-0809-AABBCCDDEE0F";
@@ -21,9 +24,7 @@ Bytes reel(const std::string& name) { return StreamBuilder().record("REEL", 'c',
 
 // A clip whose GUID record says 04030201-0605-0807-090A-0B0C0D0E0F10.
 Bytes withGuidRecord() {
-  std::string image = {1, 2, 3, 4, 0, 0, 0, 0, 5, 6, 7, 8};
-  for (char c = 9; c <= 16; ++c) image += c;
-  image += std::string(4, '\0');
+  const std::string image = guidImage("\1\2\3\4", "\5\6\7\x08\x09\x0A\x0B\x0C\x0D\x0E\x0F\x10");
   return StreamBuilder().record("GUID", 'G', image).record("REEL", 'c', "x").bytes();
 }
 const std::string recordGuid = "04030201-0605-0807-090A-0B0C0D0E0F10";
@@ -218,13 +219,10 @@ class OverrideFolder : public testing::Test {
  protected:
   OverrideFolder() { user.setPreferences("OverridePath = \"" + user.root().string() + "\"\n"); }
 
-  // The "last" file of a build with a long of 64 bits.
   void putLast(const std::string& stream) {
-    const std::string head =
-        std::string("\x3D\x2C\x1B\x0A\0\0\0\0\x5F\x4E\x07\x06\x08\x09\xAA\xBB\xCC\xDD\xEE\x0F",
-                    20) +
-        std::string(4, '\0');
-    writeFile(user.root() / "last", head + stream);
+    writeFile(
+        user.root() / "last",
+        guidImage("\x3D\x2C\x1B\x0A", "\x5F\x4E\x07\x06\x08\x09\xAA\xBB\xCC\xDD\xEE\x0F") + stream);
   }
 
   const UserFolders user;
@@ -277,10 +275,12 @@ TEST_F(OverrideFolder, HasTheLastFile) {
                 "0.01\n");
   EXPECT_EQ(user.run({"check", "@last"}).exitCode, 0);
   const std::string dump = user.run({"dump", "@last"}).out;
-  const std::string head = "24 bytes before the stream: clip GUID " + guid + "\n";
+  const std::string headSize = std::to_string(sizeof(myGUID));
+  const std::string head = headSize + " bytes before the stream: clip GUID " + guid + "\n";
   EXPECT_EQ(dump, head + run({"dump", OXMV_SOURCE_DIR "/examples/eye-left.col1"}).out);
   const std::string json = user.run({"dump", "--json", "@last"}).out;
-  EXPECT_NE(json.find(",\"head\":24,\"guid\":\"" + guid + "\",\"records\":["), std::string::npos)
+  EXPECT_NE(json.find(",\"head\":" + headSize + ",\"guid\":\"" + guid + "\",\"records\":["),
+            std::string::npos)
       << json;
 }
 
@@ -302,12 +302,12 @@ TEST_F(OverrideFolder, LastStreamMayBeShort) {
 }
 
 TEST_F(OverrideFolder, LastFileNeedsItsGuid) {
-  writeFile(user.root() / "last", std::string(23, 'x'));
+  const std::size_t tooFew = sizeof(myGUID) - 1;
+  writeFile(user.root() / "last", std::string(tooFew, 'x'));
   const Outcome outcome = user.run({"show", "@last"});
   EXPECT_EQ(outcome.exitCode, 3);
-  EXPECT_EQ(outcome.err,
-            "oxmv: error: @last: 23 bytes are too few for the GUID that it begins with "
-            "(too-short)\n");
+  EXPECT_EQ(outcome.err, "oxmv: error: @last: " + std::to_string(tooFew) +
+                             " bytes are too few for the GUID that it begins with (too-short)\n");
   std::filesystem::remove(user.root() / "last");
   EXPECT_EQ(user.run({"show", "@last"}).err,
             "oxmv: error: @last: No such file or directory (missing)\n");

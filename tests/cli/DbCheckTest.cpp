@@ -12,6 +12,7 @@
 #include "tests/cli/CommandRunner.h"
 #include "tests/cli/TemporaryDatabase.h"
 #include "tests/support/StreamBuilder.h"
+#include "tests/support/WideLong.h"
 
 namespace oxmv::cli::test {
 namespace {
@@ -74,8 +75,9 @@ TEST(DbCheck, FindsEyesThatAreLeftAlone) {
 
 TEST(DbCheck, FindsGuidRecordsThatDifferFromTheName) {
   const TemporaryDatabase database;
-  const std::string image =
-      std::string("\1\2\3\4\0\0\0\0\5\6\7\x8", 12) + "abcdefgh" + std::string(4, '\0');
+  const std::string image = oxmv::test::guidImage("\1\2\3\4",
+                                                  "\5\6\7\x8"
+                                                  "abcdefgh");
   const Bytes stream = StreamBuilder().record("GUID", 'G', image).bytes();
   const std::string named = "04030201-0605-0807-6162-636465666768";
   database.put(named + ".colr", stream);

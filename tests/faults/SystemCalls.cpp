@@ -32,6 +32,11 @@ Function* original(const char* name) {
   return reinterpret_cast<Function*>(::dlsym(RTLD_NEXT, name));
 }
 
+// The C library has another function for the types of today where long is too short for them.
+const char* today(const char* name, const char* nameForLongerTypes) {
+  return sizeof(off_t) > sizeof(long) ? nameForLongerTypes : name;
+}
+
 // Makes a call, or what has been armed for it.
 template <class Call>
 auto pass(std::string_view name, Call call, int flags = 0, mode_t mode = 0) -> decltype(call()) {
@@ -83,13 +88,14 @@ void setCreationTimes(CreationTimes times) { creationTimes = times; }
 
 using oxmv::test::original;
 using oxmv::test::pass;
+using oxmv::test::today;
 
 // Seen from outside, so that a shared library comes here, too.
 #pragma GCC visibility push(default)
 extern "C" {
 
 int open(const char* path, int flags, ...) {
-  static auto* const next = original<int(const char*, int, ...)>("open");
+  static auto* const next = original<int(const char*, int, ...)>(today("open", "open64"));
   mode_t mode = 0;
   if ((flags & O_CREAT) != 0) {
     va_list arguments;
@@ -102,7 +108,7 @@ int open(const char* path, int flags, ...) {
 }
 
 int openat(int folder, const char* path, int flags, ...) {
-  static auto* const next = original<int(int, const char*, int, ...)>("openat");
+  static auto* const next = original<int(int, const char*, int, ...)>(today("openat", "openat64"));
   mode_t mode = 0;
   if ((flags & O_CREAT) != 0) {
     va_list arguments;
@@ -122,8 +128,7 @@ DIR* fdopendir(int folder) {
 }
 
 dirent* readdir(DIR* folder) {
-  static const bool isLarge = sizeof(off_t) > sizeof(long);  // then this is another function
-  static auto* const next = original<dirent*(DIR*)>(isLarge ? "readdir64" : "readdir");
+  static auto* const next = original<dirent*(DIR*)>(today("readdir", "readdir64"));
   dirent* entry = nullptr;
   pass("readdir", [&] { return (entry = next(folder)) != nullptr ? 0 : -1; });
   return entry;
@@ -162,12 +167,13 @@ ssize_t getrandom(void* buffer, size_t size, unsigned flags) {
 }
 
 int fstat(int file, struct stat* status) noexcept {
-  static auto* const next = original<int(int, struct stat*)>("fstat");
+  static auto* const next = original<int(int, struct stat*)>(today("fstat", "__fstat64_time64"));
   return pass("fstat", [&] { return next(file, status); });
 }
 
 int lstat(const char* path, struct stat* status) noexcept {
-  static auto* const next = original<int(const char*, struct stat*)>("lstat");
+  static auto* const next =
+      original<int(const char*, struct stat*)>(today("lstat", "__lstat64_time64"));
   return pass("lstat", [&] { return next(path, status); });
 }
 
