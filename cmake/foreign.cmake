@@ -13,6 +13,10 @@ else()
   message(FATAL_ERROR "OXMV_FOREIGN is i386 or s390x, not '${OXMV_FOREIGN}'")
 endif()
 cmake_path(SET CMAKE_SYSROOT NORMALIZE "${CMAKE_CURRENT_LIST_DIR}/../build/roots/${OXMV_FOREIGN}")
+if(NOT EXISTS "${CMAKE_SYSROOT}")
+  message(FATAL_ERROR "${CMAKE_SYSROOT} is missing; unpack it with: "
+    "packaging/foreign-root ${OXMV_FOREIGN} build/roots/${OXMV_FOREIGN}")
+endif()
 
 set(CMAKE_SYSTEM_NAME Linux)
 set(CMAKE_SYSTEM_PROCESSOR ${OXMV_FOREIGN})
