@@ -267,6 +267,11 @@ TEST(Losses, NamesGuidsThatAreNotOfSixteenBytes) {
   EXPECT_EQ(losses({{"GUID", bytes(24)}}), Found{"guid-length GUID!"});
   EXPECT_EQ(losses({{"GUID", bytes(5)}, {"TAKE", 1}}), Found{"guid-length GUID!"});
   EXPECT_EQ(losses({{"GUID", bytes(24)}, {"TAKE", 1}}, Layout::readable), Found());
+  // What follows is only taken along, even if it would harm others.
+  EXPECT_EQ(losses({{"GUID", bytes(4)}, {"ACDL", 0}, {"FREE", bytes(11)}}),
+            Found{"guid-length GUID!"});
+  EXPECT_EQ(losses({{"GUID", bytes(4)}, {"FREE", bytes(11)}, {"TAKE", 1}}),
+            (Found{"guid-length GUID!", "data-unaligned FREE!"}));
   EXPECT_EQ(losses({{"GUID", "x"}}), Found{"wrong-kind GUID"});
 }
 
