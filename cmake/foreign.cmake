@@ -13,7 +13,7 @@ else()
   message(FATAL_ERROR "OXMV_FOREIGN is i386 or s390x, not '${OXMV_FOREIGN}'")
 endif()
 cmake_path(SET CMAKE_SYSROOT NORMALIZE "${CMAKE_CURRENT_LIST_DIR}/../build/roots/${OXMV_FOREIGN}")
-if(NOT EXISTS "${CMAKE_SYSROOT}")
+if(NOT EXISTS "${CMAKE_SYSROOT}/content")
   message(FATAL_ERROR "${CMAKE_SYSROOT} is missing; unpack it with: "
     "packaging/foreign-root ${OXMV_FOREIGN} build/roots/${OXMV_FOREIGN}")
 endif()
@@ -28,14 +28,16 @@ set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 foreach(kind IN ITEMS LIBRARY INCLUDE PACKAGE)
   set(CMAKE_FIND_ROOT_PATH_MODE_${kind} ONLY)
 endforeach()
+set(ENV{PKG_CONFIG_PATH} "")
 set(ENV{PKG_CONFIG_SYSROOT_DIR} "${CMAKE_SYSROOT}")
 set(ENV{PKG_CONFIG_LIBDIR} "${CMAKE_SYSROOT}/usr/lib/${libraries}/pkgconfig")
 
 if(OXMV_FOREIGN STREQUAL "i386")
-  string(JOIN "," CMAKE_EXE_LINKER_FLAGS_INIT -Wl
+  string(JOIN "," flags -Wl
     "--dynamic-linker=${CMAKE_SYSROOT}/lib/ld-linux.so.2"
     --disable-new-dtags
     "-rpath=${CMAKE_SYSROOT}/lib/${libraries}:${CMAKE_SYSROOT}/usr/lib/${libraries}")
+  set(CMAKE_EXE_LINKER_FLAGS_INIT "\"${flags}\"")
 else()
   set(CMAKE_CROSSCOMPILING_EMULATOR qemu-${OXMV_FOREIGN} -L "${CMAKE_SYSROOT}")
 endif()

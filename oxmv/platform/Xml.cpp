@@ -48,7 +48,7 @@ class MemoryLimit {
   Memory outer_;
 };
 
-// Stands before each block.
+// Stands before each block; its size is that of both.
 struct alignas(std::max_align_t) BlockHead {
   std::size_t size;
 };
@@ -59,11 +59,13 @@ BlockHead* headOf(void* block) {
 
 // A new block where there is none. The parser takes it for a lack of memory, too, when it may hold no
 // more.
-void* resize(void* block, std::size_t size) {
+void* resize(void* block, std::size_t contentSize) {
   BlockHead* head = headOf(block);
   const std::size_t others = memory.held - (head != nullptr ? head->size : 0);
-  if (size > memory.most - others) return nullptr;
-  head = static_cast<BlockHead*>(std::realloc(head, sizeof(BlockHead) + size));
+  const std::size_t mayTake = memory.most - others;
+  if (mayTake < sizeof(BlockHead) || contentSize > mayTake - sizeof(BlockHead)) return nullptr;
+  const std::size_t size = sizeof(BlockHead) + contentSize;
+  head = static_cast<BlockHead*>(std::realloc(head, size));
   if (head == nullptr) {
     memory.isShort = true;
     return nullptr;

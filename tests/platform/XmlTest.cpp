@@ -225,10 +225,27 @@ TEST(Xml, DocumentThatTakesTooMuchMemoryIsMalformed) {
   EXPECT_EQ(end.what, "takes too much memory");
 }
 
+TEST(Xml, MemoryGrowsWithTheDocumentUpToALimit) {
+  constexpr std::uint64_t mebi = 1 << 20;
+  EXPECT_EQ(maxXmlMemory(0), 64 * mebi);
+  EXPECT_EQ(maxXmlMemory(1), 64 * mebi + 64);
+  EXPECT_EQ(maxXmlMemory(15 * mebi), 1024 * mebi);
+  EXPECT_EQ(maxXmlMemory(15 * mebi + 1), 1024 * mebi);
+  EXPECT_EQ(maxXmlMemory(256 * mebi), 1024 * mebi);
+}
+
+// More than the 64 MiB that every document may take.
 TEST(Xml, DocumentOfDifferentNamesMayTakeTheMemoryForThem) {
   std::string document = "<a>";
-  for (int i = 0; i < 400000; ++i) document += "<b" + std::to_string(i) + "/>";
-  EXPECT_EQ(endOf(document + "</a>").kind, Kind::wellFormed);
+  for (int i = 0; i < 600000; ++i) {
+    document += "<";
+    for (int rest = i; rest > 0; rest /= 52)
+      document += static_cast<char>((rest % 52 < 26 ? 'A' : 'a' - 26) + rest % 52);
+    document += "_/>";
+  }
+  struct : XmlVisitor {
+  } unmoved;
+  EXPECT_EQ(walkXml(bytesOf(document + "</a>"), unmoved).kind, Kind::wellFormed);
 }
 
 TEST(Xml, WalkWithinAWalkHasALimitOfItsOwn) {
