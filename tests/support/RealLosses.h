@@ -77,12 +77,20 @@ inline bool damages(const Dictionary& tags, std::string_view path, Layout layout
   return reread(without, layout) != backWithout;
 }
 
-// What is left when everything is taken out that makes a reader misread what follows it.
-inline Dictionary withoutDamage(Dictionary tags, const std::vector<Loss>& losses) {
+// What is left when everything is taken out that makes a reader misread what follows it, but one.
+inline Dictionary withoutDamage(Dictionary tags, const std::vector<Loss>& losses,
+                                std::string_view keptTag = {}) {
   for (const Loss& loss : losses) {
-    if (isDamage(loss)) tags.remove(damagingTag(loss.path));
+    if (isDamage(loss) && damagingTag(loss.path) != keptTag) tags.remove(damagingTag(loss.path));
   }
   return tags;
+}
+
+// The same, also where others damage those entries anyway: then it shows without the others.
+inline bool damagesByItself(const Dictionary& tags, std::string_view path, Layout layout) {
+  if (damages(tags, path, layout)) return true;
+  const auto losses = findLosses(tags, layout);
+  return damages(withoutDamage(tags, losses, damagingTag(path)), path, layout);
 }
 
 // What a path's first part names, on its own: of "DSPm[1]/REEL" a list DSPm that has the second
@@ -124,7 +132,7 @@ inline bool shows(const Dictionary& tags, std::string_view path, Layout layout) 
 }
 
 inline bool isReal(const Loss& loss, const Dictionary& tags, Layout layout) {
-  return isDamage(loss) ? damages(tags, loss.path, layout) : shows(tags, loss.path, layout);
+  return isDamage(loss) ? damagesByItself(tags, loss.path, layout) : shows(tags, loss.path, layout);
 }
 
 }  // namespace oxmv::test
